@@ -1,0 +1,70 @@
+#pragma once
+
+#include <boost/container/small_vector.hpp>
+#include <boost/multi_index/hashed_index.hpp>
+#include <boost/multi_index/indexed_by.hpp>
+#include <boost/multi_index/member.hpp>
+#include <boost/multi_index/ordered_index.hpp>
+#include <boost/multi_index_container.hpp>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <string>
+
+#include "configuration/ConfigurationValue.hpp"
+#include "framework/reactive_streams/CachedValuePublisher.hpp"
+
+namespace velkor::configuration {
+
+/// The stream behind one watch.
+using WatchPublisher =
+    reactive_streams::CachedValuePublisher<ConfigurationValue, std::function<void()>>;
+
+/// The store's watches in order of creation, found by key without a look at the others.
+/// Not thread-safe: guarded by the store's mutex. Owns a reference to each publisher.
+class WatchList {
+public:
+    /// The publishers of one key; a few fit without an allocation.
+    using Publishers = boost::container::small_vector<std::shared_ptr<WatchPublisher>, 4>;
+
+    /// Adds the watch numbered `streamId`, which is higher than every one before it.
+    void add(std::shared_ptr<WatchPublisher> publisher, const std::string& key,
+             std::uint64_t streamId);
+
+    /// The publishers that watch exactly `key`, in order of creation.
+    Publishers watching(const std::string& key) const;
+
+    /// Removes a watch and gives the list's reference back; null when there is none.
+    std::shared_ptr<WatchPublisher> remove(std::uint64_t streamId);
+
+    /// Removes the oldest watch and gives the list's reference back; null when the list is empty.
+    std::shared_ptr<WatchPublisher> removeOldest();
+
+private:
+    struct PublisherEntry {
+        std::shared_ptr<WatchPublisher> publisher;
+        std::string key;
+        std::uint64_t streamId;
+    };
+
+    struct ByStreamId;
+    struct ByKey;
+
+    using Entries = boost::multi_index_container<
+        PublisherEntry,
+        boost::multi_index::indexed_by<
+            boost::multi_index::ordered_unique<
+                boost::multi_index::tag<ByStreamId>,
+                boost::multi_index::member<PublisherEntry, std::uint64_t,
+                                           &PublisherEntry::streamId>>,
+            boost::multi_index::hashed_non_unique<
+                boost::multi_index::tag<ByKey>,
+                boost::multi_index::member<PublisherEntry, std::string, &PublisherEntry::key>,
+                std::hash<std::string>>>>;
+
+    std::shared_ptr<WatchPublisher> take(Entries::iterator entry);
+
+    Entries entries;
+};
+
+}  // namespace velkor::configuration

@@ -1,0 +1,42 @@
+#pragma once
+
+#include <functional>
+#include <set>
+#include <string>
+
+#include "configuration/ConfigurationValue.hpp"
+#include "framework/common/Export.hpp"
+
+namespace velkor::configuration {
+
+/// Told by a source that the value of a source-relative key has changed.
+using ChangeListener = std::function<void(const std::string&)>;
+
+/// One layer of configuration: a flat table of values.
+///
+/// Keys are relative to the group under which the store registered the source. The store calls a
+/// source only while it holds its own mutex, so a source that is written through the store alone
+/// needs no lock. A source may call back into the store.
+class VELKOR_EXPORT ConfigurationSource {
+public:
+    virtual ~ConfigurationSource() = 0;
+
+    /// The value of `key`. Answers whenever `has(key)` does; otherwise it may throw anything.
+    virtual ConfigurationValue get(const std::string& key) = 0;
+
+    /// Stores `value`, calls the change listener, and returns the value that was replaced, or
+    /// `value` itself when the key is new. A source that can't be written throws.
+    virtual ConfigurationValue set(const std::string& key, ConfigurationValue value) = 0;
+
+    /// Whether there is a value for `key`.
+    virtual bool has(const std::string& key) = 0;
+
+    /// Replaces the listener; an empty one detaches. A source that changes by itself calls it once
+    /// for each changed key, after the new value can be read.
+    virtual void setChangeListener(ChangeListener listener) = 0;
+
+    /// All keys.
+    virtual std::set<std::string> keys() = 0;
+};
+
+}  // namespace velkor::configuration

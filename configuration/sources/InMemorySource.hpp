@@ -1,0 +1,36 @@
+#pragma once
+
+#include <memory>
+#include <set>
+#include <string>
+
+#include "configuration/sources/ConfigurationSource.hpp"
+
+namespace velkor::configuration {
+
+/// A writable layer held in memory. Not thread-safe by itself: the store serialises all calls.
+/// Made by `std::make_shared`.
+class VELKOR_EXPORT InMemorySource : public ConfigurationSource,
+                                     public std::enable_shared_from_this<InMemorySource> {
+public:
+    /// Takes over `values`, which is left empty. Starts without a listener.
+    explicit InMemorySource(ValueMap&& values);
+
+    /// A copy of the value of `key`; `std::out_of_range` "_Map_base::at" when there is none.
+    ConfigurationValue get(const std::string& key) override;
+
+    /// Stores `value`, then calls the listener, whether or not the value is a different one.
+    /// Returns the replaced value, or `value` when the key is new. What the listener throws passes
+    /// on; the value is stored by then.
+    ConfigurationValue set(const std::string& key, ConfigurationValue value) override;
+
+    bool has(const std::string& key) override;
+    void setChangeListener(ChangeListener newListener) override;
+    std::set<std::string> keys() override;
+
+private:
+    ValueMap values;
+    ChangeListener listener;
+};
+
+}  // namespace velkor::configuration

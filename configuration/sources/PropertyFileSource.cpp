@@ -1,0 +1,58 @@
+#include "configuration/sources/PropertyFileSource.hpp"
+
+#include <array>
+#include <istream>
+#include <stdexcept>
+
+#include "configuration/sources/PropertyFileParser.hpp"
+#include "configuration/sources/ValueTable.hpp"
+#include "framework/common/TextConversion.hpp"
+#include "framework/common/WidePathInputFileStream.hpp"
+
+namespace velkor::configuration {
+
+namespace {
+
+std::string readAll(std::istream& file) {
+    std::string text;
+    std::array<char, 64 * 1024> block;
+    do {
+        file.read(block.data(), block.size());
+        text.append(block.data(), static_cast<std::size_t>(file.gcount()));
+    } while (file);
+    return text;
+}
+
+}  // namespace
+
+PropertyFileSource::PropertyFileSource(const std::u16string& path) {
+    common::WidePathInputFileStream file(path);
+    if (!file) {
+        throw std::runtime_error("Property file could not be opened: " +
+                                 common::TextConversion("UTF-8").fromUtf16(path));
+    }
+    const std::string text = readAll(file);
+    PropertyFileParser(text, properties).parse();
+}
+
+ConfigurationValue PropertyFileSource::get(const std::string& key) {
+    return properties.at(key);
+}
+
+ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValue) {
+    throw std::runtime_error("PropertyFileSource does not support writing");
+}
+
+bool PropertyFileSource::has(const std::string& key) {
+    return properties.find(key) != properties.end();
+}
+
+void PropertyFileSource::setChangeListener(ChangeListener listener) {
+    changeListener.swap(listener);
+}
+
+std::set<std::string> PropertyFileSource::keys() {
+    return sortedKeys(properties);
+}
+
+}  // namespace velkor::configuration

@@ -1,0 +1,7 @@
+#include "framework/administration/CommandProvider.hpp"
+
+namespace velkor::administration {
+
+CommandProvider::~CommandProvider() = default;
+
+}  // namespace velkor::administration

@@ -1,0 +1,197 @@
+#pragma once
+
+#include <condition_variable>
+#include <cstdint>
+#include <exception>
+#include <memory>
+#include <stdexcept>
+#include <utility>
+#include <variant>
+
+#include "framework/common/Mutex.hpp"
+#include "framework/detail/FutureErrors.hpp"
+
+namespace velkor {
+
+template <class T>
+class Future;
+
+}  // namespace velkor
+
+namespace velkor::detail {
+
+/// Code that takes over the result of a state once there is one. Run at most once.
+template <class T>
+class Continuation {
+public:
+    virtual ~Continuation() = default;
+
+    /// Receives a future whose `get` answers at once. Runs on the thread that resolves the state,
+    /// or that attaches to a resolved one, with no lock of this library held by the state.
+    /// An exception passes on to that thread's caller.
+    virtual void invoke(Future<T>&& future) = 0;
+};
+
+/// How far a state has come.
+///
+///     pending ── setValue ───────────────────────> value       (final)
+///        │ ───── setException, promise destroyed ─> exception   (final)
+///        └────── cancel ──────────────────────────> cancelled   (final; later results are dropped)
+enum class FutureStatus : std::uint32_t { pending, value, exception, cancelled };
+
+/// What a promise and its future share: the result, and whether it was taken.
+///
+/// Thread-safe: every member may be called from any thread. Owned by shared pointers and made by
+/// `std::make_shared`; a caller holds a reference of its own during a call, since the other side
+/// may drop its one as soon as the result is in. No foreign code runs under the mutex: results are
+/// boxed before it is taken and destroyed after it is released, continuations are run and destroyed
+/// without it.
+template <class T>
+class SharedFutureState : public std::enable_shared_from_this<SharedFutureState<T>> {
+public:
+    /// A pending state.
+    SharedFutureState() = default;
+
+    /// A state that is born resolved with `value`.
+    explicit SharedFutureState(std::unique_ptr<T> value) noexcept
+        : result(std::move(value)), status(FutureStatus::value) {}
+
+    /// A state that is born resolved with `error`, which is not null.
+    explicit SharedFutureState(std::exception_ptr error) noexcept
+        : result(std::move(error)), status(FutureStatus::exception) {}
+
+    /// The future of this state. Throws `std::runtime_error` "Promise already returned a future."
+    /// unless it is the first call, or the first one since a continuation ran.
+    Future<T> retrieveFuture() VELKOR_EXCLUDES(mutex) {
+        const common::MutexLock lock(mutex);
+        if (futureRetrieved) throwFutureError(future_errors::futureAlreadyRetrieved);
+        futureRetrieved = true;
+        return Future<T>(this->shared_from_this());
+    }
+
+    /// Resolves with the boxed value. Nothing happens on a cancelled state. Throws
+    /// `std::runtime_error` "Promise already resolved." on a resolved one.
+    void setValue(std::unique_ptr<T> value) VELKOR_EXCLUDES(mutex) {
+        resolve(FutureStatus::value, std::move(value));
+    }
+
+    /// Resolves with `error`, which is not null; otherwise as `setValue`.
+    void setException(std::exception_ptr error) VELKOR_EXCLUDES(mutex) {
+        resolve(FutureStatus::exception, std::move(error));
+    }
+
+    /// The producer has gone: a pending state fails with "Promise destroyed before it provided a
+    /// value.".
+    void abandon() VELKOR_EXCLUDES(mutex) {
+        std::unique_ptr<Continuation<T>> next;
+        {
+            const common::MutexLock lock(mutex);
+            if (status == FutureStatus::pending) {
+                result = std::make_exception_ptr(std::runtime_error(future_errors::brokenPromise));
+                status = FutureStatus::exception;
+            }
+            next = claimContinuation();
+        }
+        run(std::move(next));
+    }
+
+    /// Attaches the one continuation. On a resolved state it is run at once, by this thread; on a
+    /// cancelled one it is destroyed without having run. Throws `std::runtime_error` with the text
+    /// of `get` when the result is taken or a continuation is attached already.
+    void attach(std::unique_ptr<Continuation<T>> next) VELKOR_EXCLUDES(mutex) {
+        {
+            const common::MutexLock lock(mutex);
+            requireUntaken();
+            if (status == FutureStatus::cancelled) return;
+            continuation = std::move(next);
+            if (status == FutureStatus::pending) return;
+            next = claimContinuation();
+        }
+        run(std::move(next));
+    }
+
+    /// Waits until there is a result and hands it over by move. Throws what the producer stored
+    /// (see `rethrowUnwrapped`), or `std::runtime_error` "Future already returned it's value or has
+    /// an associated continuation." or "Future has been cancelled.".
+    T get() VELKOR_EXCLUDES(mutex) {
+        common::MutexLock lock(mutex);
+        requireUntaken();
+        valueTaken = true;
+        while (status == FutureStatus::pending) lock.wait(ready);
+        // The claim above makes the result this thread's own: it is used without the lock.
+        const FutureStatus reached = status;
+        Result taken = std::move(result);
+        lock.unlock();
+        switch (reached) {
+            case FutureStatus::value:
+                return std::move(*std::get<std::unique_ptr<T>>(taken));
+            case FutureStatus::exception:
+                rethrowUnwrapped(std::get<std::exception_ptr>(std::move(taken)));
+            case FutureStatus::cancelled:
+                throwFutureError(future_errors::cancelled);
+            case FutureStatus::pending:
+                break;
+        }
+        throwFutureError(future_errors::invalidState);
+    }
+
+    /// Gives up a pending result: waiters wake and fail, a continuation is destroyed without
+    /// having run, later results are dropped. Nothing happens on a resolved state.
+    void cancel() VELKOR_EXCLUDES(mutex) {
+        std::unique_ptr<Continuation<T>> abandoned;
+        {
+            const common::MutexLock lock(mutex);
+            if (status != FutureStatus::pending) return;
+            status = FutureStatus::cancelled;
+            abandoned = std::move(continuation);
+        }
+        ready.notify_all();
+    }
+
+private:
+    /// The box of the value; the error; or an empty box while there is neither.
+    using Result = std::variant<std::unique_ptr<T>, std::exception_ptr>;
+
+    void resolve(FutureStatus outcome, Result boxed) VELKOR_EXCLUDES(mutex) {
+        std::unique_ptr<Continuation<T>> next;
+        {
+            const common::MutexLock lock(mutex);
+            if (status == FutureStatus::cancelled) return;
+            if (status != FutureStatus::pending) throwFutureError(future_errors::alreadyResolved);
+            result.swap(boxed);
+            status = outcome;
+            next = claimContinuation();
+        }
+        run(std::move(next));
+    }
+
+    void requireUntaken() const VELKOR_REQUIRES(mutex) {
+        if (valueTaken || continuation != nullptr) throwFutureError(future_errors::alreadyTaken);
+    }
+
+    /// Detaches the continuation of a resolved state, so that it is run by whoever got it here.
+    std::unique_ptr<Continuation<T>> claimContinuation() VELKOR_REQUIRES(mutex) {
+        if (continuation == nullptr) return nullptr;
+        futureRetrieved = false;
+        valueTaken = false;
+        return std::move(continuation);
+    }
+
+    void run(std::unique_ptr<Continuation<T>> next) VELKOR_EXCLUDES(mutex) {
+        if (next != nullptr) {
+            next->invoke(Future<T>(this->shared_from_this()));
+            next.reset();
+        }
+        ready.notify_all();
+    }
+
+    common::Mutex mutex;
+    std::condition_variable ready;
+    Result result VELKOR_GUARDED_BY(mutex);
+    std::unique_ptr<Continuation<T>> continuation VELKOR_GUARDED_BY(mutex);
+    FutureStatus status VELKOR_GUARDED_BY(mutex) = FutureStatus::pending;
+    bool futureRetrieved VELKOR_GUARDED_BY(mutex) = false;
+    bool valueTaken VELKOR_GUARDED_BY(mutex) = false;
+};
+
+}  // namespace velkor::detail
