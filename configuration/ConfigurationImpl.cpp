@@ -1,6 +1,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 
 #include <algorithm>
+#include <cstring>
 #include <exception>
 #include <iostream>
 #include <limits>
@@ -23,12 +24,17 @@ constexpr char groupSeparator = '.';
 constexpr std::size_t pooledScratchKeys = 4;
 
 bool appliesTo(const std::string& group, const std::string& key) {
-    return key.compare(0, group.size(), group) == 0;
+    return group.empty() ||
+           (key.size() >= group.size() && std::memcmp(key.data(), group.data(), group.size()) == 0);
 }
 
 std::string normalised(std::string group) {
     if (!group.empty() && group.back() != groupSeparator) group += groupSeparator;
     return group;
+}
+
+bool isForeign(const ConfigurationSource& source) {
+    return typeid(source) != typeid(InMemorySource) && typeid(source) != typeid(PropertyFileSource);
 }
 
 template <class T, class Error = std::runtime_error>
@@ -57,11 +63,12 @@ void reportSubscriberError(const std::string& key) noexcept {
 class ConfigurationImpl::Operation {
 public:
     explicit Operation(ConfigurationImpl& owner) : store(owner), held(owner.mutex) {
-        if (store.heldLevels++ == 0) keepAlive = store.weak_from_this().lock();
+        if (store.heldLevels++ == 0 && store.runsForeignCode)
+            keepAlive = store.weak_from_this().lock();
     }
 
     ~Operation() {
-        if (--store.heldLevels == 0) released.swap(store.retired);
+        if (--store.heldLevels == 0 && !store.retired.empty()) released.swap(store.retired);
     }
 
     Operation(const Operation&) = delete;
@@ -78,7 +85,8 @@ private:
     std::unique_lock<std::recursive_mutex> held;
 };
 
-/// A buffer of the store for a key that is not the caller's own string. Used with the mutex held.
+/// A buffer of the store for a form of one key that is not the caller's own string. Used with the
+/// mutex held.
 class ConfigurationImpl::ScratchKey {
 public:
     explicit ScratchKey(ConfigurationImpl& owner) : pool(owner.scratchKeys) {}
@@ -90,9 +98,14 @@ public:
     ScratchKey(const ScratchKey&) = delete;
     ScratchKey& operator=(const ScratchKey&) = delete;
 
-    /// `key` without `group`, which it begins with.
+    /// `key` without `group`, which it begins with. Groups of the same size cut off the same.
     const std::string& within(const std::string& group, const std::string& key) {
-        return group.empty() ? key : buffer().assign(key, group.size(), std::string::npos);
+        if (group.empty()) return key;
+        if (group.size() != cutOff) {
+            cutOff = group.size();
+            buffer().assign(key, cutOff, std::string::npos);
+        }
+        return text;
     }
 
     /// `key` with `group` in front.
@@ -112,6 +125,7 @@ private:
 
     std::vector<std::string>& pool;
     std::string text;
+    std::size_t cutOff = 0;
     bool borrowed = false;
 };
 
@@ -217,6 +231,7 @@ std::shared_ptr<reactive_streams::PublisherAPI<ConfigurationValue>> Configuratio
         };
         publisher = std::make_shared<WatchPublisher>(1, forget);
         publishers->add(publisher, key, streamId);
+        updateRunsForeignCode();
         ScratchKey scratch(*this);
         const Layer layer = findLayer(key, scratch);
         if (!layer) return publisher;
@@ -251,6 +266,7 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
     const ConfigurationSource& dynamicSource = *source;
     storeLogger.write(common::debug, "addSource: ", name, ", ", group, ", ", order, ", ", readOnly,
                       ", ", typeid(dynamicSource).name());
+    const auto keepAlive = weak_from_this().lock();
     Operation operation(*this);
     if (findSource(name) != nullptr) {
         return failed<bool, std::invalid_argument>(
@@ -259,8 +275,9 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
     const std::string prefix = normalised(group);
     insertSource(ConfigurationSourceMap(name, prefix, order, readOnly, source));
     for (const auto& key : source->keys()) updatePublishers(operation.lock(), prefix + key);
-    source->setChangeListener(
-        [this, prefix](const std::string& key) { onSourceChanged(prefix, key); });
+    source->setChangeListener([this, prefix](const std::string& key) {
+        if (changesAreNoticed()) onSourceChanged(prefix, key);
+    });
     return makeReadyFuture(true);
 }
 
@@ -347,19 +364,23 @@ Option ConfigurationImpl::readOption(const Layer& layer, const std::string& key)
 
 const ConfigurationImpl::ConfigurationSourceMap* ConfigurationImpl::findTarget(
     const std::string& key, const std::string* sourceName) const {
-    const auto target = std::find_if(sources->begin(), sources->end(), [&](const auto& entry) {
-        return !entry.readOnly && appliesTo(entry.group, key) &&
-               (sourceName == nullptr || entry.name == *sourceName);
-    });
-    return target == sources->end() ? nullptr : &*target;
+    for (const auto& entry : *sources) {
+        if (entry.readOnly || !appliesTo(entry.group, key)) continue;
+        if (sourceName == nullptr || entry.name == *sourceName) return &entry;
+    }
+    return nullptr;
 }
 
 Future<ConfigurationValue> ConfigurationImpl::write(const ConfigurationSourceMap& target,
                                                     const std::string& key,
-                                                    ConfigurationValue value) {
+                                                    ConfigurationValue&& value) {
     storeLogger.write(common::debug, "set: ", key, "@", target.name);
     ScratchKey scratch(*this);
     return makeReadyFuture(target.source->set(scratch.within(target.group, key), std::move(value)));
+}
+
+bool ConfigurationImpl::changesAreNoticed() const noexcept {
+    return runsForeignCode.load(std::memory_order_relaxed) || storeLogger.isEnabled(common::debug);
 }
 
 void ConfigurationImpl::onSourceChanged(const std::string& group, const std::string& key) {
@@ -371,6 +392,9 @@ void ConfigurationImpl::onSourceChanged(const std::string& group, const std::str
 void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>& lock,
                                          const std::string& key) {
     storeLogger.write(common::debug, "updatePublishers: ", key);
+    // Reading a value for nobody is left out where neither the log nor a source would show it.
+    const bool noticed = hasForeignSources || storeLogger.isEnabled(common::debug);
+    if (!noticed && !publishers->watches(key)) return;
     ConfigurationValue value;
     {
         ScratchKey scratch(*this);
@@ -400,6 +424,7 @@ void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>&
 void ConfigurationImpl::removeStream(std::uint64_t streamId) {
     const Operation operation(*this);
     if (auto publisher = publishers->remove(streamId)) retire(std::move(publisher));
+    updateRunsForeignCode();
 }
 
 const ConfigurationImpl::ConfigurationSourceMap* ConfigurationImpl::findSource(
@@ -430,6 +455,13 @@ void ConfigurationImpl::replaceSources(SourceList changed) {
     auto next = std::make_shared<const SourceList>(std::move(changed));
     retire(sources);
     sources = std::move(next);
+    hasForeignSources = std::any_of(sources->begin(), sources->end(),
+                                    [](const auto& entry) { return isForeign(*entry.source); });
+    updateRunsForeignCode();
+}
+
+void ConfigurationImpl::updateRunsForeignCode() {
+    runsForeignCode = hasForeignSources || !publishers->empty();
 }
 
 void ConfigurationImpl::retire(std::shared_ptr<const void> object) {

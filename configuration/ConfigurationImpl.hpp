@@ -139,22 +139,30 @@ private:
     const ConfigurationSourceMap* findTarget(const std::string& key,
                                              const std::string* sourceName) const;
     Future<ConfigurationValue> write(const ConfigurationSourceMap& target, const std::string& key,
-                                     ConfigurationValue value);
+                                     ConfigurationValue&& value);
     ConfigurationValue readValue(const Layer& layer, const std::string& key);
     Option readOption(const Layer& layer, const std::string& key);
+    bool changesAreNoticed() const noexcept;
     void onSourceChanged(const std::string& group, const std::string& key);
     void deliver(const std::string& key, const ConfigurationValue& value);
     const ConfigurationSourceMap* findSource(const std::string& name) const;
     void insertSource(ConfigurationSourceMap entry);
     void eraseSource(const std::string& name);
     void replaceSources(SourceList changed);
+    void updateRunsForeignCode();
     void retire(std::shared_ptr<const void> object);
 
     std::atomic<std::uint64_t> nextStreamId{0};
     // In order of precedence. Never changed in place: a walk goes on over the list it began with
     // when a source that it calls adds or removes sources.
     std::shared_ptr<const SourceList> sources;
+    // Sources that are not this library's own.
+    bool hasForeignSources = false;
     std::unique_ptr<WatchList> publishers;
+    // There are watchers or foreign sources. Only then can an operation lose the store to a
+    // callback, and does a change of a source concern anybody. Read without the mutex by sources'
+    // listeners.
+    std::atomic<bool> runsForeignCode{false};
     // Levels of the mutex that are held by operations, and what these have let go of.
     std::size_t heldLevels = 0;
     std::vector<std::shared_ptr<const void>> retired;

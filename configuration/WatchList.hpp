@@ -31,6 +31,11 @@ public:
     void add(std::shared_ptr<WatchPublisher> publisher, const std::string& key,
              std::uint64_t streamId);
 
+    bool empty() const { return entries.empty(); }
+
+    /// Whether there is a watch of exactly `key`.
+    bool watches(const std::string& key) const;
+
     /// The publishers that watch exactly `key`, in order of creation.
     Publishers watching(const std::string& key) const;
 

@@ -2,32 +2,32 @@
 
 #include <utility>
 
-#include "configuration/sources/ValueTable.hpp"
-
 namespace velkor::configuration {
 
-InMemorySource::InMemorySource(ValueMap&& initialValues) {
-    values.swap(initialValues);
-}
+InMemorySource::InMemorySource(ValueMap&& initialValues) : values(std::move(initialValues)) {}
 
 ConfigurationValue InMemorySource::get(const std::string& key) {
     return values.at(key);
 }
 
 ConfigurationValue InMemorySource::set(const std::string& key, ConfigurationValue value) {
-    ConfigurationValue answer;
-    if (const auto entry = values.find(key); entry != values.end()) {
-        answer = std::exchange(entry->second, std::move(value));
-    } else {
-        answer = value;
-        values.emplace(key, std::move(value));
+    if (ConfigurationValue* present = values.find(key)) {
+        ConfigurationValue replaced = std::exchange(*present, std::move(value));
+        notify(key);
+        return replaced;
     }
-    if (listener) listener(key);
+    ConfigurationValue answer = value;
+    values.insert(key, std::move(value));
+    notify(key);
     return answer;
 }
 
+void InMemorySource::notify(const std::string& key) {
+    if (listener) listener(key);
+}
+
 bool InMemorySource::has(const std::string& key) {
-    return values.find(key) != values.end();
+    return std::as_const(values).find(key) != nullptr;
 }
 
 void InMemorySource::setChangeListener(ChangeListener newListener) {
@@ -35,7 +35,7 @@ void InMemorySource::setChangeListener(ChangeListener newListener) {
 }
 
 std::set<std::string> InMemorySource::keys() {
-    return sortedKeys(values);
+    return values.keys();
 }
 
 }  // namespace velkor::configuration

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "configuration/sources/ConfigurationSource.hpp"
+#include "configuration/sources/ValueTable.hpp"
 
 namespace velkor::configuration {
 
@@ -13,8 +14,8 @@ namespace velkor::configuration {
 class VELKOR_EXPORT InMemorySource : public ConfigurationSource,
                                      public std::enable_shared_from_this<InMemorySource> {
 public:
-    /// Takes over `values`, which is left empty. Starts without a listener.
-    explicit InMemorySource(ValueMap&& values);
+    /// Takes over `initialValues`, which is left empty. Starts without a listener.
+    explicit InMemorySource(ValueMap&& initialValues);
 
     /// A copy of the value of `key`; `std::out_of_range` "_Map_base::at" when there is none.
     ConfigurationValue get(const std::string& key) override;
@@ -29,7 +30,9 @@ public:
     std::set<std::string> keys() override;
 
 private:
-    ValueMap values;
+    void notify(const std::string& key);
+
+    ValueTable values;
     ChangeListener listener;
 };
 

@@ -5,7 +5,6 @@
 #include <stdexcept>
 
 #include "configuration/sources/PropertyFileParser.hpp"
-#include "configuration/sources/ValueTable.hpp"
 #include "framework/common/TextConversion.hpp"
 #include "framework/common/WidePathInputFileStream.hpp"
 
@@ -23,17 +22,22 @@ std::string readAll(std::istream& file) {
     return text;
 }
 
-}  // namespace
-
-PropertyFileSource::PropertyFileSource(const std::u16string& path) {
+ValueMap readProperties(const std::u16string& path) {
     common::WidePathInputFileStream file(path);
     if (!file) {
         throw std::runtime_error("Property file could not be opened: " +
                                  common::TextConversion("UTF-8").fromUtf16(path));
     }
     const std::string text = readAll(file);
+    ValueMap properties;
     PropertyFileParser(text, properties).parse();
+    return properties;
 }
+
+}  // namespace
+
+PropertyFileSource::PropertyFileSource(const std::u16string& path)
+    : properties(readProperties(path)) {}
 
 ConfigurationValue PropertyFileSource::get(const std::string& key) {
     return properties.at(key);
@@ -44,7 +48,7 @@ ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValu
 }
 
 bool PropertyFileSource::has(const std::string& key) {
-    return properties.find(key) != properties.end();
+    return properties.find(key) != nullptr;
 }
 
 void PropertyFileSource::setChangeListener(ChangeListener listener) {
@@ -52,7 +56,7 @@ void PropertyFileSource::setChangeListener(ChangeListener listener) {
 }
 
 std::set<std::string> PropertyFileSource::keys() {
-    return sortedKeys(properties);
+    return properties.keys();
 }
 
 }  // namespace velkor::configuration

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "configuration/sources/ConfigurationSource.hpp"
+#include "configuration/sources/ValueTable.hpp"
 
 namespace velkor::configuration {
 
@@ -34,7 +35,7 @@ public:
     std::set<std::string> keys() override;
 
 private:
-    ValueMap properties;
+    ValueTable properties;
     ChangeListener changeListener;
 };
 
