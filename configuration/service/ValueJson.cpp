@@ -1,0 +1,191 @@
+#include "configuration/service/ValueJson.hpp"
+
+#include <Poco/NumberParser.h>
+
+#include <algorithm>
+#include <limits>
+#include <new>
+#include <type_traits>
+#include <typeinfo>
+
+#include "framework/common/TextConversion.hpp"
+
+namespace velkor::configuration {
+
+namespace {
+
+using Poco::NumberParser;
+using Poco::Dynamic::Var;
+using Poco::JSON::Array;
+using Poco::JSON::Object;
+
+template <class T>
+const T* heldBy(const Var& json) {
+    return json.type() == typeid(T) ? &json.extract<T>() : nullptr;
+}
+
+bool parse(const std::string& text, bool& content) {
+    return NumberParser::tryParseBool(text, content);
+}
+
+bool parse(const std::string& text, int& content) {
+    return NumberParser::tryParse(text, content);
+}
+
+bool parse(const std::string& text, unsigned int& content) {
+    return NumberParser::tryParseUnsigned(text, content);
+}
+
+bool parse(const std::string& text, double& content) {
+    return NumberParser::tryParseFloat(text, content);
+}
+
+template <class T>
+void readText(const std::string& text, T& content) {
+    T parsed{};
+    if (parse(text, parsed)) content = parsed;
+}
+
+// POCO's limits for numbers with a fraction leave out the smallest signed integer. A number that is
+// not finite is beyond any limits.
+template <class T>
+void readNumber(const Var& json, T& content) {
+    constexpr double highest = std::numeric_limits<T>::max();
+    constexpr double lowestInteger = std::numeric_limits<T>::min();
+    constexpr double lowestFraction = std::is_signed_v<T> ? -highest : 0;
+    const auto number = json.convert<double>();
+    const double lowest = json.isInteger() ? lowestInteger : lowestFraction;
+    if (number >= lowest && number <= highest) content = static_cast<T>(number);
+}
+
+template <class T>
+void convert(const Var& json, T& content) {
+    try {
+        content = json.convert<T>();
+    } catch (const std::bad_alloc&) {
+        throw;
+    } catch (...) {
+        return;  // the default stays
+    }
+}
+
+// Whatever is often refused is found out without an exception: hostile text can hold millions of
+// elements that do not convert.
+template <class T>
+void readScalar(const Var& json, T& content) {
+    if (json.isEmpty()) return;
+    if (const auto* text = heldBy<std::string>(json)) {
+        readText(*text, content);
+    } else if (std::is_same_v<T, bool> || (asObject(json) == nullptr && asArray(json) == nullptr)) {
+        convert(json, content);
+    }
+}
+
+template <class T>
+void readInteger(const Var& json, T& content) {
+    json.isNumeric() ? readNumber(json, content) : readScalar(json, content);
+}
+
+common::TextConversion utf8() {
+    return common::TextConversion("UTF-8");
+}
+
+}  // namespace
+
+Var toJson(bool content) {
+    return content;
+}
+
+Var toJson(int content) {
+    return content;
+}
+
+Var toJson(unsigned int content) {
+    return content;
+}
+
+Var toJson(double content) {
+    return content;
+}
+
+Var toJson(const std::u16string& content) {
+    return utf8().fromUtf16(content);
+}
+
+Var toJson(const std::string& content) {
+    return content;
+}
+
+Var toJson(const ConfigurationValue& content) {
+    Object::Ptr object = new Object;
+    object->set("type", std::string(typeTags[static_cast<std::size_t>(content.which())]));
+    object->set("value",
+                boost::apply_visitor([](const auto& held) { return toJson(held); }, content));
+    return object;
+}
+
+void readJson(const Var& json, bool& content) {
+    readScalar(json, content);
+}
+
+void readJson(const Var& json, int& content) {
+    readInteger(json, content);
+}
+
+void readJson(const Var& json, unsigned int& content) {
+    readInteger(json, content);
+}
+
+void readJson(const Var& json, double& content) {
+    readScalar(json, content);
+}
+
+void readJson(const Var& json, std::u16string& content) {
+    std::string text;
+    readJson(json, text);
+    content = utf8().toUtf16(text);
+}
+
+void readJson(const Var& json, std::string& content) {
+    if (!json.isEmpty()) convert(json, content);
+}
+
+void readJson(const Var& json, ConfigurationValue& content) {
+    content = std::string();
+    const Object* const object = asObject(json);
+    if (object == nullptr) return;
+    std::string tag;
+    readMember(*object, "type", tag);
+    forEachValueKind([&](const auto& kind) {
+        if (kind.tag != tag) return;
+        typename std::decay_t<decltype(kind)>::Type held{};
+        readMember(*object, "value", held);
+        content = std::move(held);
+    });
+}
+
+const Object* asObject(const Var& json) {
+    const auto* const object = heldBy<Object::Ptr>(json);
+    return object == nullptr ? nullptr : object->get();
+}
+
+const Array* asArray(const Var& json) {
+    const auto* const array = heldBy<Array::Ptr>(json);
+    return array == nullptr ? nullptr : array->get();
+}
+
+// POCO's own look-up hands out a copy. The objects of messages are so small that searching them
+// from one end is as fast as it gets.
+const Var* findMember(const Object& object, const char* name) {
+    const auto member = std::find_if(object.begin(), object.end(),
+                                     [&](const auto& entry) { return entry.first == name; });
+    return member == object.end() ? nullptr : &member->second;
+}
+
+Array::Ptr makeArray(std::size_t size) {
+    Array::Ptr array = new Array;
+    if (size != 0) array->set(static_cast<unsigned int>(size - 1), Var());
+    return array;
+}
+
+}  // namespace velkor::configuration

@@ -1,0 +1,7 @@
+#include "framework/DeferredService.hpp"
+
+namespace velkor {
+
+DeferredService::~DeferredService() = default;
+
+}  // namespace velkor

@@ -1,0 +1,7 @@
+#include "framework/json/JsonSerializer.hpp"
+
+namespace velkor::json {
+
+JsonSerializer::~JsonSerializer() = default;
+
+}  // namespace velkor::json
