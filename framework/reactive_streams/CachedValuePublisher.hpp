@@ -113,20 +113,11 @@ public:
     /// Delivers a copy of `value` at once when the subscriber waits for one, else keeps it,
     /// dropping the oldest kept ones beyond the capacity. Does nothing once the stream has ended.
     void publish(const T& value) VELKOR_EXCLUDES(mutex) {
-        T copy(value);
         std::list<T> dropped;
-        std::shared_ptr<Subscriber<T>> waiting;
-        {
-            const common::MutexLock lock(mutex);
-            if (state > State::completing) return;
-            if (demand > 0 && queue.empty()) {
-                --demand;
-                waiting = subscriber;
-            } else {
-                dropped = enqueue(std::move(copy));
-            }
+        T copy(value);
+        if (const auto waiting = keepUnlessAwaited(copy, dropped)) {
+            return waiting->onNext(std::move(copy));
         }
-        if (waiting) return waiting->onNext(std::move(copy));
         const auto keepAlive = this->weak_from_this().lock();
         drain();
     }
@@ -213,12 +204,20 @@ private:
         announce(*ending);
     }
 
-    /// Appends `value` and gives back what no longer fits, for destruction without the mutex.
-    std::list<T> enqueue(T&& value) VELKOR_REQUIRES(mutex) {
+    /// The subscriber when it waits for `value`, which is then demanded by one less. Otherwise
+    /// null, and `value` is moved into the queue unless the stream has ended; `dropped` takes what
+    /// no longer fits, for destruction without the mutex.
+    std::shared_ptr<Subscriber<T>> keepUnlessAwaited(T& value, std::list<T>& dropped)
+        VELKOR_EXCLUDES(mutex) {
+        const common::MutexLock lock(mutex);
+        if (state > State::completing) return nullptr;
+        if (demand > 0 && queue.empty()) {
+            --demand;
+            return subscriber;
+        }
         queue.push_back(std::move(value));
-        std::list<T> excess;
-        while (queue.size() > capacity) excess.splice(excess.end(), queue, queue.begin());
-        return excess;
+        while (queue.size() > capacity) dropped.splice(dropped.end(), queue, queue.begin());
+        return nullptr;
     }
 
     /// Delivers what is queued as far as there is demand. A call from inside `onNext` leaves that
