@@ -25,4 +25,7 @@ WidePathInputFileStream::WidePathInputFileStream(const std::u16string& path) {
     }
 }
 
+// Defined here, so that the class has its virtual table in this library only.
+WidePathInputFileStream::~WidePathInputFileStream() = default;
+
 }  // namespace velkor::common

@@ -14,6 +14,7 @@ public:
     /// that can't be opened leaves the stream closed and failed; so does a path that names a
     /// directory or holds a NUL.
     explicit WidePathInputFileStream(const std::u16string& path);
+    ~WidePathInputFileStream() override;
 };
 
 }  // namespace velkor::common
