@@ -274,7 +274,10 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
     }
     const std::string prefix = normalised(group);
     insertSource(ConfigurationSourceMap(name, prefix, order, readOnly, source));
-    for (const auto& key : source->keys()) updatePublishers(operation.lock(), prefix + key);
+    const auto keys = source->keys();
+    if (changesAreNoticed()) {
+        for (const auto& key : keys) updatePublishers(operation.lock(), prefix + key);
+    }
     source->setChangeListener([this, prefix](const std::string& key) {
         if (changesAreNoticed()) onSourceChanged(prefix, key);
     });

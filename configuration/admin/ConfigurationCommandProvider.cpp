@@ -1,6 +1,5 @@
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 
-#include <clocale>
 #include <cstdint>
 #include <locale>
 #include <sstream>

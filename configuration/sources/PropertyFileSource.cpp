@@ -2,6 +2,7 @@
 
 #include <array>
 #include <istream>
+#include <locale>
 #include <stdexcept>
 
 #include "configuration/sources/PropertyFileParser.hpp"
@@ -12,13 +13,15 @@ namespace velkor::configuration {
 
 namespace {
 
+// Everything up to the end of the file or to the first byte that can't be read: `peek` fills the
+// stream's buffer, and `readsome` takes what is in it, so that an error costs no byte before it.
 std::string readAll(std::istream& file) {
     std::string text;
-    std::array<char, 64 * 1024> block;
-    do {
-        file.read(block.data(), block.size());
-        text.append(block.data(), static_cast<std::size_t>(file.gcount()));
-    } while (file);
+    std::array<char, 8 * 1024> block;
+    while (file.peek() != std::istream::traits_type::eof()) {
+        const std::streamsize size = file.readsome(block.data(), block.size());
+        text.append(block.data(), static_cast<std::size_t>(size));
+    }
     return text;
 }
 
@@ -28,6 +31,8 @@ ValueMap readProperties(const std::u16string& path) {
         throw std::runtime_error("Property file could not be opened: " +
                                  common::TextConversion("UTF-8").fromUtf16(path));
     }
+    // A stream begins with the host's locale, which may convert what is read.
+    file.imbue(std::locale::classic());
     const std::string text = readAll(file);
     ValueMap properties;
     PropertyFileParser(text, properties).parse();

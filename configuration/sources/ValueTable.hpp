@@ -2,6 +2,7 @@
 
 #include <atomic>
 #include <set>
+#include <stdexcept>
 #include <string>
 #include <utility>
 
@@ -38,7 +39,9 @@ public:
     /// A copy of the value of `key`; `std::out_of_range` "_Map_base::at" when there is none.
     ConfigurationValue at(const std::string& key) const {
         const ConfigurationValue* value = find(key);
-        return value != nullptr ? *value : entries.at(key);
+        // The text of the standard library's own look-up depends on its version.
+        if (value == nullptr) throw std::out_of_range("_Map_base::at");
+        return *value;
     }
 
     /// Stores `value` under `key`, which is new.
