@@ -1,0 +1,79 @@
+#include "tests/support/AllocationCounter.hpp"
+
+#include <cstdlib>
+#include <limits>
+#include <new>
+
+namespace velkor::testing {
+
+namespace {
+
+constexpr std::size_t never = std::numeric_limits<std::size_t>::max();
+
+thread_local std::size_t allocations = 0;
+thread_local std::size_t successesLeft = never;
+
+void countAllocation() {
+    ++allocations;
+    if (successesLeft == never) return;
+    if (successesLeft == 0) {
+        successesLeft = never;
+        throw std::bad_alloc();
+    }
+    --successesLeft;
+}
+
+void* require(void* memory) {
+    if (memory == nullptr) throw std::bad_alloc();
+    return memory;
+}
+
+}  // namespace
+
+std::size_t allocationsOfThisThread() noexcept {
+    return allocations;
+}
+
+AllocationFailure::AllocationFailure(std::size_t successes) noexcept {
+    successesLeft = successes;
+}
+
+AllocationFailure::~AllocationFailure() {
+    successesLeft = never;
+}
+
+bool AllocationFailure::hasHappened() const noexcept {
+    return successesLeft == never;
+}
+
+}  // namespace velkor::testing
+
+// The array and nothrow forms of the standard library call these.
+
+void* operator new(std::size_t size) {
+    velkor::testing::countAllocation();
+    return velkor::testing::require(std::malloc(size == 0 ? 1 : size));
+}
+
+void* operator new(std::size_t size, std::align_val_t alignment) {
+    velkor::testing::countAllocation();
+    const auto unit = static_cast<std::size_t>(alignment);
+    const std::size_t rounded = (size + unit - 1) / unit * unit;
+    return velkor::testing::require(std::aligned_alloc(unit, rounded == 0 ? unit : rounded));
+}
+
+void operator delete(void* memory) noexcept {
+    std::free(memory);
+}
+
+void operator delete(void* memory, std::size_t) noexcept {
+    std::free(memory);
+}
+
+void operator delete(void* memory, std::align_val_t) noexcept {
+    std::free(memory);
+}
+
+void operator delete(void* memory, std::size_t, std::align_val_t) noexcept {
+    std::free(memory);
+}

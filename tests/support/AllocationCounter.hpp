@@ -1,0 +1,36 @@
+#pragma once
+
+#include <cstddef>
+
+namespace velkor::testing {
+
+/// How often the calling thread has called operator new since it began.
+///
+/// Programs that link velkor-allocation-counter have the global operators new and delete replaced;
+/// the libraries that they load use the replacements, too. The target does not exist under the
+/// sanitizers, which bring operators of their own.
+std::size_t allocationsOfThisThread() noexcept;
+
+/// The number of allocations that `callable` makes on the calling thread.
+template <class Callable>
+std::size_t countAllocations(Callable&& callable) {
+    const std::size_t before = allocationsOfThisThread();
+    callable();
+    return allocationsOfThisThread() - before;
+}
+
+/// Lets one allocation of the calling thread fail with `std::bad_alloc` while it lives: the first
+/// one after `successes` more that succeed.
+class AllocationFailure {
+public:
+    explicit AllocationFailure(std::size_t successes) noexcept;
+    ~AllocationFailure();
+
+    AllocationFailure(const AllocationFailure&) = delete;
+    AllocationFailure& operator=(const AllocationFailure&) = delete;
+
+    /// Whether the allocation that was to fail has been reached.
+    bool hasHappened() const noexcept;
+};
+
+}  // namespace velkor::testing
