@@ -1,0 +1,184 @@
+#include "host/Options.hpp"
+
+#include <CLI/CLI.hpp>
+#include <algorithm>
+#include <charconv>
+#include <iterator>
+#include <string_view>
+#include <utility>
+
+#include "host/Severities.hpp"
+
+namespace velkor::host {
+
+namespace {
+
+constexpr const char* description =
+    "Looks into a layered configuration, and changes it, by commands.\n"
+    "Commands are read from the terminal or from standard input; 'help' lists them.";
+
+constexpr const char* footer =
+    "Values of later sources override those of earlier ones, and what 'set' writes overrides\n"
+    "them all, unless an order says otherwise: the smaller order wins.\n"
+    "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
+    "separated by commas.\n"
+    "\n"
+    "Exit status: 0 fine, 1 a command failed, 2 bad usage, 3 a source could not be loaded.";
+
+constexpr const char* groupSetting = "group=";
+constexpr const char* orderSetting = "order=";
+constexpr const char* writableSetting = "writable";
+
+[[noreturn]] void fail(const std::string& option, const std::string& text,
+                       const std::string& reason) {
+    throw UsageError(option + ' ' + text + ": " + reason);
+}
+
+std::vector<std::string> splitAtCommas(const std::string& text) {
+    std::vector<std::string> parts(1);
+    for (const char byte : text) {
+        if (byte == ',') {
+            parts.emplace_back();
+        } else {
+            parts.back() += byte;
+        }
+    }
+    return parts;
+}
+
+std::optional<std::string> valueOf(std::string_view setting, std::string_view name) {
+    if (setting.substr(0, name.size()) != name) return std::nullopt;
+    return std::string(setting.substr(name.size()));
+}
+
+std::optional<int> parseOrder(const std::string& text) {
+    int order = 0;
+    const char* end = text.data() + text.size();
+    const auto [parsedEnd, error] = std::from_chars(text.data(), end, order);
+    if (error != std::errc() || parsedEnd != end) return std::nullopt;
+    return order;
+}
+
+void applySetting(SourceRequest& request, const std::string& setting, const std::string& text) {
+    if (const auto group = valueOf(setting, groupSetting)) {
+        request.group = *group;
+    } else if (const auto orderText = valueOf(setting, orderSetting)) {
+        const auto order = parseOrder(*orderText);
+        if (!order) fail("--source", text, "the order is no number of 32 bits: " + *orderText);
+        request.order = *order;
+    } else if (setting == writableSetting) {
+        request.writable = true;
+    } else {
+        fail("--source", text, "unknown setting: " + setting);
+    }
+}
+
+// The parsing library takes a text in brackets for a list. A byte in front that no argument can
+// hold keeps it from looking so.
+constexpr char guard = '\0';
+
+std::string guarded(const std::string& argument) {
+    return !argument.empty() && argument.front() == '[' ? guard + argument : argument;
+}
+
+std::string unguarded(const std::string& text) {
+    return !text.empty() && text.front() == guard ? text.substr(1) : text;
+}
+
+/// The command line's options, as the parsing library knows them.
+class Parser {
+public:
+    Parser() {
+        app.set_help_flag("-h,--help", "Show this text.");
+        app.set_version_flag("--version", "velkor-config " VELKOR_VERSION, "Show the version.");
+        add(files, "FILE", "", "A property file, added as a read-only source.");
+        add(sources, "--source", "NAME=PATH[,group=G][,order=N][,writable]",
+            "A property file with all that a source has.");
+        add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
+        add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
+        app.footer(footer);
+    }
+
+    Options parse(const std::vector<std::string>& arguments) {
+        Options options;
+        try {
+            std::vector<std::string> reversed;
+            std::transform(arguments.rbegin(), arguments.rend(), std::back_inserter(reversed),
+                           guarded);
+            app.parse(std::move(reversed));
+        } catch (const CLI::CallForHelp&) {
+            options.information = app.help();
+            return options;
+        } catch (const CLI::CallForVersion&) {
+            options.information = app.version();
+            return options;
+        } catch (const CLI::ParseError& error) {
+            throw UsageError(std::string(error.what()) + " (see --help)");
+        }
+        for (const auto& text : lines.texts) options.lines.push_back(unguarded(text));
+        for (const auto& text : logs.texts) options.logs.push_back(parseLog(unguarded(text)));
+        collectSources(options);
+        return options;
+    }
+
+private:
+    struct Repeatable {
+        CLI::Option* option = nullptr;
+        std::vector<std::string> texts{};
+    };
+
+    void add(Repeatable& added, const char* name, const char* value, const char* help) {
+        added.option = app.add_option(name, added.texts, help);
+        added.option->allow_extra_args(added.option->get_positional())->type_name(value);
+    }
+
+    // Files and --source options may be mixed: their order on the command line matters.
+    void collectSources(Options& options) const {
+        auto file = files.texts.begin();
+        auto source = sources.texts.begin();
+        for (const CLI::Option* option : app.parse_order()) {
+            if (option == files.option) {
+                options.sources.push_back(SourceRequest{std::nullopt, unguarded(*file++)});
+            } else if (option == sources.option) {
+                options.sources.push_back(parseSource(unguarded(*source++)));
+            }
+        }
+    }
+
+    CLI::App app{description, "velkor-config"};
+    Repeatable files;
+    Repeatable sources;
+    Repeatable lines;
+    Repeatable logs;
+};
+
+}  // namespace
+
+Options parseOptions(const std::vector<std::string>& arguments) {
+    return Parser().parse(arguments);
+}
+
+SourceRequest parseSource(const std::string& text) {
+    const auto parts = splitAtCommas(text);
+    const std::size_t equals = parts.front().find('=');
+    if (equals == std::string::npos || equals == 0 || equals + 1 == parts.front().size()) {
+        fail("--source", text, "NAME=PATH is needed");
+    }
+    SourceRequest request{parts.front().substr(0, equals), parts.front().substr(equals + 1)};
+    for (std::size_t i = 1; i < parts.size(); ++i) applySetting(request, parts[i], text);
+    return request;
+}
+
+LogRequest parseLog(const std::string& text) {
+    const std::size_t equals = text.find('=');
+    if (equals == std::string::npos || equals == 0) {
+        fail("--log", text, "CHANNEL=SEVERITIES is needed");
+    }
+    try {
+        return {text.substr(0, equals), parseSeverities(text.substr(equals + 1))};
+    } catch (const std::invalid_argument& error) {
+        fail("--log", text, error.what());
+    }
+}
+
+}  // namespace velkor::host

@@ -1,0 +1,159 @@
+#include "host/Program.hpp"
+
+#include <unistd.h>
+
+#include <cerrno>
+#include <iostream>
+#include <memory>
+#include <optional>
+#include <system_error>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "configuration/admin/ConfigurationCommandProvider.hpp"
+#include "configuration/service/ConfigurationJsonSerialization.hpp"
+#include "configuration/service/ConfigurationServiceProviderImpl.hpp"
+#include "framework/common/DiagnosticLogger.hpp"
+#include "host/CommandRegistry.hpp"
+#include "host/Completer.hpp"
+#include "host/Console.hpp"
+#include "host/GivenLines.hpp"
+#include "host/HostCommands.hpp"
+#include "host/LineEditor.hpp"
+#include "host/LineReader.hpp"
+#include "host/LogSink.hpp"
+#include "host/Options.hpp"
+#include "host/Output.hpp"
+#include "host/SendCommand.hpp"
+#include "host/SourceLoader.hpp"
+#include "host/ValueText.hpp"
+#include "host/Watches.hpp"
+#include "host/messages/MessageDispatcher.hpp"
+
+namespace velkor::host {
+
+namespace {
+
+using configuration::ConfigurationImpl;
+
+bool isTerminal(int descriptor) {
+    return isatty(descriptor) == 1;
+}
+
+/// The service that answers messages, and the way to it.
+class MessageService {
+public:
+    explicit MessageService(const std::shared_ptr<ConfigurationImpl>& store)
+        : serializer(std::make_shared<JsonSerializerImpl>()),
+          serialization(serializer),
+          provider(std::make_shared<configuration::ConfigurationServiceProviderImpl>(store)),
+          messages(std::make_shared<MessageDispatcher>(serializer, provider)) {
+        provider->setRunning(true);
+    }
+
+    const std::shared_ptr<const MessageDispatcher>& dispatcher() const { return messages; }
+
+private:
+    std::shared_ptr<JsonSerializerImpl> serializer;
+    configuration::ConfigurationJsonSerialization serialization;
+    std::shared_ptr<configuration::ConfigurationServiceProviderImpl> provider;
+    std::shared_ptr<const MessageDispatcher> messages;
+};
+
+/// The store with everything that can be done to it on the console.
+class Session {
+public:
+    explicit Session(Output& sessionOutput)
+        : output(sessionOutput),
+          store(std::make_shared<ConfigurationImpl>()),
+          registry(std::make_shared<CommandRegistry>()),
+          console(registry, output),
+          service(store),
+          storeCommands(store, registry),
+          sendCommand(service.dispatcher(), registry),
+          hostCommands(
+              {store, std::make_shared<Watches>(store, showValue()), [this] { console.quit(); }},
+              registry) {}
+
+    /// Gives whether all sources could be added; reports those that could not.
+    bool load(const std::vector<SourceRequest>& requests) {
+        const auto failures = loadSources(*store, requests);
+        for (const auto& failure : failures) output.message(failure);
+        return failures.empty();
+    }
+
+    /// Carries out the given lines or, when there are none, those that are typed or read.
+    bool run(const std::vector<std::string>& lines) {
+        const auto source = makeLineSource(lines);
+        return console.run(*source);
+    }
+
+private:
+    // Only commands change the store, so that a value is shown between two lines, never while one
+    // is being edited.
+    Watches::Show showValue() {
+        return
+            [this](const auto& key, const auto& value) { output.answer(optionText(key, value)); };
+    }
+
+    std::unique_ptr<LineSource> makeLineSource(const std::vector<std::string>& lines) {
+        if (!lines.empty()) return std::make_unique<GivenLines>(lines);
+        if (!isTerminal(STDIN_FILENO) || !isTerminal(STDOUT_FILENO)) {
+            return std::make_unique<LineReader>(std::cin);
+        }
+        const Completer completer(registry, [store = store] {
+            const auto keys = store->keys().get();
+            return std::vector<std::string>(keys.begin(), keys.end());
+        });
+        return std::make_unique<LineEditor>(
+            [completer](const std::string& line) { return completer.complete(line); });
+    }
+
+    Output& output;
+    std::shared_ptr<ConfigurationImpl> store;
+    std::shared_ptr<CommandRegistry> registry;
+    Console console;
+    MessageService service;
+    configuration::ConfigurationCommandProvider storeCommands;
+    SendCommand sendCommand;
+    HostCommands hostCommands;
+};
+
+/// A reader that has gone away is no failure; a full disk is.
+bool answersArrived(Output& output) {
+    if (output.isOpen() || output.failure() == EPIPE) return true;
+    output.message("Standard output can't be written: " +
+                   std::system_category().message(output.failure()));
+    return false;
+}
+
+ExitCode runSession(const Options& options, Output& output) {
+    std::optional<LogSink> logSink;
+    if (!options.logs.empty()) logSink.emplace(std::cerr);
+    for (const auto& log : options.logs) {
+        common::DiagnosticLogger::enable(log.channel, log.severities);
+    }
+    Session session(output);
+    if (!session.load(options.sources)) return ExitCode::sourceNotLoaded;
+    return session.run(options.lines) ? ExitCode::fine : ExitCode::commandFailed;
+}
+
+}  // namespace
+
+ExitCode runProgram(const std::vector<std::string>& arguments) {
+    Output output(std::cout,
+                  isTerminal(STDOUT_FILENO) ? Output::Answers::escaped : Output::Answers::exact,
+                  std::cerr);
+    ExitCode exitCode = ExitCode::fine;
+    try {
+        const Options options = parseOptions(arguments);
+        output.answer(options.information);
+        if (options.information.empty()) exitCode = runSession(options, output);
+    } catch (const UsageError& error) {
+        output.message(error.what());
+        return ExitCode::badUsage;
+    }
+    if (answersArrived(output)) return exitCode;
+    return exitCode == ExitCode::fine ? ExitCode::commandFailed : exitCode;
+}
+
+}  // namespace velkor::host

@@ -1,0 +1,150 @@
+#include "host/Options.hpp"
+
+#include <gtest/gtest.h>
+
+#include <optional>
+#include <ostream>
+#include <string>
+#include <vector>
+
+#include "tests/support/Thrown.hpp"
+
+namespace velkor::host {
+namespace {
+
+using velkor::testing::thrownText;
+using Words = std::vector<std::string>;
+
+std::string usageError(const Words& arguments) {
+    return thrownText<UsageError>([&] { parseOptions(arguments); });
+}
+
+Words pathsOf(const Options& options) {
+    Words paths;
+    for (const auto& source : options.sources) paths.push_back(source.path);
+    return paths;
+}
+
+TEST(Options, OfNothingAreEmpty) {
+    const Options options = parseOptions({});
+    EXPECT_TRUE(options.sources.empty());
+    EXPECT_TRUE(options.lines.empty());
+    EXPECT_TRUE(options.logs.empty());
+    EXPECT_EQ(options.information, "");
+}
+
+TEST(Options, AFileIsAReadOnlySourceBehindOverride) {
+    const auto source = parseOptions({"a/b.properties"}).sources.at(0);
+    EXPECT_EQ(source.name, std::nullopt);
+    EXPECT_EQ(source.path, "a/b.properties");
+    EXPECT_EQ(source.group, "");
+    EXPECT_EQ(source.order, 1000);
+    EXPECT_FALSE(source.writable);
+}
+
+TEST(Options, ASourceSaysItInFull) {
+    const auto source = parseOptions({"--source", "n=p.x,group=g,order=-5,writable"}).sources.at(0);
+    EXPECT_EQ(source.name, "n");
+    EXPECT_EQ(source.path, "p.x");
+    EXPECT_EQ(source.group, "g");
+    EXPECT_EQ(source.order, -5);
+    EXPECT_TRUE(source.writable);
+}
+
+TEST(Options, ASourceNeedsNoSettings) {
+    const auto source = parseOptions({"--source=n=p"}).sources.at(0);
+    EXPECT_EQ(source.group, "");
+    EXPECT_EQ(source.order, 1000);
+    EXPECT_FALSE(source.writable);
+}
+
+TEST(Options, APathMayHoldAnEqualsSign) {
+    EXPECT_EQ(parseSource("n=a=b").path, "a=b");
+}
+
+TEST(Options, FilesAndSourcesKeepTheirCommonOrder) {
+    EXPECT_EQ(pathsOf(parseOptions({"a", "--source", "n=b", "c", "-c", "list", "--source=m=d"})),
+              (Words{"a", "b", "c", "d"}));
+}
+
+TEST(Options, AfterTwoDashesEverythingIsAFile) {
+    EXPECT_EQ(pathsOf(parseOptions({"a", "--", "--log", "-c"})), (Words{"a", "--log", "-c"}));
+}
+
+TEST(Options, BracketsAreTakenAsTheyAre) {
+    const Options options = parseOptions({"[a,b]", "-c", "[c,d]", "--source", "n=[e]", "[]"});
+    EXPECT_EQ(pathsOf(options), (Words{"[a,b]", "[e]", "[]"}));
+    EXPECT_EQ(options.lines, Words{"[c,d]"});
+}
+
+TEST(Options, LinesAreKeptInOrderAndAsTheyAre) {
+    EXPECT_EQ(parseOptions({"-c", "set a 'b, c'", "-c", "-x", "-c", "", "-clist"}).lines,
+              (Words{"set a 'b, c'", "-x", "", "list"}));
+}
+
+TEST(Options, LogNamesAChannelAndItsSeverities) {
+    const auto logs =
+        parseOptions({"--log", "velkor::configuration=debug,trace", "--log=b=24"}).logs;
+    ASSERT_EQ(logs.size(), 2U);
+    EXPECT_EQ(logs[0].channel, "velkor::configuration");
+    EXPECT_EQ(logs[0].severities, 24U);
+    EXPECT_EQ(logs[1].channel, "b");
+    EXPECT_EQ(logs[1].severities, 24U);
+}
+
+TEST(Options, HelpDescribesEveryOption) {
+    const std::string help = parseOptions({"--help"}).information;
+    for (const char* part : {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "-c LINE",
+                             "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
+        EXPECT_NE(help.find(part), std::string::npos) << part;
+    }
+}
+
+TEST(Options, VersionNamesTheProgram) {
+    EXPECT_EQ(parseOptions({"--version"}).information.rfind("velkor-config ", 0), 0U);
+}
+
+struct UsageCase {
+    const char* name;
+    Words arguments;
+    std::string message;
+
+    friend std::ostream& operator<<(std::ostream& out, const UsageCase& it) {
+        return out << it.name;
+    }
+};
+
+class BadOptionsTest : public ::testing::TestWithParam<UsageCase> {};
+
+TEST_P(BadOptionsTest, AreRefusedWithAClearText) {
+    EXPECT_EQ(usageError(GetParam().arguments), GetParam().message);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    CommandLines, BadOptionsTest,
+    ::testing::Values(
+        UsageCase{"UnknownOption",
+                  {"--foo"},
+                  "The following argument was not expected: --foo (see --help)"},
+        UsageCase{"LineMissing", {"-c"}, "-c: 1 required LINE missing (see --help)"},
+        UsageCase{"NoPath", {"--source", "n"}, "--source n: NAME=PATH is needed"},
+        UsageCase{"EmptyPath", {"--source", "n="}, "--source n=: NAME=PATH is needed"},
+        UsageCase{"EmptyName", {"--source", "=p"}, "--source =p: NAME=PATH is needed"},
+        UsageCase{"NothingAtAll", {"--source", ""}, "--source : NAME=PATH is needed"},
+        UsageCase{"UnknownSetting",
+                  {"--source", "n=p,ordre=5"},
+                  "--source n=p,ordre=5: unknown setting: ordre=5"},
+        UsageCase{"OrderIsNoNumber",
+                  {"--source", "n=p,order=5x"},
+                  "--source n=p,order=5x: the order is no number of 32 bits: 5x"},
+        UsageCase{"OrderIsTooGreat",
+                  {"--source", "n=p,order=2147483648"},
+                  "--source n=p,order=2147483648: the order is no number of 32 bits: 2147483648"},
+        UsageCase{
+            "NoSeverities", {"--log", "channel"}, "--log channel: CHANNEL=SEVERITIES is needed"},
+        UsageCase{"NoChannel", {"--log", "=8"}, "--log =8: CHANNEL=SEVERITIES is needed"},
+        UsageCase{"UnknownSeverity", {"--log", "c=loud"}, "--log c=loud: Unknown severity: loud"}),
+    [](const auto& tested) { return std::string(tested.param.name); });
+
+}  // namespace
+}  // namespace velkor::host

@@ -1,0 +1,242 @@
+#include <gtest/gtest.h>
+
+#include <ostream>
+#include <string>
+#include <vector>
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include "tests/host/ChildProcess.hpp"
+#include "tests/support/TemporaryFile.hpp"
+
+namespace velkor::host {
+namespace {
+
+using namespace std::string_literals;
+using velkor::testing::TemporaryFile;
+
+const std::string serviceFile = VELKOR_EXAMPLES "/service.properties";
+const std::string siteFile = VELKOR_EXAMPLES "/site.properties";
+
+TEST(Program, ShowsLayersAndLetsAWriteWin) {
+    const auto result =
+        runProgram({serviceFile, siteFile},
+                   "list\nset server.port 9090\nget server.port\nexplain server.port\n");
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.err, "");
+    EXPECT_NE(result.out.find("server.port = '8443'\n"), std::string::npos);
+    EXPECT_NE(result.out.find("server.backlog = '128'\n"), std::string::npos);
+    const std::string end =
+        "\n9090\n"
+        "effective   override  9090\n"
+        "overridden  site      '8443'\n"
+        "overridden  service   '8080'\n";
+    ASSERT_GT(result.out.size(), end.size());
+    EXPECT_EQ(result.out.substr(result.out.size() - end.size()), end);
+}
+
+TEST(Program, ShowsWatchedValuesInOrderWithTheAnswers) {
+    const auto result =
+        runProgram({serviceFile, siteFile},
+                   "watch server.port\nset server.port 1\nget server.port\nset server.port 2\n");
+    EXPECT_EQ(result.out, "server.port = '8443'\nserver.port = 1\n1\nserver.port = 2\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, ListsItsSources) {
+    EXPECT_EQ(runProgram({serviceFile, siteFile, "-c", "sources"}).out,
+              "NAME      GROUP  ORDER       ACCESS\n"
+              "override  -      0           writable\n"
+              "site      -      1000        read-only\n"
+              "service   -      1000        read-only\n"
+              "default   -      2147483647  writable\n");
+}
+
+TEST(Program, TakesMessagesAsJson) {
+    const auto result = runProgram(
+        {"-c", R"(send ConfigurationSet {"key":"server.port","value":{"type":"int","value":9090}})",
+         "-c", R"(send ConfigurationGet {"key":"server.port"})"});
+    EXPECT_EQ(result.out,
+              R"(velkor/configuration/ConfigurationOptionResponse )"
+              R"({"key":"server.port","source":"","value":{"type":"int","value":9090}})"
+              "\n"
+              R"(velkor/configuration/ConfigurationOptionResponse )"
+              R"({"key":"server.port","source":"override","value":{"type":"int","value":9090}})"
+              "\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, WritesValuesByteForByteWhereThereIsNoTerminal) {
+    const TemporaryFile file("a=\\u001b[31m\xff\t\n");
+    EXPECT_EQ(runProgram({file.path().string(), "-c", "get a"}).out, "'\x1b[31m\xff\t'\n");
+}
+
+TEST(Program, GivenLinesTakeThePlaceOfStandardInput) {
+    EXPECT_EQ(runProgram({"-c", "set a 1", "-c", "get a"}, "get b\n").out, "1\n");
+}
+
+TEST(Program, EndsAtQuit) {
+    const auto result = runProgram({}, "set a 1\nquit\nget a\n");
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, GoesOnAfterAFailedCommandAndTellsSoAtItsEnd) {
+    const auto result = runProgram({}, "nope\nget\nget 'a\nset a 1\nget a\n");
+    EXPECT_EQ(result.out, "1\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 1: Unknown command: nope\n"
+              "velkor-config: line 2: velkor.configuration.get takes 1 argument; given: 0\n"
+              "velkor-config: line 3: Unbalanced quote: '\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, AnAbsentKeyIsAnAnswerNotAFailure) {
+    const auto result = runProgram({"-c", "get a"});
+    EXPECT_EQ(result.out, "No configuration option with key: a\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, ReportsWhatASourceRefuses) {
+    const auto result = runProgram(
+        {"--source", "s=" + serviceFile + ",order=-1,writable", "-c", "set server.port 1"});
+    EXPECT_EQ(result.err,
+              "velkor-config: velkor.configuration.set: PropertyFileSource does not support "
+              "writing\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, ReportsBadUsage) {
+    const auto result = runProgram({"--frob"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err,
+              "velkor-config: The following argument was not expected: --frob (see --help)\n");
+    EXPECT_EQ(result.exitCode, 2);
+}
+
+TEST(Program, ReportsEverySourceThatCantBeLoadedAndRunsNothing) {
+    const auto result = runProgram({"/no/a", "--source", "override=" + serviceFile, "-c", "list"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err,
+              "velkor-config: Property file could not be opened: /no/a\n"
+              "velkor-config: Source with the requested name already exists: override\n");
+    EXPECT_EQ(result.exitCode, 3);
+}
+
+TEST(Program, ShowsItsVersion) {
+    const auto result = runProgram({"--version"});
+    EXPECT_EQ(result.out, "velkor-config " VELKOR_VERSION "\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, ShowsItsHelpOnStandardOutput) {
+    const auto result = runProgram({"--help"});
+    EXPECT_NE(result.out.find("Usage: velkor-config [OPTIONS] [FILE...]"), std::string::npos);
+    EXPECT_EQ(result.err, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, WritesALogChannelToStandardError) {
+    const auto result =
+        runProgram({"--log", "velkor::configuration=debug", "-c", "set a 1", "-c", "get a"});
+    EXPECT_EQ(result.out, "1\n");
+    EXPECT_NE(result.err.find("debug velkor::configuration: set: a@override\n"), std::string::npos);
+    EXPECT_EQ(result.err.find("property_file"), std::string::npos);
+}
+
+TEST(Program, LogsTheLoadingOfFiles) {
+    const TemporaryFile file("a=1\n");
+    EXPECT_EQ(
+        runProgram({file.path().string(), "--log", "velkor::configuration::property_file=16"}).err,
+        "trace velkor::configuration::property_file: Parsed property: a = 1\n");
+}
+
+TEST(Program, LogsNothingUnasked) {
+    EXPECT_EQ(runProgram({serviceFile, "-c", "set a 1"}).err, "");
+}
+
+TEST(Program, EndsQuietlyWhenItsReaderGoesAway) {
+    int pipeEnds[2];
+    ASSERT_EQ(::pipe2(pipeEnds, O_CLOEXEC), 0);
+    ::close(pipeEnds[0]);
+    const auto result = runProgramWithOutput({serviceFile}, "list\nlist\nnope\n", pipeEnds[1]);
+    ::close(pipeEnds[1]);
+    EXPECT_EQ(result.err, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, ReportsThatItsOutputCantBeWritten) {
+    const int full = ::open("/dev/full", O_WRONLY | O_CLOEXEC);
+    ASSERT_GE(full, 0);
+    const auto result = runProgramWithOutput({serviceFile}, "list\nlist\n", full);
+    ::close(full);
+    EXPECT_EQ(result.err,
+              "velkor-config: Standard output can't be written: No space left on device\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, ReportsThatThereIsNoOutput) {
+    const auto result = runProgramWithOutput({"-c", "sources"}, "", -1);
+    EXPECT_EQ(result.err, "velkor-config: Standard output can't be written: Bad file descriptor\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+struct HostileCase {
+    const char* name;
+    std::string input;
+
+    friend std::ostream& operator<<(std::ostream& out, const HostileCase& it) {
+        return out << it.name;
+    }
+};
+
+class HostileInputTest : public ::testing::TestWithParam<HostileCase> {};
+
+TEST_P(HostileInputTest, IsReportedAndTheSessionGoesOn) {
+    const auto result = runProgram({}, GetParam().input + "\nset a 1\nget a\n");
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_EQ(result.out, "1\n");
+    EXPECT_EQ(result.err.rfind("velkor-config: line 1: ", 0), 0U);
+    EXPECT_EQ(result.err.find('\n'), result.err.size() - 1);
+    EXPECT_LT(result.err.size(), 1000U);
+}
+
+std::string everyByteButLineFeed() {
+    std::string bytes;
+    for (int byte = 0; byte < 256; ++byte) {
+        if (byte != '\n') bytes += static_cast<char>(byte);
+    }
+    return bytes;
+}
+
+INSTANTIATE_TEST_SUITE_P(Inputs, HostileInputTest,
+                         ::testing::Values(HostileCase{"LongWord", std::string(1'000'000, 'x')},
+                                           HostileCase{"TooLongLine", std::string(5'000'000, 'x')},
+                                           HostileCase{"ManyWords", "get" +
+                                                                        [] {
+                                                                            std::string words;
+                                                                            for (int i = 0;
+                                                                                 i < 100'000; ++i)
+                                                                                words += " a";
+                                                                            return words;
+                                                                        }()},
+                                           HostileCase{"Nuls", std::string(1000, '\0')},
+                                           HostileCase{"InvalidUtf8", std::string(1000, '\xff')},
+                                           HostileCase{"EveryByte", everyByteButLineFeed()},
+                                           HostileCase{"DeepJson", "send ConfigurationGet " +
+                                                                       std::string(500'000, '[')}),
+                         [](const auto& tested) { return std::string(tested.param.name); });
+
+TEST(Program, TakesALineThatEndsInCarriageReturn) {
+    EXPECT_EQ(runProgram({}, "set a 1\r\nget a\r\n").out, "1\n");
+}
+
+TEST(Program, NeedsNoInputAtAll) {
+    const auto result = runProgram({}, "");
+    EXPECT_EQ(result.out + result.err, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+}  // namespace
+}  // namespace velkor::host

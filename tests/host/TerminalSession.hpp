@@ -1,0 +1,108 @@
+#pragma once
+
+#include <chrono>
+#include <cstddef>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include <poll.h>
+#include <pty.h>
+#include <signal.h>
+#include <sys/types.h>
+#include <termios.h>
+#include <unistd.h>
+
+#include "tests/host/ChildProcess.hpp"
+#include "tests/support/BoundedWait.hpp"
+
+namespace velkor::host {
+
+/// The program under test on a terminal of its own, with a person at the keys.
+class TerminalSession {
+public:
+    explicit TerminalSession(const std::vector<std::string>& arguments) {
+        child = ::forkpty(&keys, nullptr, nullptr, nullptr);
+        if (child < 0) throw std::runtime_error("no pseudo terminal");
+        if (child == 0) {
+            // A terminal without abilities shows what is written as it is; nobody's own key
+            // bindings have a say.
+            ::setenv("TERM", "dumb", 1);
+            ::setenv("HOME", "/nonexistent", 1);
+            ::setenv("LC_ALL", "C", 1);
+            becomeProgram(arguments);
+        }
+    }
+
+    ~TerminalSession() {
+        if (child > 0) {
+            ::kill(child, SIGKILL);
+            waitForExit(child);
+        }
+        ::close(keys);
+    }
+
+    TerminalSession(const TerminalSession&) = delete;
+    TerminalSession& operator=(const TerminalSession&) = delete;
+
+    /// Presses keys.
+    void type(const std::string& text) {
+        if (::write(keys, text.data(), text.size()) != static_cast<ssize_t>(text.size())) {
+            throw std::runtime_error("the terminal takes no keys");
+        }
+    }
+
+    /// Whether `text` appears after what earlier calls have waited for.
+    [[nodiscard]] bool shows(const std::string& text) {
+        const auto deadline = std::chrono::steady_clock::now() + velkor::testing::patience;
+        for (;;) {
+            const std::size_t found = screen.find(text, seen);
+            if (found != std::string::npos) {
+                seen = found + text.size();
+                return true;
+            }
+            if (std::chrono::steady_clock::now() > deadline || !readMore()) return false;
+        }
+    }
+
+    /// Sends the program a signal.
+    void signal(int number) const { ::kill(child, number); }
+
+    /// Whether the terminal edits lines itself, as terminals ordinarily do.
+    bool isOrdinary() const {
+        termios settings{};
+        return ::tcgetattr(keys, &settings) == 0 && (settings.c_lflag & ICANON) != 0 &&
+               (settings.c_lflag & ISIG) != 0;
+    }
+
+    /// Everything that has appeared.
+    const std::string& everything() const { return screen; }
+
+    /// Waits for the end of the program; its exit code.
+    int exitCode() {
+        while (readMore()) continue;
+        const int code = waitForExit(child);
+        child = 0;
+        return code;
+    }
+
+private:
+    // False at the end of the program, and when nothing appears for too long.
+    bool readMore() {
+        pollfd ready{keys, POLLIN, 0};
+        const auto limit = std::chrono::milliseconds(velkor::testing::patience).count();
+        if (::poll(&ready, 1, static_cast<int>(limit)) != 1) return false;
+        char buffer[4096];
+        const ssize_t count = ::read(keys, buffer, sizeof buffer);
+        if (count <= 0) return false;
+        screen.append(buffer, static_cast<std::size_t>(count));
+        return true;
+    }
+
+    int keys = -1;
+    pid_t child = -1;
+    std::string screen;
+    std::size_t seen = 0;
+};
+
+}  // namespace velkor::host
