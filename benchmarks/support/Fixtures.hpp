@@ -1,10 +1,11 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <cstdio>
 #include <memory>
-#include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
@@ -16,101 +17,120 @@ using configuration::ConfigurationImpl;
 using configuration::ConfigurationValue;
 using configuration::ValueMap;
 
-/// A realistic key of about 30 characters.
+using Store = std::shared_ptr<ConfigurationImpl>;
+
+/// The group that every key begins with, as a source is registered under it.
+inline const std::string keyGroup = "service";
+
+/// A realistic key of 30 characters, the group and its dot included.
 inline std::string keyNumber(std::size_t number) {
     char text[64];
-    std::snprintf(text, sizeof text, "service.pool%02zu.worker.limit%06zu", number % 97, number);
+    std::snprintf(text, sizeof text, "%s.pool%02zu.worker.limit%06zu", keyGroup.c_str(),
+                  number % 97, number);
     return text;
 }
 
-/// Keys to take in turn, spread over a table of `count`, so that no look-up profits from the one
+/// The same key within its group.
+inline std::string relativeKeyNumber(std::size_t number) {
+    return keyNumber(number).substr(keyGroup.size() + 1);
+}
+
+/// Strings to take in turn, spread over a table of `count`, so that no look-up profits from the one
 /// before it.
 class KeyCycle {
 public:
-    explicit KeyCycle(std::size_t count) {
-        constexpr std::size_t cycled = 256;
+    /// Takes `cycled` different ones, a power of two.
+    explicit KeyCycle(std::size_t count, std::size_t cycled = 256) : mask(cycled - 1) {
         for (std::size_t i = 0; i < cycled; ++i) keys.push_back(keyNumber(i * 7919 % count));
     }
 
-    const std::string& next() { return keys[position++ % keys.size()]; }
+    const std::string& next() { return keys[position++ & mask]; }
 
 private:
     std::vector<std::string> keys;
+    std::size_t mask;
     std::size_t position = 0;
 };
 
-/// The values that keys hold here.
+/// One of the values that keys hold here.
+struct NamedValue {
+    const char* name;
+    ConfigurationValue value;
+};
+
 inline ConfigurationValue intValue() {
     return 4711;
 }
-inline ConfigurationValue shortText() {
-    return std::string(16, 's');
-}
-inline ConfigurationValue longText() {
-    return std::string(200, 'l');
-}
-inline ConfigurationValue thousandDoubles() {
-    return std::vector<double>(1000, 0.5);
+
+inline std::vector<NamedValue> otherValues() {
+    return {{"text16", std::string(16, 's')},
+            {"text200", std::string(200, 'l')},
+            {"doubles1000", std::vector<double>(1000, 0.5)}};
 }
 
 /// A table of `count` keys that all hold `value`.
-inline ValueMap tableOf(std::size_t count, const ConfigurationValue& value) {
+inline ValueMap tableOf(std::size_t count, const ConfigurationValue& value = intValue()) {
     ValueMap table;
     table.reserve(count);
     for (std::size_t i = 0; i < count; ++i) table.emplace(keyNumber(i), value);
     return table;
 }
 
-/// A store of one source only, which holds `count` keys.
-inline std::shared_ptr<ConfigurationImpl> singleLayerStore(
-    std::size_t count, const ConfigurationValue& value = intValue()) {
+/// A store without any source.
+inline Store emptyStore() {
     auto store = std::make_shared<ConfigurationImpl>();
     store->removeSource("default").get();
     store->removeSource("override").get();
+    return store;
+}
+
+/// A store of one source only, which holds `count` keys.
+inline Store singleLayerStore(std::size_t count, const ConfigurationValue& value = intValue()) {
+    Store store = emptyStore();
     store->addInMemorySource("only", "", 0, false, tableOf(count, value)).get();
     return store;
 }
 
-/// A store of `layers` sources of `count` keys each, of which only the last one has the keys of
-/// `tableOf`. With `groups` every source is registered under one that all these keys begin with.
-inline std::shared_ptr<ConfigurationImpl> layeredStore(std::size_t layers, std::size_t count,
-                                                       bool groups) {
-    auto store = std::make_shared<ConfigurationImpl>();
-    store->removeSource("default").get();
-    store->removeSource("override").get();
-    for (std::size_t layer = 0; layer < layers; ++layer) {
-        ValueMap table;
+/// Several tables of `count` keys each, one above the other.
+struct Layers {
+    std::size_t number;
+    std::size_t count;
+    std::size_t
+        holder;    ///< The one that has the keys of `keyNumber`; the others have none of them.
+    bool grouped;  ///< Each is registered under `keyGroup`.
+
+    /// The table of one of them, keys without the group where it is grouped.
+    ValueMap table(std::size_t layer) const {
+        ValueMap values;
+        values.reserve(count);
+        const std::string mark = layer == holder ? "" : "." + std::to_string(layer);
         for (std::size_t i = 0; i < count; ++i) {
-            const std::string key = keyNumber(i) + (layer + 1 == layers ? "" : "x");
-            table.emplace(groups ? key.substr(8) : key, intValue());
+            values.emplace((grouped ? relativeKeyNumber(i) : keyNumber(i)) + mark, intValue());
         }
-        store
-            ->addInMemorySource("layer" + std::to_string(layer), groups ? "service" : "",
-                                static_cast<int>(layer), false, std::move(table))
-            .get();
-    }
-    return store;
-}
-
-/// What every read of the store costs at least: a bare table under an uncontended recursive mutex
-/// and a future's two allocations.
-class FloorStore {
-public:
-    explicit FloorStore(ValueMap table) : values(std::move(table)) {}
-
-    Future<ConfigurationValue> get(const std::string& key) {
-        const std::lock_guard<std::recursive_mutex> lock(mutex);
-        return makeReadyFuture(ConfigurationValue(values.find(key)->second));
+        return values;
     }
 
-    Future<ConfigurationValue> set(const std::string& key, ConfigurationValue value) {
-        const std::lock_guard<std::recursive_mutex> lock(mutex);
-        return makeReadyFuture(std::exchange(values.find(key)->second, std::move(value)));
+    std::vector<ValueMap> tables() const {
+        std::vector<ValueMap> all;
+        for (std::size_t layer = 0; layer < number; ++layer) all.push_back(table(layer));
+        return all;
     }
 
-private:
-    std::recursive_mutex mutex;
-    ValueMap values;
+    Store store() const {
+        Store all = emptyStore();
+        for (std::size_t layer = 0; layer < number; ++layer) {
+            all->addInMemorySource("layer" + std::to_string(layer), grouped ? keyGroup : "",
+                                   static_cast<int>(layer), false, table(layer))
+                .get();
+        }
+        return all;
+    }
+
+    /// As in an operation's name: "layers:16/last/grouped".
+    std::string name() const {
+        return "layers:" + std::to_string(number) + (holder == 0 ? "/first" : "/last") +
+               (grouped ? "/grouped" : "/bare");
+    }
 };
 
 }  // namespace velkor::benchmarks

@@ -1,68 +1,131 @@
 #include "benchmarks/support/Harness.hpp"
 
-#include <cstdlib>
+#include <valgrind/callgrind.h>
+
 #include <cstring>
+#include <deque>
+#include <future>
 #include <iostream>
-#include <new>
-#include <vector>
+#include <thread>
+
+#include "benchmarks/support/Heap.hpp"
 
 namespace velkor::benchmarks {
 
 namespace {
 
-std::uint64_t allocations = 0;
+// A thread that only waits while this lives. Standard library and heap leave atomic operations out
+// as long as a process has one thread, which no host of a thread-safe store does.
+class SecondThread {
+public:
+    SecondThread() : thread([this] { ended.get_future().wait(); }) {}
+    ~SecondThread() {
+        ended.set_value();
+        thread.join();
+    }
 
-std::vector<Operation>& operations() {
-    static std::vector<Operation> all;
+private:
+    std::promise<void> ended;
+    std::thread thread;  // the last member: it uses the other
+};
+
+std::deque<Operation>& operations() {
+    static std::deque<Operation> all;
     return all;
 }
 
-// Runs every operation under callgrind and has its instructions written to a file of their own,
-// which begins with the operation's name.
-int countInstructions() {
-    for (const Operation& operation : operations()) {
-        operation.count(operation.countedRepetitions);
-        CALLGRIND_DUMP_STATS_AT(operation.name.c_str());
-        std::cout << operation.name << ' ' << operation.countedRepetitions * operation.items
-                  << '\n';
+void time(const Operation& operation, benchmark::State& state) {
+    const Repeat repeat = operation.prepare();
+    if (!operation.weighed) repeat(1);
+    const std::uint64_t allocationsBefore = allocationCount();
+    const std::uint64_t bytesBefore = heapBytes();
+    while (state.KeepRunningBatch(state.max_iterations)) {
+        repeat(static_cast<std::uint64_t>(state.max_iterations));
     }
+    const auto handled =
+        static_cast<double>(state.iterations()) * static_cast<double>(operation.items);
+    state.counters["items"] = static_cast<double>(operation.items);
+    state.counters["allocations"] =
+        static_cast<double>(allocationCount() - allocationsBefore) / handled;
+    if (operation.weighed) {
+        state.counters["bytes"] = static_cast<double>(heapBytes() - bytesBefore) / handled;
+    }
+}
+
+void registerForTiming(const Operation& operation) {
+    auto* const registered = benchmark::RegisterBenchmark(
+        operation.name.c_str(), [&operation](benchmark::State& state) { time(operation, state); });
+    if (operation.realTime) registered->UseRealTime();
+    if (operation.weighed) registered->Iterations(1);
+}
+
+// Prints a line of name, things handled, allocations and heap growth, and has callgrind, when it is
+// there, write the instructions into a file of their own that states the name.
+void count(const Operation& operation) {
+    const Repeat repeat = operation.prepare();
+    if (!operation.weighed) repeat(1);
+    const std::uint64_t allocationsBefore = allocationCount();
+    const std::uint64_t bytesBefore = heapBytes();
+    CALLGRIND_START_INSTRUMENTATION;
+    repeat(operation.countedRuns);
+    CALLGRIND_STOP_INSTRUMENTATION;
+    const std::uint64_t allocations = allocationCount() - allocationsBefore;
+    const std::uint64_t bytes = operation.weighed ? heapBytes() - bytesBefore : 0;
+    CALLGRIND_DUMP_STATS_AT(operation.name.c_str());
+    std::cout << operation.name << '\t' << operation.countedRuns * operation.items << '\t'
+              << allocations << '\t' << bytes << std::endl;
+}
+
+int countAll() {
+    for (const Operation& operation : operations()) {
+        if (operation.countedRuns > 0) count(operation);
+    }
+    return 0;
+}
+
+int timeAll(int argc, char** argv) {
+    for (const Operation& operation : operations()) registerForTiming(operation);
+    benchmark::Initialize(&argc, argv);
+    if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
+    benchmark::RunSpecifiedBenchmarks();
     return 0;
 }
 
 }  // namespace
 
-std::uint64_t allocationCount() noexcept {
-    return allocations;
+Operation& Operation::perItemOf(std::uint64_t handled) {
+    items = handled;
+    return *this;
 }
 
-void add(Operation operation) {
-    operations().push_back(std::move(operation));
+Operation& Operation::counted(std::uint64_t runs) {
+    countedRuns = runs;
+    return *this;
+}
+
+Operation& Operation::elsewhere() {
+    realTime = true;
+    return counted(0);
+}
+
+Operation& Operation::weighsHeap() {
+    weighed = true;
+    return counted(1);
+}
+
+Operation& add(std::string name, std::function<Repeat()> prepare) {
+    Operation& added = operations().emplace_back();
+    added.name = std::move(name);
+    added.prepare = std::move(prepare);
+    return added;
 }
 
 }  // namespace velkor::benchmarks
 
-void* operator new(std::size_t size) {
-    ++velkor::benchmarks::allocations;
-    if (void* memory = std::malloc(size == 0 ? 1 : size)) return memory;
-    throw std::bad_alloc();
-}
-
-void operator delete(void* memory) noexcept {
-    std::free(memory);
-}
-
-void operator delete(void* memory, std::size_t) noexcept {
-    std::free(memory);
-}
-
 int main(int argc, char** argv) {
     using namespace velkor::benchmarks;
-    if (argc == 2 && std::strcmp(argv[1], "--count-instructions") == 0) return countInstructions();
-    for (const Operation& operation : operations()) {
-        benchmark::RegisterBenchmark(operation.name.c_str(), operation.time);
-    }
-    benchmark::Initialize(&argc, argv);
-    if (benchmark::ReportUnrecognizedArguments(argc, argv)) return 2;
-    benchmark::RunSpecifiedBenchmarks();
-    return 0;
+    const SecondThread second;
+    addOperations();
+    const bool counts = argc == 2 && std::strcmp(argv[1], "--count") == 0;
+    return counts ? countAll() : timeAll(argc, argv);
 }

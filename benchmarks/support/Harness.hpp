@@ -1,55 +1,56 @@
 #pragma once
 
 #include <benchmark/benchmark.h>
-#include <valgrind/callgrind.h>
 
 #include <cstdint>
 #include <functional>
+#include <memory>
 #include <string>
 #include <utility>
 
 namespace velkor::benchmarks {
 
-/// The number of heap allocations that this process has made so far.
-std::uint64_t allocationCount() noexcept;
+/// Runs one operation as often as asked.
+using Repeat = std::function<void(std::uint64_t times)>;
 
-/// One measured operation, run in two ways: timed by Google Benchmark, or a fixed number of times
-/// under callgrind.
+/// One measured operation. The program runs it in two ways: timed by Google Benchmark, or a fixed
+/// number of times with its allocations and, under callgrind, its instructions counted.
 struct Operation {
-    std::string name;
-    std::function<void(benchmark::State&)> time;
-    std::function<void(std::uint64_t repetitions)> count;
-    std::uint64_t items;               ///< How many things one run handles.
-    std::uint64_t countedRepetitions;  ///< How many runs are counted under callgrind.
+    std::string name;                  ///< "area/case/contender".
+    std::function<Repeat()> prepare;   ///< Called once for every measurement.
+    std::uint64_t items = 1;           ///< How many things one run handles; results are per thing.
+    std::uint64_t countedRuns = 1000;  ///< 0 for what has no repeatable count.
+    bool realTime = false;
+    bool weighed = false;
+
+    Operation& perItemOf(std::uint64_t handled);
+    Operation& counted(std::uint64_t runs);
+
+    /// Other threads or processes do the work: time is what passes, and nothing is counted.
+    Operation& elsewhere();
+
+    /// Runs once only; what it leaves on the heap is stated, in bytes.
+    Operation& weighsHeap();
 };
 
-/// Adds `operation` to those that the program's main function runs.
-void add(Operation operation);
+/// Defined by each program: adds the operations of its area.
+void addOperations();
 
-/// Adds the operation `name`. `prepare()` makes what it needs and returns the callable to measure;
-/// it is called once for every measurement. `items` is how many things one call handles: the time
-/// and the counters are stated for each of them.
+/// Adds an operation, which the reference stays on.
+Operation& add(std::string name, std::function<Repeat()> prepare);
+
+/// Adds the operation `name`. `prepare()` makes what it needs and gives the callable to measure,
+/// which is run once before measuring begins.
 template <class Prepare>
-void measure(const std::string& name, Prepare prepare, std::uint64_t items = 1,
-             std::uint64_t countedRepetitions = 1000) {
-    const auto time = [prepare, items](benchmark::State& state) {
-        auto run = prepare();
-        run();
-        const std::uint64_t before = allocationCount();
-        for (auto _ : state) run();
-        const auto handled = static_cast<double>(state.iterations()) * static_cast<double>(items);
-        state.counters["allocations"] = static_cast<double>(allocationCount() - before) / handled;
-        state.counters["items"] = static_cast<double>(items);
-    };
-    const auto count = [prepare](std::uint64_t repetitions) {
-        auto run = prepare();
-        run();
-        CALLGRIND_ZERO_STATS;
-        CALLGRIND_TOGGLE_COLLECT;
-        for (std::uint64_t i = 0; i < repetitions; ++i) run();
-        CALLGRIND_TOGGLE_COLLECT;
-    };
-    add({name, time, count, items, countedRepetitions});
+Operation& measure(std::string name, Prepare prepare) {
+    return add(std::move(name), [prepare]() -> Repeat {
+        // Need not be copyable.
+        auto run = std::make_shared<decltype(prepare())>(prepare());
+        return [run](std::uint64_t times) {
+            auto& once = *run;
+            for (; times > 0; --times) once();
+        };
+    });
 }
 
 /// Keeps the compiler from dropping `value`.
