@@ -13,6 +13,11 @@ if(PROJECT_IS_TOP_LEVEL)
         $<$<CXX_COMPILER_ID:Clang>:-Wthread-safety -Winconsistent-missing-override>)
 endif()
 
+# Programs find the libraries that are installed with them, wherever that is.
+cmake_path(RELATIVE_PATH CMAKE_INSTALL_FULL_LIBDIR
+    BASE_DIRECTORY ${CMAKE_INSTALL_FULL_BINDIR} OUTPUT_VARIABLE libdir_from_bindir)
+set(CMAKE_INSTALL_RPATH $ORIGIN/${libdir_from_bindir})
+
 # Declares a shared library of this project: hidden visibility, exports filtered by the version
 # script beside its sources, and an ABI number of its own. HEADERS are those that are installed.
 function(velkor_add_library name)
@@ -34,10 +39,12 @@ function(velkor_add_library name)
     target_compile_features(${name} PUBLIC cxx_std_17)
     # A call within the library goes straight to its target, so that it can be inlined.
     target_compile_options(${name} PRIVATE -fno-semantic-interposition)
-    target_link_options(${name} PRIVATE LINKER:--version-script=${script} LINKER:--no-undefined-version)
+    target_link_options(${name} PRIVATE
+        LINKER:--version-script=${script} LINKER:--no-undefined-version)
     target_link_libraries(${name} PRIVATE $<BUILD_INTERFACE:velkor-build-options>)
     if(VELKOR_INSTALL)
         install(TARGETS ${name} EXPORT velkor-targets
-            FILE_SET HEADERS DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/velkor)
+            FILE_SET HEADERS DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/velkor
+            INCLUDES DESTINATION ${CMAKE_INSTALL_INCLUDEDIR}/velkor)
     endif()
 endfunction()
