@@ -71,6 +71,7 @@ CommandRegistry::CommandPtr CommandRegistry::find(const std::string& name) const
     if (candidates.empty()) throw CommandError(unknownCommandText(name, names()));
     if (candidates.size() == 1) return candidates.front();
     std::vector<std::string> names;
+    names.reserve(candidates.size());
     for (const auto& command : candidates) names.push_back(command->name());
     throw CommandError("Ambiguous command: " + name + " (may be: " + joined(names) + ")");
 }
@@ -83,6 +84,7 @@ std::vector<CommandRegistry::CommandPtr> CommandRegistry::commands() const {
 std::vector<std::string> CommandRegistry::names() const {
     const auto all = commands();
     std::vector<std::string> names;
+    names.reserve(2 * all.size());
     for (const auto& command : all) names.emplace_back(command->shortName());
     for (const auto& command : all) {
         if (command->name() != command->shortName()) names.push_back(command->name());

@@ -31,6 +31,7 @@ std::string explain(const Context& context, const Arguments& arguments) {
     const auto options = context.services.store->explain(arguments.at(0)).get();
     if (options.empty()) return "No configuration option with key: " + arguments.at(0);
     std::vector<std::vector<std::string>> rows;
+    rows.reserve(options.size());
     for (const auto& option : options) {
         rows.push_back(
             {rows.empty() ? "effective" : "overridden", option.source, valueText(option.value)});

@@ -37,7 +37,7 @@ boost::shared_ptr<Sink> makeSink(std::ostream& out) {
     const auto backend = boost::make_shared<Backend>();
     backend->add_stream(boost::shared_ptr<std::ostream>(&out, boost::null_deleter()));
     backend->auto_flush(true);
-    const auto sink = boost::make_shared<Sink>(backend);
+    auto sink = boost::make_shared<Sink>(backend);
     sink->set_formatter(&formatRecord);
     return sink;
 }

@@ -55,6 +55,7 @@ std::vector<std::string> nearestNames(const std::string& name,
                      [](const auto& left, const auto& right) { return left.first < right.first; });
     near.resize(std::min(near.size(), mostOffered));
     std::vector<std::string> names;
+    names.reserve(near.size());
     for (auto& entry : near) names.push_back(std::move(entry.second));
     return names;
 }

@@ -133,8 +133,10 @@ ExitCode runSession(const Options& options, Output& output) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
     Session session(output);
-    if (!session.load(options.sources)) return ExitCode::sourceNotLoaded;
-    return session.run(options.lines) ? ExitCode::fine : ExitCode::commandFailed;
+    const bool allLoaded = session.load(options.sources);
+    const bool allCarriedOut = session.run(options.lines);
+    if (!allLoaded) return ExitCode::sourceNotLoaded;
+    return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
 }
 
 }  // namespace

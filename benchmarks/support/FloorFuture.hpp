@@ -35,6 +35,7 @@ class FloorFuture {
 public:
     explicit FloorFuture(std::shared_ptr<FloorState<T>> shared) : state(std::move(shared)) {}
 
+    /// Waits for the result and hands it over. Called once.
     T get() {
         std::unique_lock<std::mutex> lock(state->mutex);
         while (state->result == nullptr) state->ready.wait(lock);
@@ -43,6 +44,7 @@ public:
         return std::move(*taken);
     }
 
+    /// A future of what `callable(FloorFuture&&)` returns. Nothing else is called on this one.
     template <class F>
     auto then(F callable);
 
@@ -50,6 +52,7 @@ private:
     std::shared_ptr<FloorState<T>> state;
 };
 
+/// The producing side. It outlives its `setValue`.
 template <class T>
 class FloorPromise {
 public:
@@ -73,6 +76,7 @@ private:
     std::shared_ptr<FloorState<T>> state;
 };
 
+/// A future that has its result already: the state and the box are all it allocates.
 template <class T>
 FloorFuture<T> floorReadyFuture(T value) {
     auto state = std::make_shared<FloorState<T>>();

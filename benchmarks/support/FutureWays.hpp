@@ -11,6 +11,7 @@ namespace velkor::benchmarks {
 
 // The ways to pass one number on: the name of the contender, its promise and what is done with it,
 // and a future that has its result from the start.
+
 struct Velkor {
     static constexpr const char* name = "velkor";
     using Promise = velkor::Promise<int>;

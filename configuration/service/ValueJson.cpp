@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <limits>
 #include <new>
+#include <string_view>
 #include <type_traits>
 #include <typeinfo>
 
@@ -46,6 +47,17 @@ void readText(const std::string& text, T& content) {
     if (parse(text, parsed)) content = parsed;
 }
 
+bool isNested(const Var& json) {
+    return asObject(json) != nullptr || asArray(json) != nullptr;
+}
+
+// The type that a parser gives every integer that fits.
+template <class T>
+void readWithin(Poco::Int64 number, T& content) {
+    using Limits = std::numeric_limits<T>;
+    if (number >= Limits::min() && number <= Limits::max()) content = static_cast<T>(number);
+}
+
 // POCO's limits for numbers with a fraction leave out the smallest signed integer. A number that is
 // not finite is beyond any limits.
 template <class T>
@@ -53,7 +65,8 @@ void readNumber(const Var& json, T& content) {
     constexpr double highest = std::numeric_limits<T>::max();
     constexpr double lowestInteger = std::numeric_limits<T>::min();
     constexpr double lowestFraction = std::is_signed_v<T> ? -highest : 0;
-    const auto number = json.convert<double>();
+    double number = 0;
+    json.convert(number);
     const double lowest = json.isInteger() ? lowestInteger : lowestFraction;
     if (number >= lowest && number <= highest) content = static_cast<T>(number);
 }
@@ -73,17 +86,24 @@ void convert(const Var& json, T& content) {
 // elements that do not convert.
 template <class T>
 void readScalar(const Var& json, T& content) {
-    if (json.isEmpty()) return;
-    if (const auto* text = heldBy<std::string>(json)) {
+    if (json.isNumeric()) {
+        json.convert(content);
+    } else if (const auto* text = heldBy<std::string>(json)) {
         readText(*text, content);
-    } else if (std::is_same_v<T, bool> || (asObject(json) == nullptr && asArray(json) == nullptr)) {
+    } else if (!json.isEmpty() && (std::is_same_v<T, bool> || !isNested(json))) {
         convert(json, content);
     }
 }
 
 template <class T>
 void readInteger(const Var& json, T& content) {
-    json.isNumeric() ? readNumber(json, content) : readScalar(json, content);
+    if (const auto* parsed = heldBy<Poco::Int64>(json)) {
+        readWithin(*parsed, content);
+    } else if (json.isNumeric()) {
+        readNumber(json, content);
+    } else {
+        readScalar(json, content);
+    }
 }
 
 common::TextConversion utf8() {
@@ -147,7 +167,11 @@ void readJson(const Var& json, std::u16string& content) {
 }
 
 void readJson(const Var& json, std::string& content) {
-    if (!json.isEmpty()) convert(json, content);
+    if (const auto* same = heldBy<std::string>(json)) {
+        content = *same;
+    } else if (!json.isEmpty()) {
+        convert(json, content);
+    }
 }
 
 void readJson(const Var& json, ConfigurationValue& content) {
@@ -177,8 +201,9 @@ const Array* asArray(const Var& json) {
 // POCO's own look-up hands out a copy. The objects of messages are so small that searching them
 // from one end is as fast as it gets.
 const Var* findMember(const Object& object, const char* name) {
+    const std::string_view wanted = name;
     const auto member = std::find_if(object.begin(), object.end(),
-                                     [&](const auto& entry) { return entry.first == name; });
+                                     [&](const auto& entry) { return entry.first == wanted; });
     return member == object.end() ? nullptr : &member->second;
 }
 

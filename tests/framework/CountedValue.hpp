@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <stdexcept>
 #include <utility>
 
@@ -27,6 +28,15 @@ struct FailsToMove {
     FailsToMove& operator=(FailsToMove&&) = delete;
 
     bool armed;
+};
+
+/// A value that calls `onMove` whenever it is moved.
+struct ObservedMove {
+    explicit ObservedMove(std::function<void()> observer) : onMove(std::move(observer)) {}
+    ObservedMove(ObservedMove&& other) : onMove(other.onMove) { onMove(); }
+    ObservedMove& operator=(ObservedMove&&) = delete;
+
+    std::function<void()> onMove;
 };
 
 }  // namespace velkor::testing

@@ -115,13 +115,18 @@ TEST(Program, ReportsBadUsage) {
     EXPECT_EQ(result.exitCode, 2);
 }
 
-TEST(Program, ReportsEverySourceThatCantBeLoadedAndRunsNothing) {
-    const auto result = runProgram({"/no/a", "--source", "override=" + serviceFile, "-c", "list"});
-    EXPECT_EQ(result.out, "");
+TEST(Program, ReportsEverySourceThatCantBeLoadedAndGoesOn) {
+    const auto result =
+        runProgram({"/no/a", "--source", "override=" + serviceFile, "-c", "set a 1", "-c", "list"});
+    EXPECT_EQ(result.out, "a = 1\n");
     EXPECT_EQ(result.err,
               "velkor-config: Property file could not be opened: /no/a\n"
               "velkor-config: Source with the requested name already exists: override\n");
     EXPECT_EQ(result.exitCode, 3);
+}
+
+TEST(Program, ASourceThatCantBeLoadedDecidesTheExitStatus) {
+    EXPECT_EQ(runProgram({"/no/a", "-c", "nope"}).exitCode, 3);
 }
 
 TEST(Program, ShowsItsVersion) {

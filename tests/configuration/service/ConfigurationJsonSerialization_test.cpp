@@ -284,7 +284,7 @@ class AnyMessageJson : public MessageJson {};
 using AllMessages =
     ::testing::Types<ConfigurationSet, ConfigurationGet, ConfigurationKeys,
                      ConfigurationKeysResponse, ConfigurationOptionResponse, AddPropertyFileSource>;
-TYPED_TEST_SUITE(AnyMessageJson, AllMessages);
+TYPED_TEST_SUITE(AnyMessageJson, AllMessages, );
 
 TYPED_TEST(AnyMessageJson, NullObjectReadsLikeAnEmptyOne) {
     EXPECT_EQ(this->forms.toText(std::move(*this->forms.template fromObject<TypeParam>(nullptr))),

@@ -76,7 +76,7 @@ protected:
 
 using Requests =
     ::testing::Types<ConfigurationGet, ConfigurationSet, ConfigurationKeys, AddPropertyFileSource>;
-TYPED_TEST_SUITE(Request, Requests);
+TYPED_TEST_SUITE(Request, Requests, );
 
 TYPED_TEST(Request, ReachesItsOperationAndNoOther) {
     auto* const request = new TypeParam;
@@ -108,7 +108,7 @@ class EveryMessage : public ::testing::Test {};
 using Messages =
     ::testing::Types<ConfigurationGet, ConfigurationSet, ConfigurationKeys, AddPropertyFileSource,
                      ConfigurationOptionResponse, ConfigurationKeysResponse>;
-TYPED_TEST_SUITE(EveryMessage, Messages);
+TYPED_TEST_SUITE(EveryMessage, Messages, );
 
 TYPED_TEST(EveryMessage, IsAMovableValueWithAVirtualDestructor) {
     EXPECT_TRUE(std::is_nothrow_move_constructible_v<TypeParam>);

@@ -71,7 +71,8 @@ public:
     template <class M>
     std::unique_ptr<M> fromObject(const Poco::JSON::Object::Ptr& object) const {
         std::unique_ptr<Message> message = registry->forms.at(typeid(M)).deserialise(object);
-        if (typeid(*message.get()) != typeid(M)) throw std::bad_cast();
+        const Message& made = *message;
+        if (typeid(made) != typeid(M)) throw std::bad_cast();
         return std::unique_ptr<M>(static_cast<M*>(message.release()));
     }
 

@@ -268,8 +268,9 @@ class TextConversionCodec : public ::testing::TestWithParam<Codec> {};
 
 TEST_P(TextConversionCodec, IsUnknown) {
     const std::string& codec = GetParam().codec;
+    const std::string expected = "Unknown text codec: " + codec;
     EXPECT_EQ(thrownText<std::invalid_argument>([&] { TextConversion conversion(codec); }),
-              "Unknown text codec: " + codec);
+              expected.c_str());
 }
 
 INSTANTIATE_TEST_SUITE_P(Name, TextConversionCodec,
