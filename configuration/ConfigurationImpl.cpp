@@ -237,7 +237,7 @@ std::shared_ptr<reactive_streams::PublisherAPI<ConfigurationValue>> Configuratio
         if (!layer) return publisher;
         current = readValue(layer, key);
     }
-    publisher->publish(current);
+    publisher->publishFirst(current);
     return publisher;
 }
 

@@ -122,6 +122,15 @@ public:
         drain();
     }
 
+    /// Keeps a copy of `value` as the first one unless something is kept already, which is newer:
+    /// for a value that was read before others could publish. Called before there is a subscriber.
+    void publishFirst(const T& value) VELKOR_EXCLUDES(mutex) {
+        std::list<T> first;
+        first.push_back(value);
+        const common::MutexLock lock(mutex);
+        if (state <= State::completing && queue.empty()) queue.swap(first);
+    }
+
     /// Ends the stream once the values that are queued now or meanwhile have been delivered; at
     /// once when there are none. Does nothing on a stream that is ending or has ended.
     void complete() VELKOR_EXCLUDES(mutex) {

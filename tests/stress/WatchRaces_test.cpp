@@ -49,6 +49,18 @@ TEST_F(WatchRaces, WatchAgainstWrite) {
          });
 }
 
+TEST_F(WatchRaces, AWatchBegunBesideAWriteKeepsTheNewerValue) {
+    const std::string largeAndSlowToCopy(100'000, 'x');
+    race([&] { store->set("key", largeAndSlowToCopy); },
+         [&] { publisher = store->watchOption("key"); }, [this] { set(1); },
+         [&] {
+             subscriber = std::make_shared<Counter>(allValues);
+             publisher->subscribe(subscriber);
+             ASSERT_EQ(lastReceived(), 1);
+             subscriber->subscription->cancel();
+         });
+}
+
 TEST_F(WatchRaces, CancelAgainstWrite) {
     race([this] { watch(); }, [this] { subscriber->subscription->cancel(); }, [this] { set(1); },
          [this] {

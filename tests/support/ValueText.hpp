@@ -37,8 +37,10 @@ public:
     template <class T>
     std::string operator()(const std::vector<T>& values) const {
         std::string spelled;
+        const char* separator = "";
         for (const T& value : values) {
-            spelled += (spelled.empty() ? "" : ", ") + (*this)(value);
+            spelled += separator + (*this)(value);
+            separator = ", ";
         }
         return "[" + spelled + "]";
     }

@@ -52,6 +52,26 @@ TEST_F(CachedValuePublisherPublish, NewestValuePublishedWithoutDemandIsKept) {
     EXPECT_THAT(subscriber->values, ElementsAre(2));
 }
 
+TEST_F(CachedValuePublisherPublish, FirstValueIsKeptWhenNothingElseIs) {
+    publisher->publishFirst(1);
+    subscribe(1);
+    EXPECT_THAT(subscriber->values, ElementsAre(1));
+}
+
+TEST_F(CachedValuePublisherPublish, FirstValueThatWasOvertakenIsDropped) {
+    publisher->publish(2);
+    publisher->publishFirst(1);
+    subscribe(allValues);
+    EXPECT_THAT(subscriber->values, ElementsAre(2));
+}
+
+TEST_F(CachedValuePublisherPublish, FirstValueIsDroppedOnceTheStreamHasEnded) {
+    publisher->complete();
+    publisher->publishFirst(1);
+    subscribe(allValues);
+    EXPECT_THAT(subscriber->values, IsEmpty());
+}
+
 TEST_F(CachedValuePublisherPublish, KeptValueIsDeliveredOnlyOnce) {
     publisher->publish(1);
     subscribe(2);
