@@ -81,6 +81,8 @@ void DiagnosticLogger::push(Severity severity,
     if (!record) return;
     logging::record_ostream message(record);
     message.imbue(std::locale::classic());
+    // Boost.Log spells truth values out unless it is told not to.
+    message.stream().unsetf(std::ios_base::boolalpha);
     compose(message.stream());
     message.flush();
     core->push_record(boost::move(record));

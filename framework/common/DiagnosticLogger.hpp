@@ -32,7 +32,8 @@ public:
         return (enabled->load(std::memory_order_relaxed) & severity) != 0;
     }
 
-    /// Writes one record whose message is `parts`, each inserted into the stream in turn. Composes
+    /// Writes one record whose message is `parts`, each inserted into a stream of the C locale in
+    /// turn, truth values as 0 and 1. Composes
     /// nothing when the severity is disabled or no sink wants the record. What a sink throws passes
     /// on to the caller unless the host gave Boost.Log an exception handler.
     template <class... Parts>
