@@ -67,9 +67,7 @@ public:
             keepAlive = store.weak_from_this().lock();
     }
 
-    ~Operation() {
-        if (--store.heldLevels == 0 && !store.retired.empty()) released.swap(store.retired);
-    }
+    ~Operation() { store.giveBackLevel(released); }
 
     Operation(const Operation&) = delete;
     Operation& operator=(const Operation&) = delete;
@@ -80,7 +78,7 @@ private:
     // Destroyed from the last to the first: the level is given back, then goes what the store has
     // let go of, then perhaps the store itself.
     std::shared_ptr<const Configuration> keepAlive;
-    std::vector<std::shared_ptr<const void>> released;
+    Retired released;
     ConfigurationImpl& store;
     std::unique_lock<std::recursive_mutex> held;
 };
@@ -147,8 +145,11 @@ ConfigurationImpl::ConfigurationImpl()
 
 ConfigurationImpl::~ConfigurationImpl() {
     {
+        // A source may change the registry even now: the walk keeps the list that it began with.
+        std::shared_ptr<const SourceList> layers;
         const std::unique_lock<std::recursive_mutex> lock(mutex);
-        for (const auto& entry : *sources) entry.source->setChangeListener({});
+        layers = sources;
+        for (const auto& entry : *layers) entry.source->setChangeListener({});
     }
     while (publishers->removeOldest() != nullptr) continue;
 }
@@ -193,8 +194,9 @@ Future<ConfigurationValue> ConfigurationImpl::set(const std::string& key, Config
 }
 
 Future<bool> ConfigurationImpl::has(const std::string& key) {
-    Operation operation(*this);
-    return makeReadyFuture(doHas(operation.lock(), key));
+    const Operation operation(*this);
+    ScratchKey scratch(*this);
+    return makeReadyFuture(static_cast<bool>(findLayer(key, scratch)));
 }
 
 Future<std::set<std::string>> ConfigurationImpl::keys() {
@@ -325,12 +327,14 @@ Future<std::vector<Option>> ConfigurationImpl::explain(const std::string& key) {
 }
 
 bool ConfigurationImpl::doHas(std::unique_lock<std::recursive_mutex>&, const std::string& key) {
+    const Operation operation(*this);
     ScratchKey scratch(*this);
     return static_cast<bool>(findLayer(key, scratch));
 }
 
 ConfigurationValue ConfigurationImpl::doGet(std::unique_lock<std::recursive_mutex>&,
                                             const std::string& key) {
+    const Operation operation(*this);
     ScratchKey scratch(*this);
     const Layer layer = findLayer(key, scratch);
     if (!layer) throw std::runtime_error("No option value for key: " + key);
@@ -339,6 +343,7 @@ ConfigurationValue ConfigurationImpl::doGet(std::unique_lock<std::recursive_mute
 
 Option ConfigurationImpl::doGetOption(std::unique_lock<std::recursive_mutex>&,
                                       const std::string& key) {
+    const Operation operation(*this);
     ScratchKey scratch(*this);
     const Layer layer = findLayer(key, scratch);
     if (!layer) throw std::runtime_error("No option for key: " + key);
@@ -408,8 +413,10 @@ void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>&
     auto watchers = publishers->watching(key);
     if (watchers.empty()) return;
 
-    --heldLevels;
+    Retired released;
+    giveBackLevel(released);
     lock.unlock();
+    released.clear();
     for (const auto& publisher : watchers) {
         try {
             storeLogger.write(common::debug, "notifying watcher: ", key);
@@ -448,15 +455,17 @@ void ConfigurationImpl::insertSource(ConfigurationSourceMap entry) {
 
 void ConfigurationImpl::eraseSource(const std::string& name) {
     SourceList changed = *sources;
-    changed.erase(std::remove_if(changed.begin(), changed.end(),
-                                 [&](const auto& entry) { return entry.name == name; }),
-                  changed.end());
+    const auto removed = std::find_if(changed.begin(), changed.end(),
+                                      [&](const auto& entry) { return entry.name == name; });
+    if (removed == changed.end()) return;
+    retire(std::move(removed->source));
+    changed.erase(removed);
     replaceSources(std::move(changed));
 }
 
 void ConfigurationImpl::replaceSources(SourceList changed) {
     auto next = std::make_shared<const SourceList>(std::move(changed));
-    retire(sources);
+    pastSources.push_back(sources);
     sources = std::move(next);
     hasForeignSources = std::any_of(sources->begin(), sources->end(),
                                     [](const auto& entry) { return isForeign(*entry.source); });
@@ -469,6 +478,13 @@ void ConfigurationImpl::updateRunsForeignCode() {
 
 void ConfigurationImpl::retire(std::shared_ptr<const void> object) {
     retired.push_back(std::move(object));
+}
+
+void ConfigurationImpl::giveBackLevel(Retired& released) noexcept {
+    if (--heldLevels > 0) return;
+    // No walk needs these any more. Removed sources are retired, so none is destroyed here.
+    pastSources.clear();
+    released.swap(retired);
 }
 
 }  // namespace velkor::configuration

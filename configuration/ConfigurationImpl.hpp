@@ -122,6 +122,7 @@ protected:
 
 private:
     using SourceList = std::vector<ConfigurationSourceMap>;
+    using Retired = std::vector<std::shared_ptr<const void>>;
 
     class Operation;
     class ScratchKey;
@@ -151,6 +152,7 @@ private:
     void replaceSources(SourceList changed);
     void updateRunsForeignCode();
     void retire(std::shared_ptr<const void> object);
+    void giveBackLevel(Retired& released) noexcept;
 
     std::atomic<std::uint64_t> nextStreamId{0};
     // In order of precedence. Never changed in place: a walk goes on over the list it began with
@@ -163,9 +165,13 @@ private:
     // callback, and does a change of a source concern anybody. Read without the mutex by sources'
     // listeners.
     std::atomic<bool> runsForeignCode{false};
-    // Levels of the mutex that are held by operations, and what these have let go of.
+    // Levels of the mutex that are held by operations, and what these have let go of. The thread
+    // that gives the last level back destroys that itself, without the mutex: a source may wait in
+    // its destructor for any other thread that uses the store.
     std::size_t heldLevels = 0;
-    std::vector<std::shared_ptr<const void>> retired;
+    Retired retired;
+    // Lists that a walk may still go on over.
+    std::vector<std::shared_ptr<const SourceList>> pastSources;
     // Buffers for keys with a group removed or added. Lent out, so that a source that calls back
     // into the store gets another one.
     std::vector<std::string> scratchKeys;

@@ -268,5 +268,20 @@ TEST_F(DerivedStore, NothingIsLockedBetweenCalls) {
     EXPECT_FALSE(store->isLockedForOthers());
 }
 
+TEST_F(DerivedStore, HelpersSurviveASourceThatRemovesItself) {
+    const auto probes = {+[](ProbeStore& probed) { probed.probeHas("a"); },
+                         +[](ProbeStore& probed) { probed.probeGet("a"); },
+                         +[](ProbeStore& probed) { probed.probeGetOption("a"); }};
+    for (const auto probe : probes) {
+        auto source = std::make_shared<testing::HookedSource>(
+            testing::HookedSource::Table{{"a", ConfigurationValue(1)}});
+        auto* const added = source.get();
+        store->addSource("extra", "", -5, false, std::move(source));
+        added->whenHas = [this] { store->removeSource("extra"); };
+        probe(*store);
+        EXPECT_FALSE(store->has("a").get());
+    }
+}
+
 }  // namespace
 }  // namespace velkor::configuration

@@ -5,6 +5,7 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <utility>
 
 #include "tests/configuration/StoreTesting.hpp"
@@ -240,12 +241,14 @@ protected:
         source->whenDestroyed = [this] {
             ++destructions;
             wasFree = isFree();
+            destroyer = std::this_thread::get_id();
         };
         source.reset();
     }
 
     int destructions = 0;
     bool wasFree = false;
+    std::thread::id destroyer;
 };
 
 TEST_F(SourceDestruction, RunsWithTheStoreFreeAfterARemoval) {
@@ -291,6 +294,17 @@ TEST_F(SourceDestruction, RunsWithTheStoreFreeAfterARemovalFromASubscriber) {
     add("new", "", 1, {{"c", 1}});
     EXPECT_EQ(destructions, 1);
     EXPECT_TRUE(wasFree);
+}
+
+TEST_F(SourceDestruction, RunsOnTheThreadThatRemovesTheSource) {
+    const auto subscriber = std::make_shared<Subscriber>(testing::allValues);
+    store->watchOption("a")->subscribe(subscriber);
+    subscriber->whenNext = [&](const ConfigurationValue&) { EXPECT_TRUE(isFree()); };
+    askOnDestruction(early);
+    store->removeSource("early");
+    EXPECT_EQ(subscriber->values.size(), 2U);
+    EXPECT_EQ(destructions, 1);
+    EXPECT_EQ(destroyer, std::this_thread::get_id());
 }
 
 TEST_F(SourceDestruction, IsNotLeftToAThreadThatReadsMeanwhile) {

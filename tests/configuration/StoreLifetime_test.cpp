@@ -172,6 +172,19 @@ TEST_F(StoreLifetime, SourceMayDropTheStoreFromInsideItsRegistration) {
     EXPECT_EQ(source->calls.back(), "detach");
 }
 
+TEST_F(StoreLifetime, SourceMayChangeTheRegistryWhileTheStoreIsDestroyed) {
+    const auto first = addHooked("first", "", -9);
+    const auto second = addHooked("second", "", -8);
+    ConfigurationImpl* const dying = store.get();
+    first->whenDetached = [&] {
+        dying->removeSource("second");
+        dying->addInMemorySource("late", "", -10, false, {});
+    };
+    store.reset();
+    EXPECT_FALSE(first->listener);
+    EXPECT_EQ(second.use_count(), 1);
+}
+
 TEST(StoreLifetimeDeathTest, FailureOfASourceDuringDestructionEndsTheProcess) {
     GTEST_FLAG_SET(death_test_style, "threadsafe");
     EXPECT_DEATH(

@@ -1,19 +1,27 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <locale>
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <typeinfo>
 #include <vector>
 
+#include "configuration/sources/InMemorySource.hpp"
+#include "configuration/sources/PropertyFileSource.hpp"
 #include "tests/configuration/StoreTesting.hpp"
 #include "tests/support/LogCapture.hpp"
+#include "tests/support/ScopedGlobalLocale.hpp"
+#include "tests/support/TemporaryFile.hpp"
 
 namespace velkor::configuration {
 namespace {
 
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;
+
+const std::string inMemory = typeid(InMemorySource).name();
 
 class StoreLog : public testing::StoreTest {
 protected:
@@ -25,9 +33,48 @@ protected:
     }
 };
 
+TEST_F(StoreLog, ConstructionAddsDefaultAndThenOverride) {
+    EXPECT_THAT(messagesOf([] { ConfigurationImpl(); }),
+                ElementsAre("addSource: default, , 2147483647, 0, " + inMemory,
+                            "addSource: override, , 0, 0, " + inMemory));
+}
+
+TEST_F(StoreLog, AddedSourceIsLoggedWithTheGroupAsGiven) {
+    EXPECT_THAT(messagesOf([&] { add("extra", "app", -5, {}, true); }),
+                ElementsAre("addSource: extra, app, -5, 1, " + inMemory));
+}
+
+TEST_F(StoreLog, AddedSourceIsLoggedWithItsDynamicType) {
+    const auto source = std::make_shared<testing::HookedSource>();
+    EXPECT_THAT(messagesOf([&] { store->addSource("extra", "", 5, false, source); }),
+                ElementsAre("addSource: extra, , 5, 0, " +
+                            std::string(typeid(testing::HookedSource).name())));
+}
+
+TEST_F(StoreLog, AddedPropertyFileIsLoggedWithItsType) {
+    const testing::TemporaryFile file("");
+    EXPECT_THAT(
+        messagesOf([&] { store->addPropertyFileSource("file", "", 5, true, file.widePath()); }),
+        ElementsAre("addSource: file, , 5, 1, " + std::string(typeid(PropertyFileSource).name())));
+}
+
+TEST_F(StoreLog, RefusedSourceIsLoggedToo) {
+    EXPECT_THAT(messagesOf([&] { store->addInMemorySource("override", "x", 5, false, {}); }),
+                ElementsAre("addSource: override, x, 5, 0, " + inMemory));
+}
+
 TEST_F(StoreLog, NullSourceIsNotLogged) {
     EXPECT_THAT(messagesOf([&] { EXPECT_ANY_THROW(store->addSource("x", "", 5, false, nullptr)); }),
                 IsEmpty());
+}
+
+TEST_F(StoreLog, AddedKeysAreUpdatedWithTheirPrefixInOrder) {
+    EXPECT_THAT(
+        messagesOf([&] {
+            add("extra", "app", 5, {{"b", 1}, {"a", 2}});
+        }),
+        ElementsAre("addSource: extra, app, 5, 0, " + inMemory, "updatePublishers: app.a",
+                    "get: app.a from extra", "updatePublishers: app.b", "get: app.b from extra"));
 }
 
 TEST_F(StoreLog, RemovedKeysAreUpdatedWithoutTheirPrefix) {
@@ -177,6 +224,13 @@ TEST_F(StoreLog, NothingIsWrittenWithoutTheSeverity) {
     store->set("a", 1);
     store->get("a");
     EXPECT_THAT(log.messages(), IsEmpty());
+}
+
+TEST_F(StoreLog, HostsNumbersChangeNothing) {
+    const testing::ScopedGlobalLocale host(
+        std::locale(std::locale::classic(), new testing::CommaNumbers));
+    EXPECT_THAT(messagesOf([&] { add("extra", "", 1234567, {}, true); }),
+                ElementsAre("addSource: extra, , 1234567, 1, " + inMemory));
 }
 
 }  // namespace
