@@ -1,6 +1,5 @@
 #pragma once
 
-#include <atomic>
 #include <exception>
 #include <functional>
 #include <memory>
@@ -27,25 +26,22 @@ public:
 
     /// A future on `sharedState`; valid exactly when that is not null. For use by this library.
     explicit Future(std::shared_ptr<detail::SharedFutureState<T>> sharedState) noexcept
-        : state(std::move(sharedState)), isValid(state != nullptr) {}
+        : state(std::move(sharedState)) {}
 
     Future(Future&& other) noexcept
-        : state(std::move(other.state)),
-          isValid(other.isValid.exchange(false)),
-          continued(std::exchange(other.continued, false)) {}
+        : state(std::move(other.state)), continued(std::exchange(other.continued, false)) {}
 
     Future& operator=(Future&& other) noexcept {
         Future taken(std::move(other));
         state.swap(taken.state);
-        isValid = taken.isValid.exchange(isValid);
         std::swap(continued, taken.continued);
         return *this;
     }
 
-    ~Future() { isValid = false; }
+    ~Future() = default;
 
     /// Whether this future belongs to a promise or a result. Stays true after `get` and `then`.
-    bool valid() const noexcept { return isValid; }
+    bool valid() const noexcept { return state != nullptr; }
 
     /// Waits for the result and hands it over by move; may be called once.
     /// Throws the producer's exception, or `std::runtime_error` with one of
@@ -82,9 +78,8 @@ public:
     /// cancelled.", a continuation is destroyed, a later result is dropped. Otherwise, and on an
     /// invalid future, nothing happens.
     void cancel() {
-        if (!isValid) return;
-        const auto keepAlive = state;
-        keepAlive->cancel();
+        // What the destroyed continuation refers to may include this future.
+        if (const auto keepAlive = state) keepAlive->cancel();
     }
 
 private:
@@ -120,18 +115,16 @@ private:
             std::forward<F>(f), std::move(downstream));
         continued = true;
         // The continuation may destroy this future: nothing of it is touched once it is attached.
-        const auto keepAlive = state;
-        keepAlive->attach(std::move(continuation));
+        state->attach(std::move(continuation), state);
         return next;
     }
 
     void requireUsable() const {
-        if (!isValid) detail::throwFutureError(detail::future_errors::futureInvalid);
+        if (!valid()) detail::throwFutureError(detail::future_errors::futureInvalid);
         if (continued) detail::throwFutureError(detail::future_errors::alreadyTaken);
     }
 
     std::shared_ptr<detail::SharedFutureState<T>> state;
-    std::atomic<bool> isValid{false};
     bool continued = false;
 };
 
@@ -144,32 +137,32 @@ template <class T>
 class Promise {
 public:
     /// A promise with a pending result.
-    Promise() : state(std::make_shared<detail::SharedFutureState<T>>()), isValid(true) {}
+    Promise() : state(std::make_shared<detail::SharedFutureState<T>>()) {}
 
     Promise(Promise&& other) noexcept
-        : state(std::move(other.state)), isValid(other.isValid.exchange(false)) {}
+        : state(std::move(other.state)), resolved(std::exchange(other.resolved, false)) {}
 
     Promise& operator=(Promise&& other) noexcept {
         Promise taken(std::move(other));
         state.swap(taken.state);
-        isValid = taken.isValid.exchange(isValid);
+        std::swap(resolved, taken.resolved);
         return *this;
     }
 
     ~Promise() {
-        if (!isValid.exchange(false)) return;
-        const auto abandoned = std::move(state);
-        abandoned->abandon();
+        if (!valid() || resolved) return;
+        auto* const abandoned = state.get();
+        abandoned->abandon(std::move(state));
     }
 
     /// Whether this promise can still be used; false once it was moved from.
-    bool valid() const noexcept { return isValid; }
+    bool valid() const noexcept { return state != nullptr; }
 
     /// The one future. Throws `std::runtime_error` "Promise state isn't valid!" or "Promise already
     /// returned a future.". After a continuation ran, a future can be had once more.
     Future<T> getFuture() {
         requireValid();
-        return state->retrieveFuture();
+        return state->retrieveFuture(state);
     }
 
     /// Resolves with `value`, runs a continuation on this thread and wakes the waiter. Nothing
@@ -187,8 +180,8 @@ public:
     void setException(std::exception_ptr error) {
         requireValid();
         detail::requireException(error);
-        const auto keepAlive = state;
-        keepAlive->setException(std::move(error));
+        resolved = true;
+        state->setException(std::move(error), state);
     }
 
 private:
@@ -196,17 +189,17 @@ private:
     friend class Future;
 
     void setBoxedValue(std::unique_ptr<T> value) {
-        // The consumer may destroy this promise as soon as the result is in.
-        const auto keepAlive = state;
-        keepAlive->setValue(std::move(value));
+        // Noted first: the consumer may destroy this promise as soon as the result is in.
+        resolved = true;
+        state->setValue(std::move(value), state);
     }
 
     void requireValid() const {
-        if (!isValid) detail::throwFutureError(detail::future_errors::promiseInvalid);
+        if (!valid()) detail::throwFutureError(detail::future_errors::promiseInvalid);
     }
 
     std::shared_ptr<detail::SharedFutureState<T>> state;
-    std::atomic<bool> isValid;
+    bool resolved = false;  // the destructor has nothing left to do
 };
 
 /// A future whose `get` gives `value` at once. Two allocations: the state, the boxed value.

@@ -47,8 +47,10 @@ enum class FutureStatus : std::uint32_t { pending, value, exception, cancelled }
 /// boxed before it is taken and destroyed after it is released, continuations are run and destroyed
 /// without it.
 template <class T>
-class SharedFutureState : public std::enable_shared_from_this<SharedFutureState<T>> {
+class SharedFutureState {
 public:
+    using Self = std::shared_ptr<SharedFutureState>;
+
     /// A pending state.
     SharedFutureState() = default;
 
@@ -62,43 +64,42 @@ public:
 
     /// The future of this state. Throws `std::runtime_error` "Promise already returned a future."
     /// unless it is the first call, or the first one since a continuation ran.
-    Future<T> retrieveFuture() VELKOR_EXCLUDES(mutex) {
+    Future<T> retrieveFuture(const Self& self) VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
         if (futureRetrieved) throwFutureError(future_errors::futureAlreadyRetrieved);
         futureRetrieved = true;
-        return Future<T>(this->shared_from_this());
+        return Future<T>(self);
     }
 
     /// Resolves with the boxed value. Nothing happens on a cancelled state. Throws
     /// `std::runtime_error` "Promise already resolved." on a resolved one.
-    void setValue(std::unique_ptr<T> value) VELKOR_EXCLUDES(mutex) {
-        resolve(FutureStatus::value, std::move(value));
+    void setValue(std::unique_ptr<T> value, const Self& self) VELKOR_EXCLUDES(mutex) {
+        resolve(FutureStatus::value, std::move(value), self);
     }
 
     /// Resolves with `error`, which is not null; otherwise as `setValue`.
-    void setException(std::exception_ptr error) VELKOR_EXCLUDES(mutex) {
-        resolve(FutureStatus::exception, std::move(error));
+    void setException(std::exception_ptr error, const Self& self) VELKOR_EXCLUDES(mutex) {
+        resolve(FutureStatus::exception, std::move(error), self);
     }
 
     /// The producer has gone: a pending state fails with "Promise destroyed before it provided a
     /// value.".
-    void abandon() VELKOR_EXCLUDES(mutex) {
+    void abandon(Self self) VELKOR_EXCLUDES(mutex) {
         std::unique_ptr<Continuation<T>> next;
         {
             const common::MutexLock lock(mutex);
-            if (status == FutureStatus::pending) {
-                result = std::make_exception_ptr(std::runtime_error(future_errors::brokenPromise));
-                status = FutureStatus::exception;
-            }
+            if (status != FutureStatus::pending) return;
+            result = std::make_exception_ptr(std::runtime_error(future_errors::brokenPromise));
+            status = FutureStatus::exception;
             next = claimContinuation();
         }
-        run(std::move(next));
+        announce(std::move(next), std::move(self));
     }
 
     /// Attaches the one continuation. On a resolved state it is run at once, by this thread; on a
     /// cancelled one it is destroyed without having run. Throws `std::runtime_error` with the text
     /// of `get` when the result is taken or a continuation is attached already.
-    void attach(std::unique_ptr<Continuation<T>> next) VELKOR_EXCLUDES(mutex) {
+    void attach(std::unique_ptr<Continuation<T>> next, Self self) VELKOR_EXCLUDES(mutex) {
         {
             const common::MutexLock lock(mutex);
             requireUntaken();
@@ -107,7 +108,7 @@ public:
             if (status == FutureStatus::pending) return;
             next = claimContinuation();
         }
-        run(std::move(next));
+        announce(std::move(next), std::move(self));
     }
 
     /// Waits until there is a result and hands it over by move. Throws what the producer stored
@@ -117,7 +118,9 @@ public:
         common::MutexLock lock(mutex);
         requireUntaken();
         valueTaken = true;
+        ++waiting;
         while (status == FutureStatus::pending) lock.wait(ready);
+        --waiting;
         // The claim above makes the result this thread's own: it is used without the lock.
         const FutureStatus reached = status;
         Result taken = std::move(result);
@@ -152,7 +155,8 @@ private:
     /// The box of the value; the error; or an empty box while there is neither.
     using Result = std::variant<std::unique_ptr<T>, std::exception_ptr>;
 
-    void resolve(FutureStatus outcome, Result boxed) VELKOR_EXCLUDES(mutex) {
+    void resolve(FutureStatus outcome, Result boxed, const Self& self) VELKOR_EXCLUDES(mutex) {
+        Self keepAlive;
         std::unique_ptr<Continuation<T>> next;
         {
             const common::MutexLock lock(mutex);
@@ -161,8 +165,11 @@ private:
             result.swap(boxed);
             status = outcome;
             next = claimContinuation();
+            // From here on the consumer may destroy both ends, and with them the owner of `self`.
+            if (next == nullptr && waiting == 0) return;
+            keepAlive = self;
         }
-        run(std::move(next));
+        announce(std::move(next), std::move(keepAlive));
     }
 
     void requireUntaken() const VELKOR_REQUIRES(mutex) {
@@ -177,12 +184,14 @@ private:
         return std::move(continuation);
     }
 
-    void run(std::unique_ptr<Continuation<T>> next) VELKOR_EXCLUDES(mutex) {
+    /// Runs the continuation or, when there is none, wakes those who wait. Never is there both: who
+    /// waits has taken the result.
+    static void announce(std::unique_ptr<Continuation<T>> next, Self self) {
         if (next != nullptr) {
-            next->invoke(Future<T>(this->shared_from_this()));
-            next.reset();
+            next->invoke(Future<T>(std::move(self)));
+        } else {
+            self->ready.notify_all();
         }
-        ready.notify_all();
     }
 
     common::Mutex mutex;
@@ -190,6 +199,7 @@ private:
     Result result VELKOR_GUARDED_BY(mutex);
     std::unique_ptr<Continuation<T>> continuation VELKOR_GUARDED_BY(mutex);
     FutureStatus status VELKOR_GUARDED_BY(mutex) = FutureStatus::pending;
+    std::uint32_t waiting VELKOR_GUARDED_BY(mutex) = 0;
     bool futureRetrieved VELKOR_GUARDED_BY(mutex) = false;
     bool valueTaken VELKOR_GUARDED_BY(mutex) = false;
 };

@@ -72,18 +72,19 @@ std::string resultText(Future<int>&& future) {
 }
 
 // What has become of `state`, seen through a continuation that is attached to it.
-std::string observe(State& state) {
+std::string observe(const std::shared_ptr<State>& state) {
     std::string seen = "pending";
     bool destroyed = false;
-    state.attach(continuation([&](Future<int>&& future) { seen = resultText(std::move(future)); },
-                              [&] { destroyed = true; }));
+    state->attach(continuation([&](Future<int>&& future) { seen = resultText(std::move(future)); },
+                               [&] { destroyed = true; }),
+                  state);
     if (seen != "pending") return seen;
     if (destroyed) return "cancelled";
-    state.cancel();  // takes the continuation, which refers to this frame, out of the state
+    state->cancel();  // takes the continuation, which refers to this frame, out of the state
     return seen;
 }
 
-// Every event in every status. The row says what is thrown and what has become of the state.
+// Every event in every status. The row says what is thrown and what has become of the state->
 
 enum class Status { pending, value, exception, cancelled };
 enum class Event { setValue, setException, cancel, abandon, retrieveFuture };
@@ -131,24 +132,24 @@ std::ostream& operator<<(std::ostream& out, const Transition& row) {
 
 std::shared_ptr<State> stateIn(Status status) {
     auto state = std::make_shared<State>();
-    if (status == Status::value) state->setValue(std::make_unique<int>(1));
-    if (status == Status::exception) state->setException(failure("first"));
+    if (status == Status::value) state->setValue(std::make_unique<int>(1), state);
+    if (status == Status::exception) state->setException(failure("first"), state);
     if (status == Status::cancelled) state->cancel();
     return state;
 }
 
-void apply(Event event, State& state) {
+void apply(Event event, const std::shared_ptr<State>& state) {
     switch (event) {
         case Event::setValue:
-            return state.setValue(std::make_unique<int>(2));
+            return state->setValue(std::make_unique<int>(2), state);
         case Event::setException:
-            return state.setException(failure("second"));
+            return state->setException(failure("second"), state);
         case Event::cancel:
-            return state.cancel();
+            return state->cancel();
         case Event::abandon:
-            return state.abandon();
+            return state->abandon(state);
         case Event::retrieveFuture:
-            state.retrieveFuture();
+            state->retrieveFuture(state);
     }
 }
 
@@ -156,9 +157,9 @@ class SharedFutureStateTransition : public ::testing::TestWithParam<Transition> 
 
 TEST_P(SharedFutureStateTransition, LeadsToTheStateInTheTable) {
     const auto state = stateIn(GetParam().from);
-    EXPECT_EQ(thrownText<std::runtime_error>([&] { apply(GetParam().event, *state); }),
+    EXPECT_EQ(thrownText<std::runtime_error>([&] { apply(GetParam().event, state); }),
               GetParam().thrown);
-    EXPECT_EQ(observe(*state), GetParam().observed);
+    EXPECT_EQ(observe(state), GetParam().observed);
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -192,10 +193,10 @@ class SharedFutureStateContinuation : public ::testing::Test {
 protected:
     // Attaches a continuation that counts its runs and takes nothing.
     void attachCounting() {
-        state->attach(continuation([this](Future<int>&&) { ++runs; }));
+        state->attach(continuation([this](Future<int>&&) { ++runs; }), state);
     }
 
-    void setValue(int value) { state->setValue(std::make_unique<int>(value)); }
+    void setValue(int value) { state->setValue(std::make_unique<int>(value), state); }
 
     const std::shared_ptr<State> state = std::make_shared<State>();
     int runs = 0;
@@ -208,7 +209,7 @@ TEST_F(SharedFutureStateContinuation, WaitsOnAPendingState) {
 
 TEST_F(SharedFutureStateContinuation, RunsOnTheResolvingThread) {
     std::thread::id ranOn;
-    state->attach(continuation([&](Future<int>&&) { ranOn = std::this_thread::get_id(); }));
+    state->attach(continuation([&](Future<int>&&) { ranOn = std::this_thread::get_id(); }), state);
     std::thread producer([this] { setValue(1); });
     const std::thread::id producerId = producer.get_id();
     producer.join();
@@ -217,27 +218,27 @@ TEST_F(SharedFutureStateContinuation, RunsOnTheResolvingThread) {
 
 TEST_F(SharedFutureStateContinuation, RunsForAnException) {
     attachCounting();
-    state->setException(failure("reason"));
+    state->setException(failure("reason"), state);
     EXPECT_EQ(runs, 1);
 }
 
 TEST_F(SharedFutureStateContinuation, RunsWhenTheProducerGoes) {
     attachCounting();
-    state->abandon();
+    state->abandon(state);
     EXPECT_EQ(runs, 1);
 }
 
 TEST_F(SharedFutureStateContinuation, RunsOnlyOnceWhenTheProducerGoesAfterResolving) {
     attachCounting();
     setValue(1);
-    state->abandon();
+    state->abandon(state);
     EXPECT_EQ(runs, 1);
 }
 
 TEST_F(SharedFutureStateContinuation, RunsAtOnceOnTheAttachingThreadOfAResolvedState) {
     setValue(1);
     std::thread::id ranOn;
-    state->attach(continuation([&](Future<int>&&) { ranOn = std::this_thread::get_id(); }));
+    state->attach(continuation([&](Future<int>&&) { ranOn = std::this_thread::get_id(); }), state);
     EXPECT_EQ(ranOn, std::this_thread::get_id());
 }
 
@@ -261,20 +262,21 @@ TEST_F(SharedFutureStateContinuation, GetIsRefusedWhileItWaits) {
 }
 
 TEST_F(SharedFutureStateContinuation, TakesTheResultAlthoughAFutureWasRetrieved) {
-    const Future<int> retrieved = state->retrieveFuture();
+    const Future<int> retrieved = state->retrieveFuture(state);
     int seen = 0;
-    state->attach(continuation([&](Future<int>&& future) { seen = future.get(); }));
+    state->attach(continuation([&](Future<int>&& future) { seen = future.get(); }), state);
     setValue(5);
     EXPECT_EQ(seen, 5);
 }
 
 TEST_F(SharedFutureStateContinuation, ClearsBothFlagsBeforeItIsInvoked) {
-    const Future<int> retrieved = state->retrieveFuture();
+    const Future<int> retrieved = state->retrieveFuture(state);
     bool retrievedAgain = false;
     state->attach(continuation([&](Future<int>&&) {
-        Future<int> again = state->retrieveFuture();
-        retrievedAgain = again.get() == 5;
-    }));
+                      Future<int> again = state->retrieveFuture(state);
+                      retrievedAgain = again.get() == 5;
+                  }),
+                  state);
     setValue(5);
     EXPECT_TRUE(retrievedAgain);
 }
@@ -289,27 +291,29 @@ TEST_F(SharedFutureStateContinuation, AnotherOneCanFollowIt) {
 TEST_F(SharedFutureStateContinuation, ResultItLeftCanBeTakenAfterwards) {
     attachCounting();
     setValue(5);
-    EXPECT_EQ(state->retrieveFuture().get(), 5);
+    EXPECT_EQ(state->retrieveFuture(state).get(), 5);
 }
 
 TEST_F(SharedFutureStateContinuation, ResultItTookIsGone) {
-    state->attach(continuation([](Future<int>&& future) { future.get(); }));
+    state->attach(continuation([](Future<int>&& future) { future.get(); }), state);
     setValue(5);
-    EXPECT_EQ(thrownText<std::runtime_error>([this] { state->retrieveFuture().get(); }),
+    EXPECT_EQ(thrownText<std::runtime_error>([this] { state->retrieveFuture(state).get(); }),
               alreadyTaken);
 }
 
 TEST_F(SharedFutureStateContinuation, IsDestroyedBeforeTheResolvingCallReturns) {
     std::vector<std::string> steps;
     state->attach(continuation([&](Future<int>&&) { steps.push_back("invoked"); },
-                               [&] { steps.push_back("destroyed"); }));
+                               [&] { steps.push_back("destroyed"); }),
+                  state);
     setValue(1);
     steps.push_back("returned");
     EXPECT_EQ(steps, (std::vector<std::string>{"invoked", "destroyed", "returned"}));
 }
 
 TEST_F(SharedFutureStateContinuation, ExceptionReachesWhoeverSetTheValue) {
-    state->attach(continuation([](Future<int>&&) { throw std::out_of_range("from inside"); }));
+    state->attach(continuation([](Future<int>&&) { throw std::out_of_range("from inside"); }),
+                  state);
     EXPECT_EQ(thrownText<std::out_of_range>([this] { setValue(1); }), "from inside");
 }
 
@@ -317,7 +321,8 @@ TEST_F(SharedFutureStateContinuation, ExceptionReachesWhoeverAttached) {
     setValue(1);
     EXPECT_EQ(thrownText<std::out_of_range>([this] {
                   state->attach(
-                      continuation([](Future<int>&&) { throw std::out_of_range("from inside"); }));
+                      continuation([](Future<int>&&) { throw std::out_of_range("from inside"); }),
+                      state);
               }),
               "from inside");
 }
@@ -325,21 +330,25 @@ TEST_F(SharedFutureStateContinuation, ExceptionReachesWhoeverAttached) {
 TEST_F(SharedFutureStateContinuation, IsDestroyedWhenItThrows) {
     bool destroyed = false;
     state->attach(continuation([](Future<int>&&) { throw std::out_of_range("from inside"); },
-                               [&] { destroyed = true; }));
+                               [&] { destroyed = true; }),
+                  state);
     EXPECT_THROW(setValue(1), std::out_of_range);
     EXPECT_TRUE(destroyed);
 }
 
 TEST_F(SharedFutureStateContinuation, ExceptionLeavesTheStateResolved) {
-    state->attach(continuation([](Future<int>&&) { throw std::out_of_range("from inside"); }));
+    state->attach(continuation([](Future<int>&&) { throw std::out_of_range("from inside"); }),
+                  state);
     EXPECT_THROW(setValue(1), std::out_of_range);
-    EXPECT_EQ(observe(*state), "value 1");
+    EXPECT_EQ(observe(state), "value 1");
 }
 
 TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileItIsInvoked) {
     bool free = false;
-    state->attach(continuation(
-        [&](Future<int>&&) { free = completes([shared = state] { shared->cancel(); }); }));
+    state->attach(continuation([&](Future<int>&&) {
+                      free = completes([shared = state] { shared->cancel(); });
+                  }),
+                  state);
     setValue(1);
     EXPECT_TRUE(free);
 }
@@ -347,7 +356,8 @@ TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileItIsInvoked) {
 TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileItIsDestroyedAfterItsRun) {
     bool free = false;
     state->attach(continuation([](Future<int>&&) {},
-                               [&] { free = completes([shared = state] { shared->cancel(); }); }));
+                               [&] { free = completes([shared = state] { shared->cancel(); }); }),
+                  state);
     setValue(1);
     EXPECT_TRUE(free);
 }
@@ -355,7 +365,8 @@ TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileItIsDestroyedAfterItsRun)
 TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileACancelDestroysIt) {
     bool free = false;
     state->attach(continuation([](Future<int>&&) {},
-                               [&] { free = completes([shared = state] { shared->cancel(); }); }));
+                               [&] { free = completes([shared = state] { shared->cancel(); }); }),
+                  state);
     state->cancel();
     EXPECT_TRUE(free);
 }
@@ -364,24 +375,28 @@ TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileACancelledStateRefusesIt)
     bool free = false;
     state->cancel();
     state->attach(continuation([](Future<int>&&) {},
-                               [&] { free = completes([shared = state] { shared->cancel(); }); }));
+                               [&] { free = completes([shared = state] { shared->cancel(); }); }),
+                  state);
     EXPECT_TRUE(free);
 }
 
 TEST_F(SharedFutureStateContinuation, NoLockIsHeldWhileARefusedOneIsDestroyed) {
     bool free = false;
     attachCounting();
-    EXPECT_THROW(state->attach(continuation(
-                     [](Future<int>&&) {},
-                     [&] { free = completes([shared = state] { shared->cancel(); }); })),
-                 std::runtime_error);
+    EXPECT_THROW(
+        state->attach(
+            continuation([](Future<int>&&) {},
+                         [&] { free = completes([shared = state] { shared->cancel(); }); }),
+            state),
+        std::runtime_error);
     EXPECT_TRUE(free);
 }
 
 TEST_F(SharedFutureStateContinuation, IsDestroyedWithoutHavingRunWhenTheStateDies) {
     bool destroyed = false;
     auto owned = std::make_shared<State>();
-    owned->attach(continuation([this](Future<int>&&) { ++runs; }, [&] { destroyed = true; }));
+    owned->attach(continuation([this](Future<int>&&) { ++runs; }, [&] { destroyed = true; }),
+                  owned);
     owned.reset();
     EXPECT_TRUE(destroyed);
     EXPECT_EQ(runs, 0);
@@ -389,28 +404,13 @@ TEST_F(SharedFutureStateContinuation, IsDestroyedWithoutHavingRunWhenTheStateDie
 
 // Lifetime
 
-TEST(SharedFutureState, NotOwnedBySharedPointersHasNoFuture) {
-    State state;
-    EXPECT_THROW(state.retrieveFuture(), std::bad_weak_ptr);
-}
-
-TEST(SharedFutureState, NotOwnedBySharedPointersRunsNoContinuation) {
-    State state;
-    bool invoked = false;
-    bool destroyed = false;
-    state.attach(continuation([&](Future<int>&&) { invoked = true; }, [&] { destroyed = true; }));
-    EXPECT_THROW(state.setValue(std::make_unique<int>(1)), std::bad_weak_ptr);
-    EXPECT_FALSE(invoked);
-    EXPECT_TRUE(destroyed);
-}
-
 TEST(SharedFutureState, LivesAsLongAsAnyFuture) {
     std::weak_ptr<State> observer;
     Future<int> future;
     {
         const auto state = std::make_shared<State>();
         observer = state;
-        future = state->retrieveFuture();
+        future = state->retrieveFuture(state);
     }
     EXPECT_FALSE(observer.expired());
     future = Future<int>();
@@ -419,14 +419,15 @@ TEST(SharedFutureState, LivesAsLongAsAnyFuture) {
 
 TEST(SharedFutureState, BornWithAValueHandsOutItsFutureOnce) {
     const auto state = std::make_shared<State>(std::make_unique<int>(3));
-    EXPECT_EQ(state->retrieveFuture().get(), 3);
-    EXPECT_THROW(state->retrieveFuture(), std::runtime_error);
+    EXPECT_EQ(state->retrieveFuture(state).get(), 3);
+    EXPECT_THROW(state->retrieveFuture(state), std::runtime_error);
 }
 
 TEST(SharedFutureState, BornWithAValueRefusesAnother) {
     const auto state = std::make_shared<State>(std::make_unique<int>(3));
-    EXPECT_EQ(thrownText<std::runtime_error>([&] { state->setValue(std::make_unique<int>(4)); }),
-              alreadyResolved);
+    EXPECT_EQ(
+        thrownText<std::runtime_error>([&] { state->setValue(std::make_unique<int>(4), state); }),
+        alreadyResolved);
 }
 
 TEST(SharedFutureState, ManyThreadsSettleItOnce) {
@@ -440,7 +441,7 @@ TEST(SharedFutureState, ManyThreadsSettleItOnce) {
             threads.emplace_back([&, value] {
                 EXPECT_TRUE(start.arriveAndWait());
                 const std::string text = thrownText<std::runtime_error>(
-                    [&] { state->setValue(std::make_unique<int>(value)); });
+                    [&] { state->setValue(std::make_unique<int>(value), state); });
                 EXPECT_TRUE(text == nothingThrown || text == alreadyResolved) << text;
                 if (text == nothingThrown) ++settled;
             });
