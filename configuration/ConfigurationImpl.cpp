@@ -33,8 +33,15 @@ std::string normalised(std::string group) {
     return group;
 }
 
-bool isForeign(const ConfigurationSource& source) {
-    return typeid(source) != typeid(InMemorySource) && typeid(source) != typeid(PropertyFileSource);
+// Exactly these classes: one that derives from them may answer differently.
+const ValueTable* tableOf(const ConfigurationSource& source) {
+    if (typeid(source) == typeid(InMemorySource)) {
+        return &static_cast<const InMemorySource&>(source).table();
+    }
+    if (typeid(source) == typeid(PropertyFileSource)) {
+        return &static_cast<const PropertyFileSource&>(source).table();
+    }
+    return nullptr;
 }
 
 template <class T, class Error = std::runtime_error>
@@ -136,6 +143,9 @@ ConfigurationImpl::ConfigurationSourceMap::ConfigurationSourceMap(
       readOnly(isReadOnly),
       source(std::move(layer)) {}
 
+ConfigurationImpl::RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
+    : ConfigurationSourceMap(std::move(entry)), table(tableOf(*source)) {}
+
 ConfigurationImpl::ConfigurationImpl()
     : sources(std::make_shared<SourceList>()), publishers(std::make_unique<WatchList>()) {
     scratchKeys.reserve(pooledScratchKeys);
@@ -206,6 +216,7 @@ Future<std::set<std::string>> ConfigurationImpl::keys() {
     for (const auto& entry : layers) {
         auto layerKeys = entry.source->keys();
         if (entry.group.empty()) {
+            if (all.empty()) all.swap(layerKeys);
             all.merge(layerKeys);
             continue;
         }
@@ -355,9 +366,14 @@ ConfigurationImpl::Layer ConfigurationImpl::findLayer(const std::string& key, Sc
     for (const auto& entry : layers) {
         if (!appliesTo(entry.group, key)) continue;
         const std::string& relativeKey = scratch.within(entry.group, key);
-        if (entry.source->has(relativeKey)) return {&entry, relativeKey};
+        if (entry.table != nullptr) {
+            const ConfigurationValue* held = entry.table->find(relativeKey);
+            if (held != nullptr) return {&entry, relativeKey, held};
+        } else if (entry.source->has(relativeKey)) {
+            return {&entry, relativeKey, nullptr};
+        }
     }
-    return {nullptr, key};
+    return {nullptr, key, nullptr};
 }
 
 ConfigurationValue ConfigurationImpl::readValue(const Layer& layer, const std::string& key) {
@@ -402,7 +418,11 @@ void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>&
     storeLogger.write(common::debug, "updatePublishers: ", key);
     // Reading a value for nobody is left out where neither the log nor a source would show it.
     const bool noticed = hasForeignSources || storeLogger.isEnabled(common::debug);
-    if (!noticed && !publishers->watches(key)) return;
+    WatchList::Publishers watchers;
+    if (!noticed) {
+        watchers = publishers->watching(key);
+        if (watchers.empty()) return;
+    }
     ConfigurationValue value;
     {
         ScratchKey scratch(*this);
@@ -410,7 +430,8 @@ void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>&
         if (!layer) return;
         value = readValue(layer, key);
     }
-    auto watchers = publishers->watching(key);
+    // A source or a log sink may have added or cancelled watches meanwhile.
+    if (noticed) watchers = publishers->watching(key);
     if (watchers.empty()) return;
 
     Retired released;
@@ -449,7 +470,7 @@ void ConfigurationImpl::insertSource(ConfigurationSourceMap entry) {
     const auto position = std::find_if(changed.begin(), changed.end(), [&](const auto& present) {
         return present.order >= entry.order;
     });
-    changed.insert(position, std::move(entry));
+    changed.insert(position, RegisteredSource(std::move(entry)));
     replaceSources(std::move(changed));
 }
 
@@ -468,7 +489,7 @@ void ConfigurationImpl::replaceSources(SourceList changed) {
     pastSources.push_back(sources);
     sources = std::move(next);
     hasForeignSources = std::any_of(sources->begin(), sources->end(),
-                                    [](const auto& entry) { return isForeign(*entry.source); });
+                                    [](const auto& entry) { return entry.table == nullptr; });
     updateRunsForeignCode();
 }
 

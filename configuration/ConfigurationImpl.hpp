@@ -15,6 +15,7 @@
 
 namespace velkor::configuration {
 
+class ValueTable;
 class WatchList;
 
 /// How a source is registered.
@@ -121,18 +122,27 @@ protected:
     std::recursive_mutex mutex;
 
 private:
-    using SourceList = std::vector<ConfigurationSourceMap>;
+    /// A registered source and, if it is one of this library's own, the table it reads from.
+    struct RegisteredSource : ConfigurationSourceMap {
+        explicit RegisteredSource(ConfigurationSourceMap entry);
+
+        const ValueTable* table;
+    };
+
+    using SourceList = std::vector<RegisteredSource>;
     using Retired = std::vector<std::shared_ptr<const void>>;
 
     class Operation;
     class ScratchKey;
 
-    /// The layer that decides a key, and the key as its source knows it.
+    /// The layer that decides a key, the key as its source knows it, and the value if it is in the
+    /// source's table.
     struct Layer {
         const ConfigurationSourceMap* entry;
         const std::string& relativeKey;
+        const ConfigurationValue* held;
 
-        ConfigurationValue value() const { return entry->source->get(relativeKey); }
+        ConfigurationValue value() const { return held ? *held : entry->source->get(relativeKey); }
         explicit operator bool() const { return entry != nullptr; }
     };
 

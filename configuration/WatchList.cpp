@@ -10,12 +10,6 @@ void WatchList::add(std::shared_ptr<WatchPublisher> publisher, const std::string
     entries.insert(entries.end(), PublisherEntry{std::move(publisher), key, streamId});
 }
 
-bool WatchList::watches(const std::string& key) const {
-    if (entries.empty()) return false;
-    const auto& byKey = entries.get<ByKey>();
-    return byKey.find(key) != byKey.end();
-}
-
 WatchList::Publishers WatchList::watching(const std::string& key) const {
     Publishers publishers;
     if (entries.empty()) return publishers;

@@ -33,9 +33,6 @@ public:
 
     bool empty() const { return entries.empty(); }
 
-    /// Whether there is a watch of exactly `key`.
-    bool watches(const std::string& key) const;
-
     /// The publishers that watch exactly `key`, in order of creation.
     Publishers watching(const std::string& key) const;
 

@@ -27,7 +27,7 @@ void InMemorySource::notify(const std::string& key) {
 }
 
 bool InMemorySource::has(const std::string& key) {
-    return std::as_const(values).find(key) != nullptr;
+    return table().find(key) != nullptr;
 }
 
 void InMemorySource::setChangeListener(ChangeListener newListener) {
