@@ -1,6 +1,8 @@
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 
+#include <cstddef>
 #include <cstdint>
+#include <iterator>
 #include <locale>
 #include <sstream>
 #include <string>
@@ -106,20 +108,32 @@ administration::CommandHandler handlerOf(const Command& command,
     };
 }
 
+// Withdraws the first `count` commands.
+void withdraw(administration::Administration& registry, std::size_t count) {
+    for (std::size_t row = 0; row < count; ++row) registry.unregisterCommand(commands[row].name);
+}
+
 }  // namespace
 
 ConfigurationCommandProvider::ConfigurationCommandProvider(
     std::shared_ptr<Configuration> store, std::shared_ptr<administration::Administration> registry)
     : configuration(std::move(store)), administration(std::move(registry)) {
-    for (const Command& command : commands) {
-        administration->registerCommand({command.name, command.description,
-                                         handlerOf(command, configuration),
-                                         command.minimumArguments, command.maximumArguments});
+    std::size_t registered = 0;
+    try {
+        for (const Command& command : commands) {
+            administration->registerCommand({command.name, command.description,
+                                             handlerOf(command, configuration),
+                                             command.minimumArguments, command.maximumArguments});
+            ++registered;
+        }
+    } catch (...) {
+        withdraw(*administration, registered);
+        throw;
     }
 }
 
 ConfigurationCommandProvider::~ConfigurationCommandProvider() {
-    for (const Command& command : commands) administration->unregisterCommand(command.name);
+    withdraw(*administration, std::size(commands));
     administration.reset();
     configuration.reset();
 }

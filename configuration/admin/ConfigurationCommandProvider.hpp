@@ -24,7 +24,8 @@ namespace velkor::configuration {
 /// `std::out_of_range`; what the store throws passes through.
 class VELKOR_EXPORT ConfigurationCommandProvider : public administration::CommandProvider {
 public:
-    /// Registers set, get and list, in this order, without waiting for the registry's answers.
+    /// Registers set, get and list, in this order, without waiting for the registry's answers. When
+    /// the registry throws, what it took is withdrawn and the exception passes on.
     ConfigurationCommandProvider(std::shared_ptr<Configuration> configuration,
                                  std::shared_ptr<administration::Administration> administration);
     ConfigurationCommandProvider(const ConfigurationCommandProvider&) = delete;

@@ -448,5 +448,22 @@ TEST_F(FailingStore, ThrowForTheTextOfANumberLeavesSet) {
     EXPECT_THAT(throwsFrom("set", {"a", "5"}), ThrowsMessage<std::logic_error>(StrEq("string 5")));
 }
 
+TEST(ConfigurationCommandProvider, WithdrawsWhatAThrowingRegistryTook) {
+    class FullAdministration : public RecordingAdministration {
+    public:
+        Future<bool> registerCommand(administration::CommandDescriptor command) override {
+            if (commands.size() == 2) throw std::length_error("full");
+            return RecordingAdministration::registerCommand(std::move(command));
+        }
+    };
+    const auto registry = std::make_shared<FullAdministration>();
+    EXPECT_THROW(ConfigurationCommandProvider(std::make_shared<ConfigurationImpl>(), registry),
+                 std::length_error);
+    EXPECT_THAT(
+        registry->events,
+        ElementsAre("register velkor.configuration.set", "register velkor.configuration.get",
+                    "unregister velkor.configuration.set", "unregister velkor.configuration.get"));
+}
+
 }  // namespace
 }  // namespace velkor::configuration
