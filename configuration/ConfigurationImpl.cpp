@@ -70,7 +70,7 @@ void reportSubscriberError(const std::string& key) noexcept {
 class ConfigurationImpl::Operation {
 public:
     explicit Operation(ConfigurationImpl& owner) : store(owner), held(owner.mutex) {
-        if (store.heldLevels++ == 0 && store.runsForeignCode)
+        if (store.heldLevels++ == 0 && store.changesAreNoticed())
             keepAlive = store.weak_from_this().lock();
     }
 
@@ -434,8 +434,9 @@ void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>&
     if (noticed) watchers = publishers->watching(key);
     if (watchers.empty()) return;
 
+    const bool counted = heldLevels > 0;
     Retired released;
-    giveBackLevel(released);
+    if (counted) giveBackLevel(released);
     lock.unlock();
     released.clear();
     for (const auto& publisher : watchers) {
@@ -449,7 +450,7 @@ void ConfigurationImpl::updatePublishers(std::unique_lock<std::recursive_mutex>&
     // The last reference to a watch that was cancelled meanwhile is given up without the lock.
     watchers.clear();
     lock.lock();
-    ++heldLevels;
+    if (counted) ++heldLevels;
 }
 
 void ConfigurationImpl::removeStream(std::uint64_t streamId) {

@@ -100,7 +100,8 @@ public:
     Future<std::vector<Option>> explain(const std::string& key);
 
 protected:
-    // These take the caller's lock on the store's mutex, which is held.
+    // These take the caller's lock on the store's mutex, which is held: the caller's only level, or
+    // one within an operation of the store.
 
     /// Whether any source has `key`.
     bool doHas(std::unique_lock<std::recursive_mutex>& lock, const std::string& key);
@@ -155,7 +156,6 @@ private:
     Option readOption(const Layer& layer, const std::string& key);
     bool changesAreNoticed() const noexcept;
     void onSourceChanged(const std::string& group, const std::string& key);
-    void deliver(const std::string& key, const ConfigurationValue& value);
     const ConfigurationSourceMap* findSource(const std::string& name) const;
     void insertSource(ConfigurationSourceMap entry);
     void eraseSource(const std::string& name);

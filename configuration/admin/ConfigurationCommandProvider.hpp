@@ -14,8 +14,7 @@ namespace velkor::configuration {
 /// - "velkor.configuration.set" KEY TEXT: stores "true" and "false" as bool, a text with a "." as
 ///   double and any other as int where it begins with such a number, else as narrow text. Answers
 ///   nothing; a refused write is not reported.
-/// - "velkor.configuration.get" KEY: the value, or "No configuration option with key: " and the
-/// key.
+/// - "velkor.configuration.get" KEY: the value, or "No configuration option with key: " and KEY.
 /// - "velkor.configuration.list": a line "KEY = VALUE" for each key, in byte order.
 ///
 /// Numbers are read and written in the C locale. Keys and values appear as they are: a host that

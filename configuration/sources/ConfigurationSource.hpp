@@ -31,7 +31,8 @@ public:
     /// Whether there is a value for `key`.
     virtual bool has(const std::string& key) = 0;
 
-    /// Replaces the listener; an empty one detaches. A source that changes by itself calls it once
+    /// Replaces the listener; an empty one detaches. That of a registered source belongs to the
+    /// store. A source that changes by itself calls it once
     /// for each changed key, after the new value can be read.
     virtual void setChangeListener(ChangeListener listener) = 0;
 

@@ -37,11 +37,11 @@ ValueMap readProperties(const std::u16string& path) {
     file.imbue(std::locale::classic());
     const std::string text = readAll(file);
     ValueMap properties;
-    // A table that need not grow is filled half again as fast. Most lines hold one property, and
-    // none has fewer bytes than a key, a separator and a line break.
-    constexpr std::ptrdiff_t smallestProperty = 3;
+    // A table that need not grow is filled half again as fast. Most lines hold one property; the
+    // limit keeps a file of nothing but line breaks from taking more memory than its own size.
+    constexpr std::ptrdiff_t usualProperty = 16;
     const auto lines = std::count(text.begin(), text.end(), '\n');
-    const auto most = static_cast<std::ptrdiff_t>(text.size()) / smallestProperty;
+    const auto most = static_cast<std::ptrdiff_t>(text.size()) / usualProperty;
     properties.reserve(static_cast<std::size_t>(std::min(lines, most)));
     PropertyFileParser(text, properties).parse();
     return properties;

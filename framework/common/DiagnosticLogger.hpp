@@ -33,9 +33,9 @@ public:
     }
 
     /// Writes one record whose message is `parts`, each inserted into a stream of the C locale in
-    /// turn, truth values as 0 and 1. Composes
-    /// nothing when the severity is disabled or no sink wants the record. What a sink throws passes
-    /// on to the caller unless the host gave Boost.Log an exception handler.
+    /// turn, truth values as 0 and 1. Composes nothing when the severity is disabled or no sink
+    /// wants the record. What a sink throws passes on to the caller unless the host gave Boost.Log
+    /// an exception handler.
     template <class... Parts>
     void write(Severity severity, const Parts&... parts) const {
         if (!isEnabled(severity)) return;

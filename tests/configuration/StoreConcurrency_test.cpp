@@ -1,6 +1,9 @@
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include <atomic>
+#include <filesystem>
+#include <fstream>
 #include <functional>
 #include <string>
 #include <thread>
@@ -8,6 +11,7 @@
 
 #include "tests/configuration/StoreTesting.hpp"
 #include "tests/support/BoundedWait.hpp"
+#include "tests/support/TemporaryFile.hpp"
 
 namespace velkor::configuration {
 namespace {
@@ -135,6 +139,20 @@ TEST_F(StoreConcurrency, StoreMayBeDroppedByWhicheverThreadIsLast) {
         shared.reset();
         for (auto& thread : threads) thread.join();
     }
+}
+
+TEST_F(StoreConcurrency, PropertyFileIsReadWithoutTheMutex) {
+    // A pipe: whoever opens it to read waits until somebody opens it to write.
+    const testing::TemporaryFile file("");
+    std::filesystem::remove(file.path());
+    ASSERT_EQ(::mkfifo(file.path().c_str(), 0600), 0);
+    std::thread adding([&] { store->addPropertyFileSource("pipe", "", 5, true, file.widePath()); });
+    std::ofstream pipe(file.path());  // returns once the other thread is reading
+    EXPECT_TRUE(testing::completes([shared = store] { shared->has("a"); }));
+    pipe << "a=1\n";
+    pipe.close();
+    adding.join();
+    EXPECT_EQ(textOf(store->get("a").get()), "string 1");
 }
 
 }  // namespace

@@ -1,16 +1,21 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <functional>
 #include <locale>
 #include <memory>
+#include <mutex>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <typeinfo>
 #include <vector>
 
 #include "configuration/sources/InMemorySource.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/BoundedWait.hpp"
 #include "tests/support/LogCapture.hpp"
 #include "tests/support/ScopedGlobalLocale.hpp"
 #include "tests/support/TemporaryFile.hpp"
@@ -232,6 +237,46 @@ TEST_F(StoreLog, HostsNumbersChangeNothing) {
     EXPECT_THAT(messagesOf([&] { add("extra", "", 1234567, {}, true); }),
                 ElementsAre("addSource: extra, , 1234567, 1, " + inMemory));
 }
+
+/// Gives access to the mutex, to hold it against an operation.
+class HeldStore : public ConfigurationImpl {
+public:
+    using ConfigurationImpl::mutex;
+};
+
+struct FirstLine {
+    const char* name;
+    std::function<void(ConfigurationImpl&)> operation;
+    std::string line;
+};
+
+class StoreLogFirstLine : public ::testing::TestWithParam<FirstLine> {};
+
+TEST_P(StoreLogFirstLine, IsWrittenBeforeTheMutexIsTaken) {
+    HeldStore store;
+    const testing::LogCapture log("velkor::configuration", common::debug);
+    std::unique_lock<std::recursive_mutex> held(store.mutex);
+    std::thread operating([&] { GetParam().operation(store); });
+    const auto deadline = std::chrono::steady_clock::now() + testing::patience;
+    while (log.messages().empty() && std::chrono::steady_clock::now() < deadline) {
+        std::this_thread::yield();
+    }
+    EXPECT_THAT(log.messages(), ElementsAre(GetParam().line));
+    held.unlock();
+    operating.join();
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Operations, StoreLogFirstLine,
+    ::testing::Values(
+        FirstLine{"Set", [](auto& store) { store.set("k", 1); }, "set: k"},
+        FirstLine{"SetByName", [](auto& store) { store.set("k", 1, "default"); },
+                  "set: k, default"},
+        FirstLine{"AddSource", [](auto& store) { store.addInMemorySource("s", "g", 1, false, {}); },
+                  "addSource: s, g, 1, 0, " + inMemory},
+        FirstLine{"RemoveSource", [](auto& store) { store.removeSource("default"); },
+                  "removeSource: default"}),
+    [](const auto& row) { return row.param.name; });
 
 }  // namespace
 }  // namespace velkor::configuration
