@@ -19,7 +19,8 @@ namespace {
 // stream's buffer, and `readsome` takes what is in it, so that an error costs no byte before it.
 std::string readAll(std::istream& file) {
     std::string text;
-    std::array<char, 8 * 1024> block;
+    constexpr std::size_t blockSize = 8192;
+    std::array<char, blockSize> block;
     while (file.peek() != std::istream::traits_type::eof()) {
         const std::streamsize size = file.readsome(block.data(), block.size());
         text.append(block.data(), static_cast<std::size_t>(size));
