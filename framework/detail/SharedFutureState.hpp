@@ -41,11 +41,12 @@ enum class FutureStatus : std::uint32_t { pending, value, exception, cancelled }
 
 /// What a promise and its future share: the result, and whether it was taken.
 ///
-/// Thread-safe: every member may be called from any thread. Owned by shared pointers and made by
-/// `std::make_shared`; a caller holds a reference of its own during a call, since the other side
-/// may drop its one as soon as the result is in. No foreign code runs under the mutex: results are
-/// boxed before it is taken and destroyed after it is released, continuations are run and destroyed
-/// without it.
+/// Thread-safe: every member may be called from any thread. Owned by shared pointers; `self` is one
+/// to this state. Who resolves takes a reference of its own only if it has something left to do
+/// after the mutex, since a consumer may destroy both ends as soon as the result is in: a POSIX
+/// mutex may be destroyed by whoever locks it next. No foreign code runs under the mutex: values
+/// are boxed before it is taken and destroyed after it is released, continuations are run and
+/// destroyed without it.
 template <class T>
 class SharedFutureState {
 public:
