@@ -10,6 +10,7 @@
 #include <utility>
 
 #include "configuration/Loggers.hpp"
+#include "configuration/StoreErrors.hpp"
 #include "configuration/WatchList.hpp"
 #include "configuration/sources/InMemorySource.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
@@ -51,7 +52,7 @@ Future<T> failed(const std::string& message) {
 
 template <class T>
 Future<T> noSuchOption(const std::string& key) {
-    return failed<T>("No option with the specified key was found: " + key);
+    return failed<T>(store_errors::noSuchOption + key);
 }
 
 void reportSubscriberError(const std::string& key) noexcept {
@@ -186,7 +187,7 @@ Future<ConfigurationValue> ConfigurationImpl::set(const std::string& key,
     const Operation operation(*this);
     const auto* target = findTarget(key, nullptr);
     if (target == nullptr) {
-        return failed<ConfigurationValue>("No writable configuration source for key: " + key);
+        return failed<ConfigurationValue>(store_errors::noWritableSource + key);
     }
     return write(*target, key, std::move(value));
 }
@@ -197,7 +198,7 @@ Future<ConfigurationValue> ConfigurationImpl::set(const std::string& key, Config
     const Operation operation(*this);
     const auto* target = findTarget(key, &sourceName);
     if (target == nullptr) {
-        return failed<ConfigurationValue>("Source not found or not writable: " + key + ", " +
+        return failed<ConfigurationValue>(store_errors::sourceNotWritable + key + ", " +
                                           sourceName);
     }
     return write(*target, key, std::move(value));
@@ -274,7 +275,7 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
                                           int order, bool readOnly,
                                           std::shared_ptr<ConfigurationSource> source) {
     if (source == nullptr) {
-        throw std::invalid_argument("A configuration source must not be null.");
+        throw std::invalid_argument(store_errors::nullSource);
     }
     const ConfigurationSource& dynamicSource = *source;
     storeLogger.write(common::debug, "addSource: ", name, ", ", group, ", ", order, ", ", readOnly,
@@ -282,8 +283,7 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
     const auto keepAlive = weak_from_this().lock();
     Operation operation(*this);
     if (findSource(name) != nullptr) {
-        return failed<bool, std::invalid_argument>(
-            "Source with the requested name already exists: " + name);
+        return failed<bool, std::invalid_argument>(store_errors::duplicateSource + name);
     }
     const std::string prefix = normalised(group);
     insertSource(ConfigurationSourceMap(name, prefix, order, readOnly, source));
@@ -348,7 +348,7 @@ ConfigurationValue ConfigurationImpl::doGet(std::unique_lock<std::recursive_mute
     const Operation operation(*this);
     ScratchKey scratch(*this);
     const Layer layer = findLayer(key, scratch);
-    if (!layer) throw std::runtime_error("No option value for key: " + key);
+    if (!layer) throw std::runtime_error(store_errors::noOptionValue + key);
     return readValue(layer, key);
 }
 
@@ -357,7 +357,7 @@ Option ConfigurationImpl::doGetOption(std::unique_lock<std::recursive_mutex>&,
     const Operation operation(*this);
     ScratchKey scratch(*this);
     const Layer layer = findLayer(key, scratch);
-    if (!layer) throw std::runtime_error("No option for key: " + key);
+    if (!layer) throw std::runtime_error(store_errors::noOption + key);
     return readOption(layer, key);
 }
 

@@ -6,8 +6,9 @@
 
 #include "framework/Future.hpp"
 #include "framework/Message.hpp"
+#include "framework/RoutingErrors.hpp"
 #include "framework/common/Export.hpp"
-#include "framework/detail/RoutingErrors.hpp"
+#include "framework/detail/Routing.hpp"
 
 namespace velkor {
 
@@ -47,7 +48,7 @@ Future<std::unique_ptr<Message>> MessageAPI<M, P>::dispatch(std::shared_ptr<P> p
                                                             Address&& from,
                                                             std::shared_ptr<Context>&& context) {
     if (self.get() != this) {
-        return detail::failMismatch(detail::routing_errors::notForThisObject, typeid(M),
+        return detail::failMismatch(routing_errors::notForThisObject, typeid(M),
                                     detail::typeOf(self.get()));
     }
     std::unique_ptr<M> request(static_cast<M*>(self.release()));

@@ -7,9 +7,10 @@
 
 #include "framework/Future.hpp"
 #include "framework/Message.hpp"
+#include "framework/RoutingErrors.hpp"
 #include "framework/ServiceMessage.hpp"
 #include "framework/common/Export.hpp"
-#include "framework/detail/RoutingErrors.hpp"
+#include "framework/detail/Routing.hpp"
 
 namespace velkor {
 
@@ -62,7 +63,7 @@ public:
         const std::type_info& found = detail::typeOf(message.get());
         auto* const request = dynamic_cast<ServiceMessage<P>*>(message.get());
         if (request == nullptr) {
-            return detail::failMismatch(detail::routing_errors::notForThisService,
+            return detail::failMismatch(routing_errors::notForThisService,
                                         typeid(ServiceMessage<P>), found);
         }
         return request->dispatch(std::static_pointer_cast<P>(shared_from_this()),

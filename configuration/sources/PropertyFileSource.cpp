@@ -7,6 +7,7 @@
 #include <locale>
 #include <stdexcept>
 
+#include "configuration/StoreErrors.hpp"
 #include "configuration/sources/PropertyFileParser.hpp"
 #include "framework/common/TextConversion.hpp"
 #include "framework/common/WidePathInputFileStream.hpp"
@@ -31,7 +32,7 @@ std::string readAll(std::istream& file) {
 ValueMap readProperties(const std::u16string& path) {
     common::WidePathInputFileStream file(path);
     if (!file) {
-        throw std::runtime_error("Property file could not be opened: " +
+        throw std::runtime_error(store_errors::fileNotOpened +
                                  common::TextConversion("UTF-8").fromUtf16(path));
     }
     // A stream begins with the host's locale, which may convert what is read.
@@ -58,7 +59,7 @@ ConfigurationValue PropertyFileSource::get(const std::string& key) {
 }
 
 ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValue) {
-    throw std::runtime_error("PropertyFileSource does not support writing");
+    throw std::runtime_error(store_errors::writingNotSupported);
 }
 
 bool PropertyFileSource::has(const std::string& key) {

@@ -4,7 +4,7 @@
 
 #include <utility>
 
-#include "framework/detail/RoutingErrors.hpp"
+#include "framework/RoutingErrors.hpp"
 #include "host/messages/JsonText.hpp"
 
 namespace velkor::host {
@@ -58,7 +58,9 @@ void JsonSerializerImpl::unregisterMessage(const std::type_info& type) {
 }
 
 JsonMessage JsonSerializerImpl::encode(const std::unique_ptr<Message>& message) const {
-    const auto form = formOf(detail::typeOf(message.get()));
+    if (message == nullptr) throw std::bad_typeid();
+    const Message& content = *message;
+    const auto form = formOf(typeid(content));
     return {form->name, renderJson(*form->serialise(message))};
 }
 
@@ -71,7 +73,7 @@ std::shared_ptr<const JsonSerializerImpl::Form> JsonSerializerImpl::formOf(
     const std::type_info& type) const {
     const common::MutexLock lock(mutex);
     const auto entry = byType.find(type);
-    if (entry == byType.end()) throw UnknownMessageType(unknownType(detail::typeName(type)));
+    if (entry == byType.end()) throw UnknownMessageType(unknownType(typeName(type)));
     return entry->second;
 }
 

@@ -8,7 +8,7 @@
 
 #include "framework/Future.hpp"
 #include "framework/Message.hpp"
-#include "framework/detail/RoutingErrors.hpp"
+#include "framework/RoutingErrors.hpp"
 #include "host/messages/JsonText.hpp"
 
 namespace velkor::host {
@@ -20,7 +20,7 @@ DispatchError failed(DispatchFailure failure, const std::exception& error) {
 }
 
 bool saysNotRunning(const std::exception& error) {
-    return std::strcmp(error.what(), detail::routing_errors::notRunning) == 0;
+    return std::strcmp(error.what(), routing_errors::notRunning) == 0;
 }
 
 }  // namespace

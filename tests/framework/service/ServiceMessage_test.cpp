@@ -8,7 +8,7 @@
 #include <typeinfo>
 #include <utility>
 
-#include "framework/detail/RoutingErrors.hpp"
+#include "framework/RoutingErrors.hpp"
 #include "tests/framework/service/Greeting.hpp"
 
 namespace velkor {
@@ -106,18 +106,18 @@ TEST_F(Dispatch, OfNoMessageThrows) {
 }
 
 TEST(RoutingErrors, AreTheseTexts) {
-    EXPECT_STREQ(detail::routing_errors::notRunning, "Service exists but is not running.");
-    EXPECT_STREQ(detail::routing_errors::notForThisObject,
+    EXPECT_STREQ(routing_errors::notRunning, "Service exists but is not running.");
+    EXPECT_STREQ(routing_errors::notForThisObject,
                  "Unable to deliver to service. Incorrect message type. Expected: ");
-    EXPECT_STREQ(detail::routing_errors::notForThisService, "Incorrect message type. Expected: ");
-    EXPECT_STREQ(detail::routing_errors::butFound, " but found ");
+    EXPECT_STREQ(routing_errors::notForThisService, "Incorrect message type. Expected: ");
+    EXPECT_STREQ(routing_errors::butFound, " but found ");
 }
 
 struct Local {};
 
 TEST(TypeName, IsThePlatformsWithoutALeadingAsterisk) {
-    EXPECT_EQ(detail::typeName(typeid(int)), typeid(int).name());
-    EXPECT_NE(detail::typeName(typeid(Local)).front(), '*');
+    EXPECT_EQ(typeName(typeid(int)), typeid(int).name());
+    EXPECT_NE(typeName(typeid(Local)).front(), '*');
 }
 
 TEST(Message, IsConcreteAndPolymorphic) {

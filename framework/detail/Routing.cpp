@@ -1,14 +1,11 @@
-#include "framework/detail/RoutingErrors.hpp"
+#include "framework/detail/Routing.hpp"
 
 #include <exception>
 #include <stdexcept>
 
-namespace velkor::detail {
+#include "framework/RoutingErrors.hpp"
 
-std::string typeName(const std::type_info& type) {
-    const char* name = type.name();
-    return *name == '*' ? name + 1 : name;
-}
+namespace velkor::detail {
 
 const std::type_info& typeOf(const Message* message) {
     return typeid(*message);
