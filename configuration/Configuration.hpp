@@ -1,8 +1,10 @@
 #pragma once
 
+#include <filesystem>
 #include <memory>
 #include <set>
 #include <string>
+#include <type_traits>
 
 #include "configuration/ConfigurationValue.hpp"
 #include "configuration/Option.hpp"
@@ -22,6 +24,15 @@ namespace velkor::configuration {
 /// no writable source, a name already taken) are in the future; what a source throws, and a file
 /// that can't be opened, leaves the call as an exception.
 class VELKOR_EXPORT Configuration {
+    template <class Text>
+    using EnableForText = std::enable_if_t<std::is_same_v<std::decay_t<Text>, const char*> ||
+                                           std::is_same_v<std::decay_t<Text>, char*>>;
+
+    template <class Path>
+    using EnableForPath =
+        std::enable_if_t<std::is_convertible_v<const Path&, std::filesystem::path> &&
+                         !std::is_convertible_v<const Path&, std::u16string>>;
+
 public:
     virtual ~Configuration();
 
@@ -45,6 +56,20 @@ public:
     /// there is no such source, it is read-only, or its group doesn't begin the key.
     virtual Future<ConfigurationValue> set(const std::string& key, ConfigurationValue value,
                                            const std::string& sourceName) = 0;
+
+    /// As above, with the characters up to the NUL that ends `text` as narrow text. Chosen for
+    /// character literals and pointers to characters, which would become a bool otherwise. A null
+    /// pointer throws `std::invalid_argument` "A text must not be null.".
+    template <class Text, class = EnableForText<Text>>
+    Future<ConfigurationValue> set(const std::string& key, Text&& text) {
+        return set(key, ConfigurationValue(narrowText(text)));
+    }
+
+    template <class Text, class = EnableForText<Text>>
+    Future<ConfigurationValue> set(const std::string& key, Text&& text,
+                                   const std::string& sourceName) {
+        return set(key, ConfigurationValue(narrowText(text)), sourceName);
+    }
 
     /// Whether any source has `key`.
     virtual Future<bool> has(const std::string& key) = 0;
@@ -77,6 +102,13 @@ public:
                                                int order, bool readOnly,
                                                const std::u16string& path) = 0;
 
+    /// As above, for a `std::filesystem::path` and what converts to one. The path is UTF-8.
+    template <class Path, class = EnableForPath<Path>>
+    Future<bool> addPropertyFileSource(const std::string& name, const std::string& group, int order,
+                                       bool readOnly, const Path& path) {
+        return addPropertyFileSource(name, group, order, readOnly, wideText(path));
+    }
+
     /// Adds a source that holds `values`; gives true. Fails with `std::invalid_argument` "Source
     /// with the requested name already exists: " followed by the name.
     virtual Future<bool> addInMemorySource(const std::string& name, const std::string& group,
@@ -92,6 +124,10 @@ public:
 
     /// A shared pointer to this store; `std::bad_weak_ptr` when no shared pointer owns it.
     virtual std::shared_ptr<Configuration> getPtr() = 0;
+
+private:
+    static std::string narrowText(const char* text);
+    static std::u16string wideText(const std::filesystem::path& path);
 };
 
 }  // namespace velkor::configuration

@@ -1,7 +1,6 @@
 #pragma once
 
 #include <atomic>
-#include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <mutex>
@@ -10,46 +9,32 @@
 #include <vector>
 
 #include "configuration/Configuration.hpp"
+#include "configuration/detail/SourceRegistry.hpp"
+#include "configuration/detail/StoreLock.hpp"
 #include "configuration/sources/ConfigurationSource.hpp"
+#include "configuration/sources/ConfigurationSourceMap.hpp"
+#include "configuration/sources/SourceDescription.hpp"
 #include "framework/common/Export.hpp"
+#include "framework/common/Mutex.hpp"
 
 namespace velkor::configuration {
 
-class ValueTable;
+namespace detail {
 class WatchList;
-
-/// How a source is registered.
-struct SourceDescription {
-    std::string name;
-    std::string group;  ///< Empty, or ending in ".".
-    int order;
-    bool readOnly;
-};
+}
 
 /// The store. A fresh one holds two writable sources without a group: "override" (order 0), which
 /// takes ordinary writes, and "default" (order 2147483647), the layer of last resort.
 ///
-/// Thread-safe: one recursive mutex, taken by every operation to its end, guards all state; sources
-/// are called under it and may call back into the store. It is released while watchers are told of
-/// a source that was added or removed and of a watch's first value; a write keeps it.
-/// Lock order: store, publisher, future state. What the store lets go of (sources, publishers) is
-/// destroyed after the mutex has been released.
+/// Thread-safe: one recursive mutex guards all state, and sources are called under it; what each
+/// operation holds, runs and waits for stands in docs/concurrency.md. What the store lets go of
+/// (sources, publishers) is destroyed after the mutex has been released.
 ///
 /// Owned by a shared pointer; without one, `watchOption` and `getPtr` throw `std::bad_weak_ptr`.
 class VELKOR_EXPORT ConfigurationImpl : public Configuration,
                                         public std::enable_shared_from_this<Configuration> {
 public:
-    /// One registered source.
-    struct ConfigurationSourceMap {
-        ConfigurationSourceMap(std::string sourceName, std::string keyPrefix, int precedence,
-                               bool isReadOnly, std::shared_ptr<ConfigurationSource> layer);
-
-        std::string name;
-        std::string group;  ///< Normalised: empty, or ending in ".".
-        int order;
-        bool readOnly;
-        std::shared_ptr<ConfigurationSource> source;
-    };
+    using ConfigurationSourceMap = configuration::ConfigurationSourceMap;
 
     ConfigurationImpl();
     ConfigurationImpl(const ConfigurationImpl&) = delete;
@@ -61,6 +46,7 @@ public:
 
     Future<ConfigurationValue> get(const std::string& key) override;
     Future<Option> getOption(const std::string& key) override;
+    using Configuration::set;
     Future<ConfigurationValue> set(const std::string& key, ConfigurationValue value) override;
     Future<ConfigurationValue> set(const std::string& key, ConfigurationValue value,
                                    const std::string& sourceName) override;
@@ -68,6 +54,7 @@ public:
     Future<std::set<std::string>> keys() override;
     std::shared_ptr<reactive_streams::PublisherAPI<ConfigurationValue>> watchOption(
         const std::string& key) override;
+    using Configuration::addPropertyFileSource;
     Future<bool> addPropertyFileSource(const std::string& name, const std::string& group, int order,
                                        bool readOnly, const std::u16string& path) override;
     Future<bool> addInMemorySource(const std::string& name, const std::string& group, int order,
@@ -83,8 +70,11 @@ public:
     ///
     /// Fails with `std::invalid_argument` "Source with the requested name already exists: " and the
     /// name. A null source throws `std::invalid_argument` "A configuration source must not be
-    /// null." before anything else happens. What the source's `keys` throws leaves the call; the
-    /// source stays registered then, without a listener.
+    /// null." before anything else happens. What the source throws, and lack of memory, leaves the
+    /// call; the source may be registered by then, without a listener.
+    ///
+    /// The listener is installed last. As long as there is none, watchers are told of what is
+    /// written to the source through the store by the store itself.
     ///
     /// Lifetime: the source gets a change listener that points to this store without owning it. The
     /// store takes it back when it is destroyed, not when the source is removed, so a source that
@@ -100,8 +90,8 @@ public:
     Future<std::vector<Option>> explain(const std::string& key);
 
 protected:
-    // These take the caller's lock on the store's mutex, which is held: the caller's only level, or
-    // one within an operation of the store.
+    // The first four take the caller's lock on the store's mutex, which is held: the caller's only
+    // level, or one within an operation of the store. `removeStream` takes the mutex itself.
 
     /// Whether any source has `key`.
     bool doHas(std::unique_lock<std::recursive_mutex>& lock, const std::string& key);
@@ -113,78 +103,33 @@ protected:
     Option doGetOption(std::unique_lock<std::recursive_mutex>& lock, const std::string& key);
 
     /// Publishes the effective value of `key`, if there is one, to the watchers of exactly that
-    /// key, with one level of the mutex released. On return the lock is held again.
+    /// key, with one level of the mutex released. On return the lock is held again. Throws
+    /// `std::system_error` when `lock` can't be released or taken again.
     void updatePublishers(std::unique_lock<std::recursive_mutex>& lock, const std::string& key);
 
     /// Forgets one watch; does nothing when there is none with that number.
     void removeStream(std::uint64_t streamId);
 
-    /// Guards everything below.
+    /// Guards all state but the atomic members, which are read without it.
     std::recursive_mutex mutex;
 
 private:
-    /// A registered source and, if it is one of this library's own, the table it reads from.
-    struct RegisteredSource : ConfigurationSourceMap {
-        explicit RegisteredSource(ConfigurationSourceMap entry);
-
-        const ValueTable* table;
-    };
-
-    using SourceList = std::vector<RegisteredSource>;
-    using Retired = std::vector<std::shared_ptr<const void>>;
-
     class Operation;
-    class ScratchKey;
 
-    /// The layer that decides a key, the key as its source knows it, and the value if it is in the
-    /// source's table.
-    struct Layer {
-        const ConfigurationSourceMap* entry;
-        const std::string& relativeKey;
-        const ConfigurationValue* held;
-
-        ConfigurationValue value() const { return held ? *held : entry->source->get(relativeKey); }
-        explicit operator bool() const { return entry != nullptr; }
-    };
-
-    Layer findLayer(const std::string& key, ScratchKey& scratch);
-    const ConfigurationSourceMap* findTarget(const std::string& key,
-                                             const std::string* sourceName) const;
-    Future<ConfigurationValue> write(const ConfigurationSourceMap& target, const std::string& key,
-                                     ConfigurationValue&& value);
-    ConfigurationValue readValue(const Layer& layer, const std::string& key);
-    Option readOption(const Layer& layer, const std::string& key);
-    bool changesAreNoticed() const noexcept;
+    Future<ConfigurationValue> write(const detail::RegisteredSource& target, const std::string& key,
+                                     ConfigurationValue&& value) VELKOR_REQUIRES(storeLock);
     void onSourceChanged(const std::string& group, const std::string& key);
-    const ConfigurationSourceMap* findSource(const std::string& name) const;
-    void insertSource(ConfigurationSourceMap entry);
-    void eraseSource(const std::string& name);
-    void replaceSources(SourceList changed);
-    void updateRunsForeignCode();
-    void retire(std::shared_ptr<const void> object);
-    void giveBackLevel(Retired& released) noexcept;
+    bool foreignCodeMayRun() const noexcept;
+    void updateHasForeignCode() VELKOR_REQUIRES(storeLock);
 
+    detail::StoreLock storeLock{mutex};
     std::atomic<std::uint64_t> nextStreamId{0};
-    // In order of precedence. Never changed in place: a walk goes on over the list it began with
-    // when a source that it calls adds or removes sources.
-    std::shared_ptr<const SourceList> sources;
-    // Sources that are not this library's own.
-    bool hasForeignSources = false;
-    std::unique_ptr<WatchList> publishers;
-    // There are watchers or foreign sources. Only then can an operation lose the store to a
-    // callback, and does a change of a source concern anybody. Read without the mutex by sources'
-    // listeners.
-    std::atomic<bool> runsForeignCode{false};
-    // Levels of the mutex that are held by operations, and what these have let go of. The thread
-    // that gives the last level back destroys that itself, without the mutex: a source may wait in
-    // its destructor for any other thread that uses the store.
-    std::size_t heldLevels = 0;
-    Retired retired;
-    // Lists that a walk may still go on over.
-    std::vector<std::shared_ptr<const SourceList>> pastSources;
-    // Buffers for keys with a group removed or added. Lent out, so that a source that calls back
-    // into the store gets another one.
-    std::vector<std::string> scratchKeys;
+    detail::SourceRegistry sources VELKOR_GUARDED_BY(storeLock);
+    std::unique_ptr<detail::WatchList> publishers VELKOR_GUARDED_BY(storeLock);
+    // There are watchers or sources of other libraries. Read without the mutex by the listeners.
+    std::atomic<bool> hasForeignCode{false};
+    // The destructor has begun: no source is given a listener any more.
+    bool closing VELKOR_GUARDED_BY(storeLock) = false;
 };
 
 }  // namespace velkor::configuration

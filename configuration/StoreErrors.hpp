@@ -16,6 +16,7 @@ inline constexpr const char* sourceNotWritable = "Source not found or not writab
 inline constexpr const char* writingNotSupported = "PropertyFileSource does not support writing";
 inline constexpr const char* duplicateSource = "Source with the requested name already exists: ";
 inline constexpr const char* nullSource = "A configuration source must not be null.";
+inline constexpr const char* nullText = "A text must not be null.";
 inline constexpr const char* fileNotOpened = "Property file could not be opened: ";
 
 }  // namespace velkor::configuration::store_errors

@@ -52,26 +52,10 @@ ValueMap readProperties(const std::u16string& path) {
 }  // namespace
 
 PropertyFileSource::PropertyFileSource(const std::u16string& path)
-    : properties(readProperties(path)) {}
-
-ConfigurationValue PropertyFileSource::get(const std::string& key) {
-    return properties.at(key);
-}
+    : TableSource(typeid(PropertyFileSource), readProperties(path)) {}
 
 ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValue) {
     throw std::runtime_error(store_errors::writingNotSupported);
-}
-
-bool PropertyFileSource::has(const std::string& key) {
-    return properties.find(key) != nullptr;
-}
-
-void PropertyFileSource::setChangeListener(ChangeListener listener) {
-    changeListener.swap(listener);
-}
-
-std::set<std::string> PropertyFileSource::keys() {
-    return properties.keys();
 }
 
 }  // namespace velkor::configuration

@@ -1,11 +1,9 @@
 #pragma once
 
 #include <memory>
-#include <set>
 #include <string>
 
-#include "configuration/sources/ConfigurationSource.hpp"
-#include "configuration/sources/ValueTable.hpp"
+#include "configuration/sources/TableSource.hpp"
 
 namespace velkor::configuration {
 
@@ -14,32 +12,15 @@ namespace velkor::configuration {
 /// for byte as in the file after escapes. Made by `std::make_shared`.
 ///
 /// After construction the properties never change: concurrent `get`, `has` and `keys` are safe.
-class VELKOR_EXPORT PropertyFileSource : public ConfigurationSource,
+class VELKOR_EXPORT PropertyFileSource : public TableSource,
                                          public std::enable_shared_from_this<PropertyFileSource> {
 public:
     /// Reads the property file at `path`. Throws `std::runtime_error` "Property file could not be
     /// opened: " followed by the path in UTF-8. Content never fails; a read error ends the file.
     explicit PropertyFileSource(const std::u16string& path);
 
-    PropertyFileSource(const PropertyFileSource&) = delete;
-    PropertyFileSource& operator=(const PropertyFileSource&) = delete;
-
-    /// A copy of the value of `key`; `std::out_of_range` "_Map_base::at" when there is none.
-    ConfigurationValue get(const std::string& key) override;
-
     /// Throws `std::runtime_error` "PropertyFileSource does not support writing".
     ConfigurationValue set(const std::string& key, ConfigurationValue value) override;
-
-    bool has(const std::string& key) override;
-    void setChangeListener(ChangeListener listener) override;
-    std::set<std::string> keys() override;
-
-    /// The values themselves. The store looks them up here: one search instead of `has` and `get`.
-    const ValueTable& table() const noexcept { return properties; }
-
-private:
-    ValueTable properties;
-    ChangeListener changeListener;
 };
 
 }  // namespace velkor::configuration

@@ -9,8 +9,8 @@
 
 namespace velkor::configuration {
 
-/// The table that a source of this library keeps its values in. Entries are never removed, and a
-/// value stays where it is. Concurrent calls of the const members are safe, as on any container.
+/// The table that a source keeps its values in. A value stays where it is until its key is removed.
+/// Concurrent calls of the const members are safe, as on any container.
 class ValueTable {
 public:
     /// Takes over the entries of `values`, which is left empty.
@@ -40,6 +40,9 @@ public:
     void insert(const std::string& key, ConfigurationValue&& value) {
         entries.emplace(key, std::move(value));
     }
+
+    /// Removes `key`; gives whether it was there.
+    bool erase(const std::string& key) { return entries.erase(key) != 0; }
 
     /// All keys, sorted byte by byte.
     std::set<std::string> keys() const {

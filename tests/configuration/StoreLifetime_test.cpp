@@ -1,12 +1,18 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <cstddef>
+#include <functional>
 #include <memory>
+#include <mutex>
+#include <ostream>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/LogCapture.hpp"
 #include "tests/support/RecordingSubscriber.hpp"
 
 namespace velkor::configuration {
@@ -184,6 +190,96 @@ TEST_F(StoreLifetime, SourceMayChangeTheRegistryWhileTheStoreIsDestroyed) {
     EXPECT_FALSE(first->listener);
     EXPECT_EQ(second.use_count(), 1);
 }
+
+TEST_F(StoreLifetime, SourceRegisteredWhileTheStoreIsDestroyedGetsNoListener) {
+    const auto first = addHooked("first", "", -9);
+    const auto late = std::make_shared<HookedSource>(HookedSource::Table{{"a", 1}});
+    first->whenDetached = [&, dying = store.get()] {
+        EXPECT_TRUE(dying->addSource("late", "", -10, false, late).get());
+    };
+    store.reset();
+    EXPECT_THAT(late->calls, ElementsAre("keys", "has a", "get a"));
+    EXPECT_FALSE(late->listener);
+}
+
+TEST_F(StoreLifetime, SourceRemovedWhileTheStoreIsDestroyedGoesWithTheStoreUnlocked) {
+    class OpenStore : public ConfigurationImpl {
+    public:
+        using ConfigurationImpl::mutex;
+    };
+    auto open = std::make_shared<OpenStore>();
+    auto first = std::make_shared<HookedSource>();
+    auto second = std::make_shared<HookedSource>();
+    open->addSource("first", "", -9, false, first);
+    open->addSource("second", "", -8, false, second);
+    bool free = false;
+    second->whenDestroyed = [&free, dying = open.get()] {
+        std::thread([&] {
+            const std::unique_lock<std::recursive_mutex> attempt(dying->mutex, std::try_to_lock);
+            free = attempt.owns_lock();
+        }).join();
+    };
+    second.reset();
+    first->whenDetached = [dying = open.get()] { dying->removeSource("second"); };
+    open.reset();
+    EXPECT_TRUE(free);
+}
+
+/// An operation during which something gives up the last reference to the store.
+struct LastOperation {
+    const char* name;
+    std::function<void(ConfigurationImpl&)> operation;
+    std::size_t records;  ///< How many it writes.
+};
+
+std::ostream& operator<<(std::ostream& out, const LastOperation& last) {
+    return out << last.name;
+}
+
+class StoreDroppedByALogSink : public testing::StoreTest,
+                               public ::testing::WithParamInterface<LastOperation> {};
+
+TEST_P(StoreDroppedByALogSink, OutlivesTheOperationThatWritesTheRecord) {
+    for (std::size_t dropAt = 1; dropAt <= GetParam().records; ++dropAt) {
+        store = std::make_shared<ConfigurationImpl>();
+        store->set("a", 1);
+        const std::weak_ptr<ConfigurationImpl> alive = store;
+        ConfigurationImpl* const plain = store.get();
+        std::size_t written = 0;
+        bool aliveAfterwards = false;
+        testing::LogCapture log("velkor::configuration", common::debug);
+        log.whenRecorded([&](const testing::LogRecord&) {
+            if (++written < dropAt) return;
+            store.reset();
+            aliveAfterwards = !alive.expired();
+        });
+        GetParam().operation(*plain);
+        EXPECT_EQ(written, GetParam().records);
+        EXPECT_TRUE(aliveAfterwards);
+        EXPECT_TRUE(alive.expired());
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Operations, StoreDroppedByALogSink,
+    ::testing::Values(
+        LastOperation{"Get", [](auto& store) { store.get("a"); }, 1},
+        LastOperation{"GetOption", [](auto& store) { store.getOption("a"); }, 1},
+        LastOperation{"Set", [](auto& store) { store.set("a", 2); }, 4},
+        LastOperation{"SetByName", [](auto& store) { store.set("a", 2, "default"); }, 4},
+        LastOperation{"RefusedSet", [](auto& store) { store.set("a", 2, "nobody"); }, 1},
+        LastOperation{"WatchOption", [](auto& store) { store.watchOption("a"); }, 2},
+        LastOperation{"WatchOfNothing", [](auto& store) { store.watchOption("b"); }, 1},
+        LastOperation{"AddSource",
+                      [](auto& store) {
+                          store.addInMemorySource("n", "", -1, false, {{"a", 3}});
+                      },
+                      3},
+        LastOperation{"RefusedAddSource",
+                      [](auto& store) { store.addInMemorySource("default", "", 1, false, {}); }, 1},
+        LastOperation{"RemoveSource", [](auto& store) { store.removeSource("override"); }, 2},
+        LastOperation{"RemoveNothing", [](auto& store) { store.removeSource("nobody"); }, 1}),
+    [](const auto& row) { return row.param.name; });
 
 TEST(StoreLifetimeDeathTest, FailureOfASourceDuringDestructionEndsTheProcess) {
     GTEST_FLAG_SET(death_test_style, "threadsafe");

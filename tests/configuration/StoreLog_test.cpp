@@ -188,6 +188,13 @@ TEST_F(StoreLog, EachWatcherOfAWriteIsLogged) {
                     "notifying watcher: a", "notifying watcher: a"));
 }
 
+TEST_F(StoreLog, WatcherOfAVanishedKeyIsNotLogged) {
+    add("only", "", 5, {{"a", 1}});
+    const auto watch = store->watchOption("a");
+    EXPECT_THAT(messagesOf([&] { store->removeSource("only"); }),
+                ElementsAre("removeSource: only", "updatePublishers: a"));
+}
+
 TEST_F(StoreLog, ChangeReportedByASourceIsLogged) {
     const auto source = addHooked("extra", "app", 5, {{"a", 1}});
     EXPECT_THAT(messagesOf([&] { source->listener("a"); }),
@@ -253,10 +260,10 @@ struct FirstLine {
 class StoreLogFirstLine : public ::testing::TestWithParam<FirstLine> {};
 
 TEST_P(StoreLogFirstLine, IsWrittenBeforeTheMutexIsTaken) {
-    HeldStore store;
+    const auto store = std::make_shared<HeldStore>();
     const testing::LogCapture log("velkor::configuration", common::debug);
-    std::unique_lock<std::recursive_mutex> held(store.mutex);
-    std::thread operating([&] { GetParam().operation(store); });
+    std::unique_lock<std::recursive_mutex> held(store->mutex);
+    std::thread operating([&] { GetParam().operation(*store); });
     const auto deadline = std::chrono::steady_clock::now() + testing::patience;
     while (log.messages().empty() && std::chrono::steady_clock::now() < deadline) {
         std::this_thread::yield();
@@ -275,7 +282,8 @@ INSTANTIATE_TEST_SUITE_P(
         FirstLine{"AddSource", [](auto& store) { store.addInMemorySource("s", "g", 1, false, {}); },
                   "addSource: s, g, 1, 0, " + inMemory},
         FirstLine{"RemoveSource", [](auto& store) { store.removeSource("default"); },
-                  "removeSource: default"}),
+                  "removeSource: default"},
+        FirstLine{"WatchOption", [](auto& store) { store.watchOption("k"); }, "watchOption: k"}),
     [](const auto& row) { return row.param.name; });
 
 }  // namespace

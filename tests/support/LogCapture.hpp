@@ -8,6 +8,7 @@
 #include <boost/log/utility/formatting_ostream.hpp>
 #include <boost/smart_ptr/make_shared.hpp>
 #include <boost/smart_ptr/shared_ptr.hpp>
+#include <functional>
 #include <mutex>
 #include <string>
 #include <utility>
@@ -52,6 +53,11 @@ public:
     /// The records so far, oldest first.
     std::vector<LogRecord> records() const { return sink->records(); }
 
+    /// Runs `action` inside the sink for each record from now on. Not while others write records.
+    void whenRecorded(std::function<void(const LogRecord&)> action) {
+        sink->whenRecorded = std::move(action);
+    }
+
     /// Only the messages of the records so far.
     std::vector<std::string> messages() const {
         std::vector<std::string> texts;
@@ -83,8 +89,12 @@ private:
         void consume(const boost::log::record_view& record) override {
             const auto severity = boost::log::extract<common::Severity>("Severity", record);
             const auto message = boost::log::extract<std::string>("Message", record);
-            const std::lock_guard<std::mutex> lock(mutex);
-            collected.push_back({channel, severity.get(), message.get()});
+            const LogRecord collectedRecord{channel, severity.get(), message.get()};
+            {
+                const std::lock_guard<std::mutex> lock(mutex);
+                collected.push_back(collectedRecord);
+            }
+            if (whenRecorded) whenRecorded(collectedRecord);
         }
 
         void flush() override {}
@@ -93,6 +103,8 @@ private:
             const std::lock_guard<std::mutex> lock(mutex);
             return collected;
         }
+
+        std::function<void(const LogRecord&)> whenRecorded;
 
     private:
         const std::string channel;

@@ -12,9 +12,11 @@
 #include <string>
 
 #include "configuration/ConfigurationValue.hpp"
+#include "configuration/detail/SourceRegistry.hpp"
+#include "configuration/detail/StoreLock.hpp"
 #include "framework/reactive_streams/CachedValuePublisher.hpp"
 
-namespace velkor::configuration {
+namespace velkor::configuration::detail {
 
 /// The stream behind one watch.
 using WatchPublisher =
@@ -35,6 +37,12 @@ public:
 
     /// The publishers that watch exactly `key`, in order of creation.
     Publishers watching(const std::string& key) const;
+
+    /// Publishes the value of `key` in `sources`, if there is one, to the watchers of exactly that
+    /// key, with `level` released. What escapes from one is reported on standard error as "Error in
+    /// configuration value subscriber: " and the key. What a source or a log sink throws passes on,
+    /// and so does `std::system_error` of `level`.
+    void update(StoreLock::Level& level, SourceRegistry& sources, const std::string& key) const;
 
     /// Removes a watch and gives the list's reference back; null when there is none.
     std::shared_ptr<WatchPublisher> remove(std::uint64_t streamId);
@@ -69,4 +77,4 @@ private:
     Entries entries;
 };
 
-}  // namespace velkor::configuration
+}  // namespace velkor::configuration::detail
