@@ -78,7 +78,8 @@ public:
     ///
     /// Lifetime: the source gets a change listener that points to this store without owning it. The
     /// store takes it back when it is destroyed, not when the source is removed, so a source that
-    /// others still write after its removal must not outlive the store.
+    /// others still write after its removal must not outlive the store. A source that is registered
+    /// while the store is destroyed gets no listener.
     Future<bool> addSource(const std::string& name, const std::string& group, int order,
                            bool readOnly, std::shared_ptr<ConfigurationSource> source);
 

@@ -16,7 +16,20 @@ using ChangeListener = std::function<void(const std::string&)>;
 ///
 /// Keys are relative to the group under which the store registered the source. The store calls a
 /// source only while it holds its own mutex, so a source that is written through the store alone
-/// needs no lock. A source may call back into the store.
+/// needs no lock. A source may call back into the store. `TableSource` is a base for sources that
+/// keep their values in a table.
+///
+/// A source that changes by itself, on a thread of its own,
+/// - guards its values by a mutex of its own, since its thread changes them without the store's;
+/// - doesn't hold that mutex while it calls the listener: the listener takes the store's mutex, and
+///   the store calls the source with that mutex held;
+/// - makes the new value readable before it calls the listener, once for each changed key, and
+///   calls it for a key that has gone as well;
+/// - calls the listener only while the store is alive: it holds a shared pointer to the store for
+///   the time of the call, or is stopped before the last one goes. The store's destructor takes the
+///   listener back with an empty one, and a copy that is called later calls into nothing;
+/// - is stopped before it is removed if it is to outlive the store: a removed source keeps its
+///   listener.
 class VELKOR_EXPORT ConfigurationSource {
 public:
     virtual ~ConfigurationSource() = 0;
@@ -32,8 +45,7 @@ public:
     virtual bool has(const std::string& key) = 0;
 
     /// Replaces the listener; an empty one detaches. That of a registered source belongs to the
-    /// store. A source that changes by itself calls it once
-    /// for each changed key, after the new value can be read.
+    /// store.
     virtual void setChangeListener(ChangeListener listener) = 0;
 
     /// All keys.
