@@ -1,5 +1,6 @@
 #pragma once
 
+#include <atomic>
 #include <exception>
 #include <functional>
 #include <memory>
@@ -90,15 +91,17 @@ private:
         CallableContinuation(F&& f, Promise<U>&& next)
             : callable(std::forward<F>(f)), downstream(std::move(next)) {}
 
-        void invoke(Future&& future) override {
+        void invoke(Future&& future) override { detail::runAll(proceed(std::move(future))); }
+
+        // Resolving the next future comes last, so it may be left to whoever runs the chain.
+        detail::Step proceed(Future&& future) override {
             std::unique_ptr<U> returned;
             try {
                 returned = std::make_unique<U>(std::invoke(callable, std::move(future)));
             } catch (...) {
-                downstream.setException(std::current_exception());
-                return;
+                return downstream.settle(std::current_exception());
             }
-            downstream.setBoxedValue(std::move(returned));
+            return downstream.settle(std::move(returned));
         }
 
     private:
@@ -130,9 +133,11 @@ private:
 
 /// The producing side of one asynchronous result.
 ///
-/// Its owner serialises the calls on one `Promise` object; the future may be used on any other
-/// thread meanwhile. A promise that is destroyed without a result fails its future with
-/// "Promise destroyed before it provided a value."; the destructor never throws.
+/// `getFuture`, `setValue` and `setException` may be called by several threads at once: the first
+/// one gets through, the others are refused. Moving and destroying a promise is for its owner
+/// alone, and allowed as soon as the future has its result. The future may be used on any other
+/// thread meanwhile. A promise that is destroyed without a result fails its future with "Promise
+/// destroyed before it provided a value."; the destructor never throws and takes no memory.
 template <class T>
 class Promise {
 public:
@@ -140,17 +145,19 @@ public:
     Promise() : state(std::make_shared<detail::SharedFutureState<T>>()) {}
 
     Promise(Promise&& other) noexcept
-        : state(std::move(other.state)), resolved(std::exchange(other.resolved, false)) {}
+        : state(std::move(other.state)), resolved(other.isResolved()) {}
 
     Promise& operator=(Promise&& other) noexcept {
         Promise taken(std::move(other));
         state.swap(taken.state);
-        std::swap(resolved, taken.resolved);
+        const bool wasResolved = isResolved();
+        setResolved(taken.isResolved());
+        taken.setResolved(wasResolved);
         return *this;
     }
 
     ~Promise() {
-        if (!valid() || resolved) return;
+        if (!valid() || isResolved()) return;
         auto* const abandoned = state.get();
         abandoned->abandon(std::move(state));
     }
@@ -171,7 +178,7 @@ public:
     /// allocation throws, and the promise can be used again.
     void setValue(T value) {
         requireValid();
-        setBoxedValue(std::make_unique<T>(std::move(value)));
+        detail::runAll(settle(std::make_unique<T>(std::move(value))));
     }
 
     /// Resolves with `error`; otherwise as `setValue`. A null pointer throws
@@ -180,18 +187,26 @@ public:
     void setException(std::exception_ptr error) {
         requireValid();
         detail::requireException(error);
-        resolved = true;
-        state->setException(std::move(error), state);
+        detail::runAll(settle(std::move(error)));
     }
 
 private:
     template <class>
     friend class Future;
 
-    void setBoxedValue(std::unique_ptr<T> value) {
+    /// Resolves with a boxed value or an exception, and leaves it to the caller to run what
+    /// follows.
+    template <class Result>
+    detail::Step settle(Result result) {
         // Noted first: the consumer may destroy this promise as soon as the result is in.
-        resolved = true;
-        state->setValue(std::move(value), state);
+        setResolved(true);
+        return state->settle(std::move(result), state);
+    }
+
+    // Only spares the destructor a lock: which of two threads resolves is for the state to say.
+    bool isResolved() const noexcept { return resolved.load(std::memory_order_relaxed); }
+    void setResolved(bool nowResolved) noexcept {
+        resolved.store(nowResolved, std::memory_order_relaxed);
     }
 
     void requireValid() const {
@@ -199,7 +214,7 @@ private:
     }
 
     std::shared_ptr<detail::SharedFutureState<T>> state;
-    bool resolved = false;  // the destructor has nothing left to do
+    std::atomic<bool> resolved{false};  // the destructor has nothing left to do
 };
 
 /// A future whose `get` gives `value` at once. Two allocations: the state, the boxed value.

@@ -26,8 +26,10 @@ namespace velkor::detail {
 /// small where they are inlined.
 [[noreturn]] VELKOR_EXPORT void throwFutureError(const char* text);
 
-/// Rethrows `error`, which is not null. If the object thrown is itself a non-null
-/// `std::exception_ptr`, the exception that it points to is thrown instead: one level, no more.
+/// Rethrows `error`. If the object thrown is itself a non-null `std::exception_ptr`, the exception
+/// that it points to is thrown instead: one level, no more. When `error` is null, throws
+/// `std::runtime_error` with `future_errors::brokenPromise`; that takes no memory: the text was
+/// made when the library was loaded, and the runtime keeps a reserve for the exceptions themselves.
 [[noreturn]] VELKOR_EXPORT void rethrowUnwrapped(std::exception_ptr error);
 
 /// Throws `std::invalid_argument` with `future_errors::nullException` when `error` is null.

@@ -4,33 +4,14 @@
 #include <cstdint>
 #include <exception>
 #include <memory>
-#include <stdexcept>
 #include <utility>
 #include <variant>
 
 #include "framework/common/Mutex.hpp"
+#include "framework/detail/Continuation.hpp"
 #include "framework/detail/FutureErrors.hpp"
 
-namespace velkor {
-
-template <class T>
-class Future;
-
-}  // namespace velkor
-
 namespace velkor::detail {
-
-/// Code that takes over the result of a state once there is one. Run at most once.
-template <class T>
-class Continuation {
-public:
-    virtual ~Continuation() = default;
-
-    /// Receives a future whose `get` answers at once. Runs on the thread that resolves the state,
-    /// or that attaches to a resolved one, with no lock of this library held by the state.
-    /// An exception passes on to that thread's caller.
-    virtual void invoke(Future<T>&& future) = 0;
-};
 
 /// How far a state has come.
 ///
@@ -72,44 +53,58 @@ public:
         return Future<T>(self);
     }
 
-    /// Resolves with the boxed value. Nothing happens on a cancelled state. Throws
-    /// `std::runtime_error` "Promise already resolved." on a resolved one.
+    /// Resolves with the boxed value and runs the continuation. Nothing happens on a cancelled
+    /// state. Throws `std::runtime_error` "Promise already resolved." on a resolved one.
     void setValue(std::unique_ptr<T> value, const Self& self) VELKOR_EXCLUDES(mutex) {
-        resolve(FutureStatus::value, std::move(value), self);
+        runAll(settle(std::move(value), self));
     }
 
     /// Resolves with `error`, which is not null; otherwise as `setValue`.
     void setException(std::exception_ptr error, const Self& self) VELKOR_EXCLUDES(mutex) {
-        resolve(FutureStatus::exception, std::move(error), self);
+        runAll(settle(std::move(error), self));
+    }
+
+    /// As `setValue`, but leaves it to the caller to run the continuation.
+    Step settle(std::unique_ptr<T> value, const Self& self) VELKOR_EXCLUDES(mutex) {
+        return resolve(FutureStatus::value, std::move(value), self);
+    }
+
+    /// As `setException`, but leaves it to the caller to run the continuation.
+    Step settle(std::exception_ptr error, const Self& self) VELKOR_EXCLUDES(mutex) {
+        return resolve(FutureStatus::exception, std::move(error), self);
     }
 
     /// The producer has gone: a pending state fails with "Promise destroyed before it provided a
-    /// value.".
+    /// value.". Takes no memory.
     void abandon(Self self) VELKOR_EXCLUDES(mutex) {
-        std::unique_ptr<Continuation<T>> next;
+        Step next;
         {
             const common::MutexLock lock(mutex);
             if (status != FutureStatus::pending) return;
-            result = std::make_exception_ptr(std::runtime_error(future_errors::brokenPromise));
+            result = std::exception_ptr();
             status = FutureStatus::exception;
-            next = claimContinuation();
+            if (continuation != nullptr) next = claim(std::move(continuation), self);
         }
-        announce(std::move(next), std::move(self));
+        self->ready.notify_all();
+        runAll(std::move(next));
     }
 
     /// Attaches the one continuation. On a resolved state it is run at once, by this thread; on a
     /// cancelled one it is destroyed without having run. Throws `std::runtime_error` with the text
     /// of `get` when the result is taken or a continuation is attached already.
     void attach(std::unique_ptr<Continuation<T>> next, Self self) VELKOR_EXCLUDES(mutex) {
+        Step claimed;
         {
             const common::MutexLock lock(mutex);
             requireUntaken();
             if (status == FutureStatus::cancelled) return;
-            continuation = std::move(next);
-            if (status == FutureStatus::pending) return;
-            next = claimContinuation();
+            if (status == FutureStatus::pending) {
+                continuation = std::move(next);
+                return;
+            }
+            claimed = claim(std::move(next), std::move(self));
         }
-        announce(std::move(next), std::move(self));
+        runAll(std::move(claimed));
     }
 
     /// Waits until there is a result and hands it over by move. Throws what the producer stored
@@ -153,46 +148,38 @@ public:
     }
 
 private:
-    /// The box of the value; the error; or an empty box while there is neither.
+    /// The box of the value; the error, a null one for that of a destroyed promise, which is made
+    /// when it is thrown; or an empty box while there is neither.
     using Result = std::variant<std::unique_ptr<T>, std::exception_ptr>;
 
-    void resolve(FutureStatus outcome, Result boxed, const Self& self) VELKOR_EXCLUDES(mutex) {
+    template <class Boxed>
+    Step resolve(FutureStatus outcome, Boxed boxed, const Self& self) VELKOR_EXCLUDES(mutex) {
         Self keepAlive;
-        std::unique_ptr<Continuation<T>> next;
         {
             const common::MutexLock lock(mutex);
-            if (status == FutureStatus::cancelled) return;
+            if (status == FutureStatus::cancelled) return nullptr;
             if (status != FutureStatus::pending) throwFutureError(future_errors::alreadyResolved);
-            result.swap(boxed);
+            result = std::move(boxed);  // which destroys nothing: there was no result
             status = outcome;
-            next = claimContinuation();
             // From here on the consumer may destroy both ends, and with them the owner of `self`.
-            if (next == nullptr && waiting == 0) return;
+            if (continuation != nullptr) return claim(std::move(continuation), self);
+            if (waiting == 0) return nullptr;
             keepAlive = self;
         }
-        announce(std::move(next), std::move(keepAlive));
+        keepAlive->ready.notify_all();
+        return nullptr;
     }
 
     void requireUntaken() const VELKOR_REQUIRES(mutex) {
         if (valueTaken || continuation != nullptr) throwFutureError(future_errors::alreadyTaken);
     }
 
-    /// Detaches the continuation of a resolved state, so that it is run by whoever got it here.
-    std::unique_ptr<Continuation<T>> claimContinuation() VELKOR_REQUIRES(mutex) {
-        if (continuation == nullptr) return nullptr;
+    /// Gives the result of this state, `self`, to `next`: the step that runs it there.
+    Step claim(std::unique_ptr<Continuation<T>> next, Self self) VELKOR_REQUIRES(mutex) {
         futureRetrieved = false;
         valueTaken = false;
-        return std::move(continuation);
-    }
-
-    /// Runs the continuation or, when there is none, wakes those who wait. Never is there both: who
-    /// waits has taken the result.
-    static void announce(std::unique_ptr<Continuation<T>> next, Self self) {
-        if (next != nullptr) {
-            next->invoke(Future<T>(std::move(self)));
-        } else {
-            self->ready.notify_all();
-        }
+        next->takeOver(std::move(self));
+        return next;
     }
 
     common::Mutex mutex;

@@ -2,7 +2,6 @@
 
 #include <cstdint>
 #include <exception>
-#include <limits>
 #include <list>
 #include <memory>
 #include <optional>
@@ -10,19 +9,13 @@
 #include <utility>
 
 #include "framework/Future.hpp"
-#include "framework/common/Mutex.hpp"
 #include "framework/detail/FutureErrors.hpp"
+#include "framework/detail/StreamState.hpp"
 #include "framework/reactive_streams/Publisher.hpp"
 #include "framework/reactive_streams/Subscriber.hpp"
 #include "framework/reactive_streams/Subscription.hpp"
 
 namespace velkor::reactive_streams {
-
-/// `demand` and `more` together, at most 2^64 - 1.
-constexpr std::uint64_t addDemand(std::uint64_t demand, std::uint64_t more) noexcept {
-    constexpr auto most = std::numeric_limits<std::uint64_t>::max();
-    return more > most - demand ? most : demand + more;
-}
 
 /// A stream for exactly one subscriber that keeps the newest undelivered values, as many as its
 /// capacity allows, until the subscriber asks. `onDone`, a callable without arguments, is called
@@ -33,7 +26,7 @@ constexpr std::uint64_t addDemand(std::uint64_t demand, std::uint64_t more) noex
 ///        │ ───── cancel (also while completing) ───────────────────────────> cancelled
 ///        └────── fail (also while completing) ─────────────────────────────> failed
 ///
-/// Thread-safe. No subscriber, hook, continuation or value destructor runs under the mutex, so any
+/// Thread-safe. No subscriber, hook, continuation or value destructor runs under a mutex, so any
 /// of them may call the publisher and its subscription, and may drop the last reference to either.
 /// What they throw passes to the caller that made them run (except in the destructor) and leaves
 /// the publisher usable. Deliveries are not serialised: a value that is published while the
@@ -47,11 +40,7 @@ public:
     /// A stream without a subscriber. Throws `std::invalid_argument` "A publisher needs a capacity
     /// of at least 1." when `mostKept` is 0.
     CachedValuePublisher(std::uint64_t mostKept, F hook)
-        : capacity(mostKept), onDone(std::move(hook)) {
-        if (capacity == 0) {
-            throw std::invalid_argument("A publisher needs a capacity of at least 1.");
-        }
-    }
+        : stream(mostKept), onDone(std::move(hook)) {}
 
     CachedValuePublisher(const CachedValuePublisher&) = delete;
     CachedValuePublisher& operator=(const CachedValuePublisher&) = delete;
@@ -59,63 +48,44 @@ public:
     /// Completes the stream, whatever is still queued. What `onComplete` or the hook throws is
     /// dropped here.
     ~CachedValuePublisher() override {
-        std::optional<Ending> ending;
-        {
-            const common::MutexLock lock(mutex);
-            if (state > State::completing) return;
-            ending = end(State::completed);
-        }
         try {
-            announce(*ending);
+            if (const auto ending = stream.endNow(Phase::completed)) announce(*ending);
         } catch (...) {
             return;
         }
     }
 
     /// See `Publisher`: true when the stream completed, false when it was cancelled, the error when
-    /// it failed; settled before the subscriber and the hook are told.
-    Future<bool> getCompletionFuture() override VELKOR_EXCLUDES(mutex) {
-        const common::MutexLock lock(mutex);
-        if (!completion) {
-            completion.emplace();
-            // Nobody can have attached anything to this new promise: no foreign code runs here.
-            if (state > State::completing) resolve(*completion, state, error);
-        }
-        return completion->getFuture();
-    }
+    /// it failed; settled before the subscriber and the hook are told. Throws `std::bad_alloc` when
+    /// memory is short, and can be called again then; the end itself takes none.
+    Future<bool> getCompletionFuture() override { return stream.getCompletionFuture(); }
 
     /// Opens the stream: `onSubscribe`, then `onComplete` or `onError` if it has ended that way.
     /// Throws `std::invalid_argument` "A subscriber must not be null." or, when there is one
     /// already, "Only one subscription allowed.".
-    void subscribe(std::shared_ptr<Subscriber<T>> newSubscriber) override VELKOR_EXCLUDES(mutex) {
+    void subscribe(std::shared_ptr<Subscriber<T>> newSubscriber) override {
         if (newSubscriber == nullptr) {
             throw std::invalid_argument("A subscriber must not be null.");
         }
         const auto keepAlive = this->shared_from_this();
         std::weak_ptr<Subscription> handle;
-        State found;
-        std::exception_ptr failure;
-        {
-            const common::MutexLock lock(mutex);
-            if (subscription) throw std::invalid_argument("Only one subscription allowed.");
-            subscription = std::make_shared<CachedValueSubscription>(keepAlive);
-            subscriber = newSubscriber;
-            handle = subscription;
-            found = state;
-            failure = error;
-        }
+        const auto found = stream.open(newSubscriber, [&] {
+            auto opened = std::make_shared<CachedValueSubscription>(keepAlive);
+            handle = opened;
+            return opened;
+        });
         newSubscriber->onSubscribe(std::move(handle));
-        if (found == State::failed) return newSubscriber->onError(failure);
-        if (found == State::completed) return newSubscriber->onComplete();
+        if (found.phase == Phase::failed) return newSubscriber->onError(found.error);
+        if (found.phase == Phase::completed) return newSubscriber->onComplete();
         drain();
     }
 
     /// Delivers a copy of `value` at once when the subscriber waits for one, else keeps it,
     /// dropping the oldest kept ones beyond the capacity. Does nothing once the stream has ended.
-    void publish(const T& value) VELKOR_EXCLUDES(mutex) {
+    void publish(const T& value) {
         std::list<T> dropped;
         T copy(value);
-        if (const auto waiting = keepUnlessAwaited(copy, dropped)) {
+        if (const auto waiting = stream.keepUnlessAwaited(copy, dropped)) {
             return waiting->onNext(std::move(copy));
         }
         const auto keepAlive = this->weak_from_this().lock();
@@ -124,58 +94,32 @@ public:
 
     /// Keeps a copy of `value` as the first one unless something is kept already, which is newer:
     /// for a value that was read before others could publish. Called before there is a subscriber.
-    void publishFirst(const T& value) VELKOR_EXCLUDES(mutex) {
+    void publishFirst(const T& value) {
         std::list<T> first;
         first.push_back(value);
-        const common::MutexLock lock(mutex);
-        if (state <= State::completing && queue.empty()) queue.swap(first);
+        stream.keepFirst(first);
     }
 
     /// Ends the stream once the values that are queued now or meanwhile have been delivered; at
     /// once when there are none. Does nothing on a stream that is ending or has ended.
-    void complete() VELKOR_EXCLUDES(mutex) {
+    void complete() {
         const auto keepAlive = this->weak_from_this().lock();
-        {
-            const common::MutexLock lock(mutex);
-            if (state != State::active) return;
-            state = State::completing;
-        }
-        completeWhenDrained();
+        if (stream.startCompleting()) completeIfDrained();
     }
 
     /// Ends the stream with `reason` and drops what is queued. Does nothing on a stream that has
     /// ended. A null pointer throws `std::invalid_argument` "A promise can't be resolved with a
     /// null exception.".
-    void fail(std::exception_ptr reason) VELKOR_EXCLUDES(mutex) {
+    void fail(std::exception_ptr reason) {
         detail::requireException(reason);
         const auto keepAlive = this->weak_from_this().lock();
-        std::optional<Ending> ending;
-        {
-            const common::MutexLock lock(mutex);
-            if (state > State::completing) return;
-            error = std::move(reason);
-            ending = end(State::failed);
-        }
-        announce(*ending);
+        const auto ending = stream.endNow(Phase::failed, std::move(reason));
+        if (ending) announce(*ending);
     }
 
 private:
-    enum class State : std::uint32_t { active, completing, completed, cancelled, failed };
-
-    /// The end of the stream: decided under the mutex, announced without it.
-    struct Ending {
-        State state;
-        Promise<bool>* completion;  ///< Null while nobody has asked for the future.
-        std::shared_ptr<Subscriber<T>> subscriber;
-        std::exception_ptr error;
-        std::list<T> dropped;
-    };
-
-    /// Values with the subscriber that they are for, or that is let go of together with them.
-    struct Delivery {
-        std::shared_ptr<Subscriber<T>> subscriber;
-        std::list<T> values;
-    };
+    using Phase = detail::StreamPhase;
+    using Ending = typename detail::StreamState<T>::Ending;
 
     class CachedValueSubscription final : public Subscription {
     public:
@@ -194,118 +138,40 @@ private:
         std::weak_ptr<CachedValuePublisher> publisher;
     };
 
-    void request(std::uint64_t n) VELKOR_EXCLUDES(mutex) {
-        {
-            const common::MutexLock lock(mutex);
-            demand = addDemand(demand, n);
-        }
+    void request(std::uint64_t n) {
+        stream.request(n);
         drain();
-        completeWhenDrained();
+        completeIfDrained();
     }
 
-    void cancel() VELKOR_EXCLUDES(mutex) {
-        std::optional<Ending> ending;
-        {
-            const common::MutexLock lock(mutex);
-            if (state > State::completing) return;
-            ending = end(State::cancelled);
-        }
-        announce(*ending);
-    }
-
-    /// The subscriber when it waits for `value`, which is then demanded by one less. Otherwise
-    /// null, and `value` is moved into the queue unless the stream has ended; `dropped` takes what
-    /// no longer fits, for destruction without the mutex.
-    std::shared_ptr<Subscriber<T>> keepUnlessAwaited(T& value, std::list<T>& dropped)
-        VELKOR_EXCLUDES(mutex) {
-        const common::MutexLock lock(mutex);
-        if (state > State::completing) return nullptr;
-        if (demand > 0 && queue.empty()) {
-            --demand;
-            return subscriber;
-        }
-        queue.push_back(std::move(value));
-        while (queue.size() > capacity) dropped.splice(dropped.end(), queue, queue.begin());
-        return nullptr;
+    void cancel() {
+        if (const auto ending = stream.endNow(Phase::cancelled)) announce(*ending);
     }
 
     /// Delivers what is queued as far as there is demand. A call from inside `onNext` leaves that
     /// to the running one, so that deliveries of queued values never nest.
-    void drain() VELKOR_EXCLUDES(mutex) {
-        if (!startDraining()) return;
+    void drain() {
+        if (!stream.startDraining()) return;
         try {
-            while (auto next = takeNext()) {
+            while (auto next = stream.takeNext()) {
                 next->subscriber->onNext(std::move(next->values.front()));
             }
         } catch (...) {
-            abortDraining();
+            stream.abortDraining();
             throw;
         }
-        completeWhenDrained();
+        completeIfDrained();
     }
 
-    bool startDraining() VELKOR_EXCLUDES(mutex) {
-        const common::MutexLock lock(mutex);
-        if (draining || state > State::completing) return false;
-        draining = true;
-        return true;
-    }
-
-    /// The next delivery, or nothing, and then the draining is over. Looks at the demand only: a
-    /// stream that is cancelled from inside `onNext` still delivers what had been asked for.
-    std::optional<Delivery> takeNext() VELKOR_EXCLUDES(mutex) {
-        Delivery released;
-        const common::MutexLock lock(mutex);
-        if (demand == 0 || queue.empty()) {
-            released = stopDraining();
-            return std::nullopt;
-        }
-        --demand;
-        Delivery next{subscriber, {}};
-        next.values.splice(next.values.end(), queue, queue.begin());
-        return next;
-    }
-
-    void abortDraining() VELKOR_EXCLUDES(mutex) {
-        Delivery released;
-        const common::MutexLock lock(mutex);
-        released = stopDraining();
-    }
-
-    /// Gives back what a stream that was cancelled meanwhile no longer needs.
-    Delivery stopDraining() VELKOR_REQUIRES(mutex) {
-        draining = false;
-        return state == State::cancelled ? release() : Delivery{};
-    }
-
-    Delivery release() VELKOR_REQUIRES(mutex) {
-        return {std::move(subscriber), std::exchange(queue, {})};
-    }
-
-    void completeWhenDrained() VELKOR_EXCLUDES(mutex) {
-        std::optional<Ending> ending;
-        {
-            const common::MutexLock lock(mutex);
-            if (state != State::completing || !queue.empty()) return;
-            ending = end(State::completed);
-        }
-        announce(*ending);
-    }
-
-    /// Ends the stream. Only one thread gets here, and announces what it is given.
-    Ending end(State terminal) VELKOR_REQUIRES(mutex) {
-        state = terminal;
-        Ending ending{terminal, completion ? &*completion : nullptr, subscriber, error, {}};
-        if (terminal == State::failed) ending.dropped.swap(queue);
-        if (terminal == State::cancelled && !draining) ending.dropped = release().values;
-        return ending;
+    void completeIfDrained() {
+        if (const auto ending = stream.completeIfDrained()) announce(*ending);
     }
 
     /// Tells the completion future, the subscriber and the hook, the last in any case.
-    void announce(const Ending& ending) VELKOR_EXCLUDES(mutex) {
+    void announce(const Ending& ending) {
         std::exception_ptr thrown;
         try {
-            if (ending.completion) resolve(*ending.completion, ending.state, ending.error);
+            if (ending.completion) ending.completion->settle(ending.phase, ending.error);
             signal(ending);
         } catch (...) {
             thrown = std::current_exception();
@@ -314,30 +180,14 @@ private:
         if (thrown) std::rethrow_exception(thrown);
     }
 
-    static void resolve(Promise<bool>& completion, State terminal,
-                        const std::exception_ptr& reason) {
-        if (terminal == State::failed) return completion.setException(reason);
-        completion.setValue(terminal == State::completed);
-    }
-
     static void signal(const Ending& ending) {
         if (ending.subscriber == nullptr) return;
-        if (ending.state == State::completed) ending.subscriber->onComplete();
-        if (ending.state == State::failed) ending.subscriber->onError(ending.error);
+        if (ending.phase == Phase::completed) ending.subscriber->onComplete();
+        if (ending.phase == Phase::failed) ending.subscriber->onError(ending.error);
     }
 
-    common::Mutex mutex;
-    const std::uint64_t capacity;
-    std::list<T> queue VELKOR_GUARDED_BY(mutex);  // oldest first; a list holds nothing while empty
-    F onDone;                                     // called by the one thread that ends the stream
-    // Made when somebody asks: an idle watch is a third smaller without the shared state.
-    std::optional<Promise<bool>> completion VELKOR_GUARDED_BY(mutex);
-    std::exception_ptr error VELKOR_GUARDED_BY(mutex);
-    std::shared_ptr<Subscriber<T>> subscriber VELKOR_GUARDED_BY(mutex);
-    std::shared_ptr<Subscription> subscription VELKOR_GUARDED_BY(mutex);
-    std::uint64_t demand VELKOR_GUARDED_BY(mutex) = 0;
-    State state VELKOR_GUARDED_BY(mutex) = State::active;
-    bool draining VELKOR_GUARDED_BY(mutex) = false;
+    detail::StreamState<T> stream;
+    F onDone;  // called by the one thread that ends the stream
 };
 
 }  // namespace velkor::reactive_streams

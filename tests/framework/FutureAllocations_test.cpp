@@ -3,8 +3,6 @@
 #include <cstddef>
 #include <exception>
 #include <memory>
-#include <new>
-#include <stdexcept>
 #include <string>
 #include <utility>
 
@@ -17,7 +15,6 @@ namespace {
 using velkor::Future;
 using velkor::makeReadyFuture;
 using velkor::Promise;
-using velkor::testing::AllocationFailure;
 using velkor::testing::countAllocations;
 
 TEST(FutureAllocations, ReadyMadeFutureMakesTwo) {
@@ -71,56 +68,6 @@ TEST(FutureAllocations, DisabledLogRecordMakesNone) {
     const velkor::common::DiagnosticLogger logger("future-allocation-tests");
     const std::string key = "some.key";
     EXPECT_EQ(countAllocations([&] { logger.write(velkor::common::debug, "get: ", key); }), 0U);
-}
-
-// Every allocation of an operation fails in turn, until the operation needs no more of them. It
-// must leave with `std::bad_alloc`, and what it was called on must work afterwards.
-
-// Calls `attempt` with its first, second, ... allocation failing; gives the number of failures.
-template <class Attempt>
-std::size_t failEachAllocation(Attempt attempt) {
-    for (std::size_t successes = 0;; ++successes) {
-        bool failed = false;
-        {
-            const AllocationFailure failure(successes);
-            try {
-                attempt();
-            } catch (const std::bad_alloc&) {
-                failed = true;
-            }
-        }
-        if (!failed) return successes;
-    }
-}
-
-TEST(FutureWithoutMemory, SetValueLeavesThePromiseUsable) {
-    Promise<int> promise;
-    Future<int> future = promise.getFuture();
-    EXPECT_EQ(failEachAllocation([&] { promise.setValue(4); }), 1U);
-    EXPECT_EQ(future.get(), 4);
-}
-
-// Two allocations are made before the callable is attached; the third one boxes what it returns.
-TEST(FutureWithoutMemory, ThenLeavesTheFutureUsable) {
-    Future<int> future = makeReadyFuture(4);
-    Future<int> next;
-    const auto addOne = [](Future<int>&& result) { return result.get() + 1; };
-    EXPECT_EQ(failEachAllocation([&] { next = future.then(addOne); }), 2U);
-    EXPECT_THROW(next.get(), std::bad_alloc);
-}
-
-TEST(FutureWithoutMemory, MakingAPromiseFailsCleanly) {
-    EXPECT_EQ(failEachAllocation([] {
-                  Promise<int> promise;
-                  promise.setValue(1);
-              }),
-              2U);
-}
-
-TEST(FutureWithoutMemory, MakingAReadyFutureFailsCleanly) {
-    Future<int> future;
-    EXPECT_EQ(failEachAllocation([&] { future = makeReadyFuture(4); }), 2U);
-    EXPECT_EQ(future.get(), 4);
 }
 
 }  // namespace

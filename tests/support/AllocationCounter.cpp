@@ -11,21 +11,33 @@ namespace {
 constexpr std::size_t never = std::numeric_limits<std::size_t>::max();
 
 thread_local std::size_t allocations = 0;
+thread_local std::ptrdiff_t blocksHeld = 0;
 thread_local std::size_t successesLeft = never;
+thread_local Shortage kind = Shortage::once;
+thread_local bool hasFailed = false;
 
 void countAllocation() {
     ++allocations;
     if (successesLeft == never) return;
-    if (successesLeft == 0) {
-        successesLeft = never;
-        throw std::bad_alloc();
+    if (successesLeft > 0) {
+        --successesLeft;
+        return;
     }
-    --successesLeft;
+    hasFailed = true;
+    if (kind == Shortage::once) successesLeft = never;
+    throw std::bad_alloc();
 }
 
 void* require(void* memory) {
     if (memory == nullptr) throw std::bad_alloc();
+    ++blocksHeld;
     return memory;
+}
+
+void giveBack(void* memory) noexcept {
+    if (memory == nullptr) return;
+    --blocksHeld;
+    std::free(memory);
 }
 
 }  // namespace
@@ -34,8 +46,14 @@ std::size_t allocationsOfThisThread() noexcept {
     return allocations;
 }
 
-AllocationFailure::AllocationFailure(std::size_t successes) noexcept {
+std::ptrdiff_t blocksHeldByThisThread() noexcept {
+    return blocksHeld;
+}
+
+AllocationFailure::AllocationFailure(std::size_t successes, Shortage shortage) noexcept {
     successesLeft = successes;
+    kind = shortage;
+    hasFailed = false;
 }
 
 AllocationFailure::~AllocationFailure() {
@@ -43,7 +61,7 @@ AllocationFailure::~AllocationFailure() {
 }
 
 bool AllocationFailure::hasHappened() const noexcept {
-    return successesLeft == never;
+    return hasFailed;
 }
 
 }  // namespace velkor::testing
@@ -63,17 +81,17 @@ void* operator new(std::size_t size, std::align_val_t alignment) {
 }
 
 void operator delete(void* memory) noexcept {
-    std::free(memory);
+    velkor::testing::giveBack(memory);
 }
 
 void operator delete(void* memory, std::size_t) noexcept {
-    std::free(memory);
+    velkor::testing::giveBack(memory);
 }
 
 void operator delete(void* memory, std::align_val_t) noexcept {
-    std::free(memory);
+    velkor::testing::giveBack(memory);
 }
 
 void operator delete(void* memory, std::size_t, std::align_val_t) noexcept {
-    std::free(memory);
+    velkor::testing::giveBack(memory);
 }

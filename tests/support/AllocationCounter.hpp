@@ -19,17 +19,26 @@ std::size_t countAllocations(Callable&& callable) {
     return allocationsOfThisThread() - before;
 }
 
-/// Lets one allocation of the calling thread fail with `std::bad_alloc` while it lives: the first
-/// one after `successes` more that succeed.
+/// How many blocks more than it has given back the calling thread has been given by operator new.
+std::ptrdiff_t blocksHeldByThisThread() noexcept;
+
+/// How long memory stays short.
+enum class Shortage {
+    once,     ///< One allocation fails, the next one succeeds.
+    lasting,  ///< Every allocation fails from then on.
+};
+
+/// Lets allocations of the calling thread fail with `std::bad_alloc` while it lives: the first one
+/// after `successes` more that succeed and, in a lasting shortage, all that follow.
 class AllocationFailure {
 public:
-    explicit AllocationFailure(std::size_t successes) noexcept;
+    explicit AllocationFailure(std::size_t successes, Shortage shortage = Shortage::once) noexcept;
     ~AllocationFailure();
 
     AllocationFailure(const AllocationFailure&) = delete;
     AllocationFailure& operator=(const AllocationFailure&) = delete;
 
-    /// Whether the allocation that was to fail has been reached.
+    /// Whether the allocation that was to fail first has been reached.
     bool hasHappened() const noexcept;
 };
 
