@@ -11,6 +11,7 @@
 
 #include "framework/Future.hpp"
 #include "framework/common/Mutex.hpp"
+#include "framework/detail/StreamQueue.hpp"
 #include "framework/reactive_streams/Subscriber.hpp"
 #include "framework/reactive_streams/Subscription.hpp"
 
@@ -60,7 +61,7 @@ private:
 /// caller, who does so without the mutex; what is no longer needed is given out for destruction,
 /// too. What has been given out is not taken back: a stream may end, or newer values be given out
 /// to another thread, before the caller has delivered what it got.
-template <class T>
+template <class T, class Queue = NewestValues<T>>
 class StreamState {
 public:
     using Receiver = std::shared_ptr<reactive_streams::Subscriber<T>>;
@@ -87,13 +88,8 @@ public:
         std::exception_ptr error;
     };
 
-    /// A stream that keeps `mostKept` values. Throws `std::invalid_argument` "A publisher needs a
-    /// capacity of at least 1." when that is 0.
-    explicit StreamState(std::uint64_t mostKept) : capacity(mostKept) {
-        if (capacity == 0) {
-            throw std::invalid_argument("A publisher needs a capacity of at least 1.");
-        }
-    }
+    /// A stream that keeps what it has not given out in `empty`.
+    explicit StreamState(Queue empty) : queue(std::move(empty)) {}
 
     /// The future of the end, which is settled already on a stream that has ended.
     Future<bool> getCompletionFuture() VELKOR_EXCLUDES(mutex) {
@@ -128,15 +124,21 @@ public:
             --demand;
             return subscriber;
         }
-        queue.push_back(std::move(value));
-        while (queue.size() > capacity) dropped.splice(dropped.end(), queue, queue.begin());
+        queue.push(std::move(value), dropped);
         return nullptr;
     }
 
-    /// Keeps the one value in `first` unless something is kept already; takes it back otherwise.
-    void keepFirst(std::list<T>& first) VELKOR_EXCLUDES(mutex) {
+    /// Moves `value` into the queue unless the stream has ended; `dropped` takes what it replaces.
+    void keep(T& value, std::list<T>& dropped) VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        if (phase <= StreamPhase::completing && queue.empty()) queue.swap(first);
+        if (phase <= StreamPhase::completing) queue.push(std::move(value), dropped);
+    }
+
+    /// Moves `value` into the queue unless the stream has ended or something is kept already.
+    void keepFirst(T& value) VELKOR_EXCLUDES(mutex) {
+        std::list<T> none;
+        const common::MutexLock lock(mutex);
+        if (phase <= StreamPhase::completing && queue.empty()) queue.push(std::move(value), none);
     }
 
     /// Adds `more` to the demand.
@@ -164,9 +166,7 @@ public:
             return std::nullopt;
         }
         --demand;
-        Delivery next{subscriber, {}};
-        next.values.splice(next.values.end(), queue, queue.begin());
-        return next;
+        return Delivery{subscriber, queue.takeFirst()};
     }
 
     /// Ends the draining before everything was delivered.
@@ -204,7 +204,7 @@ private:
     Ending end(StreamPhase terminal) VELKOR_REQUIRES(mutex) {
         phase = terminal;
         Ending ending{terminal, completion ? &*completion : nullptr, subscriber, error, {}};
-        if (terminal == StreamPhase::failed) ending.dropped.swap(queue);
+        if (terminal == StreamPhase::failed) ending.dropped = queue.takeAll();
         if (terminal == StreamPhase::cancelled && !draining) ending.dropped = release().values;
         return ending;
     }
@@ -215,13 +215,10 @@ private:
         return phase == StreamPhase::cancelled ? release() : Delivery{};
     }
 
-    Delivery release() VELKOR_REQUIRES(mutex) {
-        return {std::move(subscriber), std::exchange(queue, {})};
-    }
+    Delivery release() VELKOR_REQUIRES(mutex) { return {std::move(subscriber), queue.takeAll()}; }
 
     common::Mutex mutex;
-    const std::uint64_t capacity;
-    std::list<T> queue VELKOR_GUARDED_BY(mutex);  // oldest first; a list holds nothing while empty
+    Queue queue VELKOR_GUARDED_BY(mutex);
     // Made when somebody asks: an idle watch is a third smaller without the shared state.
     std::optional<StreamCompletion> completion VELKOR_GUARDED_BY(mutex);
     std::exception_ptr error VELKOR_GUARDED_BY(mutex);

@@ -1,193 +1,47 @@
 #pragma once
 
 #include <cstdint>
-#include <exception>
 #include <list>
-#include <memory>
-#include <optional>
-#include <stdexcept>
 #include <utility>
 
-#include "framework/Future.hpp"
-#include "framework/detail/FutureErrors.hpp"
-#include "framework/detail/StreamState.hpp"
-#include "framework/reactive_streams/Publisher.hpp"
-#include "framework/reactive_streams/Subscriber.hpp"
-#include "framework/reactive_streams/Subscription.hpp"
+#include "framework/reactive_streams/QueuedPublisher.hpp"
 
 namespace velkor::reactive_streams {
 
 /// A stream for exactly one subscriber that keeps the newest undelivered values, as many as its
-/// capacity allows, until the subscriber asks. `onDone`, a callable without arguments, is called
-/// once, when the stream completes, fails or is cancelled.
+/// capacity allows, until the subscriber asks; see `QueuedPublisher`.
 ///
-///     active ─── complete, values queued ──> completing ── queue drained ──> completed
-///        │ ───── complete, nothing queued, destructor ─────────────────────> completed
-///        │ ───── cancel (also while completing) ───────────────────────────> cancelled
-///        └────── fail (also while completing) ─────────────────────────────> failed
-///
-/// Thread-safe. No subscriber, hook, continuation or value destructor runs under a mutex, so any
-/// of them may call the publisher and its subscription, and may drop the last reference to either.
-/// What they throw passes to the caller that made them run (except in the destructor) and leaves
-/// the publisher usable. Deliveries are not serialised: a value that is published while the
-/// subscriber waits is handed straight to it, from inside `onNext` or beside another delivery.
-///
-/// Owned by a shared pointer; its subscription holds it weakly.
+/// Deliveries are not serialised: a value that is published while the subscriber waits is handed
+/// straight to it, from inside `onNext` or beside another delivery.
 template <class T, class F>
-class CachedValuePublisher : public PublisherAPI<T>,
-                             public std::enable_shared_from_this<CachedValuePublisher<T, F>> {
+class CachedValuePublisher final : public QueuedPublisher<T, F, detail::NewestValues<T>> {
 public:
     /// A stream without a subscriber. Throws `std::invalid_argument` "A publisher needs a capacity
     /// of at least 1." when `mostKept` is 0.
     CachedValuePublisher(std::uint64_t mostKept, F hook)
-        : stream(mostKept), onDone(std::move(hook)) {}
-
-    CachedValuePublisher(const CachedValuePublisher&) = delete;
-    CachedValuePublisher& operator=(const CachedValuePublisher&) = delete;
-
-    /// Completes the stream, whatever is still queued. What `onComplete` or the hook throws is
-    /// dropped here.
-    ~CachedValuePublisher() override {
-        try {
-            if (const auto ending = stream.endNow(Phase::completed)) announce(*ending);
-        } catch (...) {
-            return;
-        }
-    }
-
-    /// See `Publisher`: true when the stream completed, false when it was cancelled, the error when
-    /// it failed; settled before the subscriber and the hook are told. Throws `std::bad_alloc` when
-    /// memory is short, and can be called again then; the end itself takes none.
-    Future<bool> getCompletionFuture() override { return stream.getCompletionFuture(); }
-
-    /// Opens the stream: `onSubscribe`, then `onComplete` or `onError` if it has ended that way.
-    /// Throws `std::invalid_argument` "A subscriber must not be null." or, when there is one
-    /// already, "Only one subscription allowed.".
-    void subscribe(std::shared_ptr<Subscriber<T>> newSubscriber) override {
-        if (newSubscriber == nullptr) {
-            throw std::invalid_argument("A subscriber must not be null.");
-        }
-        const auto keepAlive = this->shared_from_this();
-        std::weak_ptr<Subscription> handle;
-        const auto found = stream.open(newSubscriber, [&] {
-            auto opened = std::make_shared<CachedValueSubscription>(keepAlive);
-            handle = opened;
-            return opened;
-        });
-        newSubscriber->onSubscribe(std::move(handle));
-        if (found.phase == Phase::failed) return newSubscriber->onError(found.error);
-        if (found.phase == Phase::completed) return newSubscriber->onComplete();
-        drain();
-    }
+        : Base(detail::NewestValues<T>(mostKept), std::move(hook)) {}
 
     /// Delivers a copy of `value` at once when the subscriber waits for one, else keeps it,
     /// dropping the oldest kept ones beyond the capacity. Does nothing once the stream has ended.
     void publish(const T& value) {
         std::list<T> dropped;
         T copy(value);
-        if (const auto waiting = stream.keepUnlessAwaited(copy, dropped)) {
+        if (const auto waiting = this->stream.keepUnlessAwaited(copy, dropped)) {
             return waiting->onNext(std::move(copy));
         }
         const auto keepAlive = this->weak_from_this().lock();
-        drain();
+        this->drain();
     }
 
     /// Keeps a copy of `value` as the first one unless something is kept already, which is newer:
     /// for a value that was read before others could publish. Called before there is a subscriber.
     void publishFirst(const T& value) {
-        std::list<T> first;
-        first.push_back(value);
-        stream.keepFirst(first);
-    }
-
-    /// Ends the stream once the values that are queued now or meanwhile have been delivered; at
-    /// once when there are none. Does nothing on a stream that is ending or has ended.
-    void complete() {
-        const auto keepAlive = this->weak_from_this().lock();
-        if (stream.startCompleting()) completeIfDrained();
-    }
-
-    /// Ends the stream with `reason` and drops what is queued. Does nothing on a stream that has
-    /// ended. A null pointer throws `std::invalid_argument` "A promise can't be resolved with a
-    /// null exception.".
-    void fail(std::exception_ptr reason) {
-        detail::requireException(reason);
-        const auto keepAlive = this->weak_from_this().lock();
-        const auto ending = stream.endNow(Phase::failed, std::move(reason));
-        if (ending) announce(*ending);
+        T copy(value);
+        this->stream.keepFirst(copy);
     }
 
 private:
-    using Phase = detail::StreamPhase;
-    using Ending = typename detail::StreamState<T>::Ending;
-
-    class CachedValueSubscription final : public Subscription {
-    public:
-        explicit CachedValueSubscription(const std::shared_ptr<CachedValuePublisher>& owner)
-            : publisher(owner) {}
-
-        void request(std::uint64_t n) override {
-            if (const auto keepAlive = publisher.lock()) keepAlive->request(n);
-        }
-
-        void cancel() override {
-            if (const auto keepAlive = publisher.lock()) keepAlive->cancel();
-        }
-
-    private:
-        std::weak_ptr<CachedValuePublisher> publisher;
-    };
-
-    void request(std::uint64_t n) {
-        stream.request(n);
-        drain();
-        completeIfDrained();
-    }
-
-    void cancel() {
-        if (const auto ending = stream.endNow(Phase::cancelled)) announce(*ending);
-    }
-
-    /// Delivers what is queued as far as there is demand. A call from inside `onNext` leaves that
-    /// to the running one, so that deliveries of queued values never nest.
-    void drain() {
-        if (!stream.startDraining()) return;
-        try {
-            while (auto next = stream.takeNext()) {
-                next->subscriber->onNext(std::move(next->values.front()));
-            }
-        } catch (...) {
-            stream.abortDraining();
-            throw;
-        }
-        completeIfDrained();
-    }
-
-    void completeIfDrained() {
-        if (const auto ending = stream.completeIfDrained()) announce(*ending);
-    }
-
-    /// Tells the completion future, the subscriber and the hook, the last in any case.
-    void announce(const Ending& ending) {
-        std::exception_ptr thrown;
-        try {
-            if (ending.completion) ending.completion->settle(ending.phase, ending.error);
-            signal(ending);
-        } catch (...) {
-            thrown = std::current_exception();
-        }
-        onDone();
-        if (thrown) std::rethrow_exception(thrown);
-    }
-
-    static void signal(const Ending& ending) {
-        if (ending.subscriber == nullptr) return;
-        if (ending.phase == Phase::completed) ending.subscriber->onComplete();
-        if (ending.phase == Phase::failed) ending.subscriber->onError(ending.error);
-    }
-
-    detail::StreamState<T> stream;
-    F onDone;  // called by the one thread that ends the stream
+    using Base = QueuedPublisher<T, F, detail::NewestValues<T>>;
 };
 
 }  // namespace velkor::reactive_streams
