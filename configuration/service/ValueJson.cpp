@@ -3,6 +3,7 @@
 #include <Poco/NumberParser.h>
 
 #include <algorithm>
+#include <iterator>
 #include <limits>
 #include <new>
 #include <string_view>
@@ -37,8 +38,20 @@ bool parse(const std::string& text, unsigned int& content) {
     return NumberParser::tryParseUnsigned(text, content);
 }
 
+// What POCO leaves out of the text of a number with a fraction: thousand separators and suffixes.
+bool isLeftOut(char character) {
+    return character == ',' || character == 'f';
+}
+
+// POCO moves the rest of the text for each character that it leaves out. It gets no more than the
+// first of them, without which a text of nothing else would be empty: that is no number, but this
+// is zero.
 bool parse(const std::string& text, double& content) {
-    return NumberParser::tryParseFloat(text, content);
+    const auto first = std::find_if(text.begin(), text.end(), isLeftOut);
+    if (first == text.end()) return NumberParser::tryParseFloat(text, content);
+    std::string shortened(text.begin(), first + 1);
+    std::remove_copy_if(first + 1, text.end(), std::back_inserter(shortened), isLeftOut);
+    return NumberParser::tryParseFloat(shortened, content);
 }
 
 template <class T>
