@@ -83,7 +83,7 @@ TEST_F(SendCommandTest, TakesTheContentAsItWasTyped) {
 
 TEST_F(SendCommandTest, SuggestsTheTypesOfRequests) {
     EXPECT_EQ(registry->find("send")->suggestions()(),
-              (Words{"ConfigurationGet", "ConfigurationSet", "ConfigurationKeys",
+              (Words{"ConfigurationSet", "ConfigurationGet", "ConfigurationKeys",
                      "AddPropertyFileSource"}));
 }
 
