@@ -6,6 +6,7 @@
 #include <iterator>
 #include <limits>
 #include <new>
+#include <sstream>
 #include <string_view>
 #include <type_traits>
 #include <typeinfo>
@@ -84,15 +85,31 @@ void readNumber(const Var& json, T& content) {
     if (number >= lowest && number <= highest) content = static_cast<T>(number);
 }
 
-template <class T>
-void convert(const Var& json, T& content) {
+template <class Conversion>
+void tryTo(const Conversion& convert) {
     try {
-        content = json.convert<T>();
+        convert();
     } catch (const std::bad_alloc&) {
         throw;
     } catch (...) {
         return;  // the default stays
     }
+}
+
+template <class T>
+void convert(const Var& json, T& content) {
+    tryTo([&] { content = json.convert<T>(); });
+}
+
+// As POCO converts it, whose stream would silently end the text where memory ends.
+template <class Nested>
+void convertNested(const Nested& json, std::string& content) {
+    tryTo([&] {
+        std::ostringstream out;
+        out.exceptions(std::ios::badbit);
+        json.stringify(out, 2);
+        content = out.str();
+    });
 }
 
 // Whatever is often refused is found out without an exception: hostile text can hold millions of
@@ -182,6 +199,10 @@ void readJson(const Var& json, std::u16string& content) {
 void readJson(const Var& json, std::string& content) {
     if (const auto* same = heldBy<std::string>(json)) {
         content = *same;
+    } else if (const auto* object = asObject(json)) {
+        convertNested(*object, content);
+    } else if (const auto* array = asArray(json)) {
+        convertNested(*array, content);
     } else if (!json.isEmpty()) {
         convert(json, content);
     }
