@@ -1,9 +1,6 @@
 #include "configuration/service/ValueJson.hpp"
 
-#include <Poco/NumberParser.h>
-
 #include <algorithm>
-#include <iterator>
 #include <limits>
 #include <new>
 #include <sstream>
@@ -11,13 +8,13 @@
 #include <type_traits>
 #include <typeinfo>
 
+#include "configuration/service/NumberText.hpp"
 #include "framework/common/TextConversion.hpp"
 
 namespace velkor::configuration {
 
 namespace {
 
-using Poco::NumberParser;
 using Poco::Dynamic::Var;
 using Poco::JSON::Array;
 using Poco::JSON::Object;
@@ -27,38 +24,10 @@ const T* heldBy(const Var& json) {
     return json.type() == typeid(T) ? &json.extract<T>() : nullptr;
 }
 
-bool parse(const std::string& text, bool& content) {
-    return NumberParser::tryParseBool(text, content);
-}
-
-bool parse(const std::string& text, int& content) {
-    return NumberParser::tryParse(text, content);
-}
-
-bool parse(const std::string& text, unsigned int& content) {
-    return NumberParser::tryParseUnsigned(text, content);
-}
-
-// What POCO leaves out of the text of a number with a fraction: thousand separators and suffixes.
-bool isLeftOut(char character) {
-    return character == ',' || character == 'f';
-}
-
-// POCO moves the rest of the text for each character that it leaves out. It gets no more than the
-// first of them, without which a text of nothing else would be empty: that is no number, but this
-// is zero.
-bool parse(const std::string& text, double& content) {
-    const auto first = std::find_if(text.begin(), text.end(), isLeftOut);
-    if (first == text.end()) return NumberParser::tryParseFloat(text, content);
-    std::string shortened(text.begin(), first + 1);
-    std::remove_copy_if(first + 1, text.end(), std::back_inserter(shortened), isLeftOut);
-    return NumberParser::tryParseFloat(shortened, content);
-}
-
 template <class T>
 void readText(const std::string& text, T& content) {
     T parsed{};
-    if (parse(text, parsed)) content = parsed;
+    if (parseText(text, parsed)) content = parsed;
 }
 
 bool isNested(const Var& json) {
