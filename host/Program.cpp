@@ -10,8 +10,6 @@
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
-#include "configuration/service/ConfigurationJsonSerialization.hpp"
-#include "configuration/service/ConfigurationServiceProviderImpl.hpp"
 #include "framework/common/DiagnosticLogger.hpp"
 #include "host/CommandRegistry.hpp"
 #include "host/Completer.hpp"
@@ -27,7 +25,7 @@
 #include "host/SourceLoader.hpp"
 #include "host/ValueText.hpp"
 #include "host/Watches.hpp"
-#include "host/messages/MessageDispatcher.hpp"
+#include "host/messages/MessageService.hpp"
 
 namespace velkor::host {
 
@@ -39,26 +37,6 @@ bool isTerminal(int descriptor) {
     return isatty(descriptor) == 1;
 }
 
-/// The service that answers messages, and the way to it.
-class MessageService {
-public:
-    explicit MessageService(const std::shared_ptr<ConfigurationImpl>& store)
-        : serializer(std::make_shared<JsonSerializerImpl>()),
-          serialization(serializer),
-          provider(std::make_shared<configuration::ConfigurationServiceProviderImpl>(store)),
-          messages(std::make_shared<MessageDispatcher>(serializer, provider)) {
-        provider->setRunning(true);
-    }
-
-    const std::shared_ptr<const MessageDispatcher>& dispatcher() const { return messages; }
-
-private:
-    std::shared_ptr<JsonSerializerImpl> serializer;
-    configuration::ConfigurationJsonSerialization serialization;
-    std::shared_ptr<configuration::ConfigurationServiceProviderImpl> provider;
-    std::shared_ptr<const MessageDispatcher> messages;
-};
-
 /// The store with everything that can be done to it on the console.
 class Session {
 public:
@@ -69,7 +47,7 @@ public:
           console(registry, output),
           service(store),
           storeCommands(store, registry),
-          sendCommand(service.dispatcher(), registry),
+          sendCommand(service.dispatcherFor(allRequestTypes()), registry),
           hostCommands(
               {store, std::make_shared<Watches>(store, showValue()), [this] { console.quit(); }},
               registry) {}

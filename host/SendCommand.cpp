@@ -5,19 +5,24 @@
 #include <variant>
 #include <vector>
 
+#include "configuration/service/MessageTypes.hpp"
+
 namespace velkor::host {
 
 namespace {
 
 constexpr const char* commandName = "send";
-constexpr const char* typePrefix = "velkor/configuration/";
 
 std::vector<std::string> requestTypes() {
-    return {"ConfigurationGet", "ConfigurationSet", "ConfigurationKeys", "AddPropertyFileSource"};
+    std::vector<std::string> names;
+    configuration::forEachRequestType(
+        [&](const auto& type) { names.emplace_back(type.shortName); });
+    return names;
 }
 
 std::string fullTypeName(const std::string& type) {
-    return type.find('/') == std::string::npos ? typePrefix + type : type;
+    if (type.find('/') != std::string::npos) return type;
+    return std::string(configuration::messageTypePrefix).append(type);
 }
 
 std::string send(const MessageDispatcher& dispatcher, const std::vector<std::string>& arguments) {

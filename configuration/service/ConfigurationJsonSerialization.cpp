@@ -3,14 +3,15 @@
 #include <Poco/JSON/Object.h>
 
 #include <cstddef>
-#include <iterator>
 #include <string>
 #include <tuple>
+#include <type_traits>
 #include <typeinfo>
 #include <utility>
 
 #include "configuration/Option.hpp"
 #include "configuration/service/ConfigurationMessages.hpp"
+#include "configuration/service/MessageTypes.hpp"
 #include "configuration/service/ValueJson.hpp"
 
 namespace velkor::configuration {
@@ -32,7 +33,7 @@ template <class M, class T>
 Member(const char*, T M::*) -> Member<M, T>;
 
 template <class M>
-constexpr std::tuple<> members;
+constexpr auto members = nullptr;  // each message states its own, even if it has none
 
 template <>
 constexpr std::tuple members<ConfigurationGet>{Member{"key", &ConfigurationGet::key}};
@@ -41,6 +42,9 @@ template <>
 constexpr std::tuple members<ConfigurationSet>{Member{"key", &ConfigurationSet::key},
                                                Member{"source", &ConfigurationSet::source},
                                                Member{"value", &ConfigurationSet::value}};
+
+template <>
+constexpr std::tuple members<ConfigurationKeys>{};
 
 template <>
 constexpr std::tuple members<ConfigurationKeysResponse>{
@@ -103,32 +107,18 @@ std::unique_ptr<Message> deserialise(const Object::Ptr& object) {
     return message;
 }
 
-struct Registration {
-    const char* name;
-    const std::type_info& type;
-    Object::Ptr (*serialise)(const std::unique_ptr<Message>&);
-    std::unique_ptr<Message> (*deserialise)(const Object::Ptr&);
-};
-
 template <class M>
-constexpr Registration registrationOf(const char* name) {
-    return {name, typeid(M), serialise<M>, deserialise<M>};
+void enter(const MessageType<M>& type, json::JsonSerializer& registry) {
+    registry.registerMessage(type.name(), typeid(M), serialise<M>, deserialise<M>);
 }
 
-constexpr Registration registrations[] = {
-    registrationOf<ConfigurationSet>("velkor/configuration/ConfigurationSet"),
-    registrationOf<ConfigurationGet>("velkor/configuration/ConfigurationGet"),
-    registrationOf<ConfigurationKeys>("velkor/configuration/ConfigurationKeys"),
-    registrationOf<ConfigurationKeysResponse>("velkor/configuration/ConfigurationKeysResponse"),
-    registrationOf<ConfigurationOptionResponse>("velkor/configuration/ConfigurationOptionResponse"),
-    registrationOf<AddPropertyFileSource>("velkor/configuration/AddPropertyFileSource"),
-};
-
-// Withdraws the first `count` rows.
+// Withdraws the first `count` types.
 void withdraw(json::JsonSerializer& registry, std::size_t count) {
-    for (std::size_t row = 0; row < count; ++row) {
-        registry.unregisterMessage(registrations[row].type);
-    }
+    forEachMessageType([&](const auto& type) {
+        if (count == 0) return;
+        --count;
+        registry.unregisterMessage(typeid(typename std::decay_t<decltype(type)>::Class));
+    });
 }
 
 }  // namespace
@@ -138,10 +128,10 @@ ConfigurationJsonSerialization::ConfigurationJsonSerialization(
     : serializer(std::move(registry)) {
     std::size_t registered = 0;
     try {
-        for (const auto& [name, type, serialise, deserialise] : registrations) {
-            serializer->registerMessage(name, type, serialise, deserialise);
+        forEachMessageType([&](const auto& type) {
+            enter(type, *serializer);
             ++registered;
-        }
+        });
     } catch (...) {
         withdraw(*serializer, registered);
         throw;
@@ -149,7 +139,7 @@ ConfigurationJsonSerialization::ConfigurationJsonSerialization(
 }
 
 ConfigurationJsonSerialization::~ConfigurationJsonSerialization() {
-    withdraw(*serializer, std::size(registrations));
+    withdraw(*serializer, std::tuple_size_v<decltype(messageTypes)>);
 }
 
 }  // namespace velkor::configuration

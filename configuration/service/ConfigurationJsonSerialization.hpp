@@ -10,8 +10,8 @@ namespace velkor::configuration {
 
 /// Keeps the JSON form of the configuration messages registered while it lives.
 ///
-/// Message types are called "velkor/configuration/" and the name of the class. A value is an object
-/// of "type" (a tag, see `typeTags`) and "value"; texts travel in UTF-8, narrow ones byte for byte.
+/// What the message types are called is in `messageTypes`. A value is an object of "type" (a tag,
+/// see `typeTags`) and "value"; texts travel in UTF-8, narrow ones byte for byte.
 ///
 /// Reading is lenient: a member that is missing, null, or can't be converted by POCO's rules reads
 /// as zero, empty or false, and "readOnly" as true; a text is a truth value when
@@ -21,9 +21,8 @@ namespace velkor::configuration {
 /// The registered functions hold no state and are safe for concurrent use.
 class VELKOR_EXPORT ConfigurationJsonSerialization : public DeferredService {
 public:
-    /// Registers the six types with `serializer`, which is not null: set, get, keys, keys response,
-    /// option response, add property file source. When the registry throws, what it took is
-    /// withdrawn and the exception passes on.
+    /// Registers all `messageTypes` with `serializer`, which is not null, in their order. When the
+    /// registry throws, what it took is withdrawn and the exception passes on.
     explicit ConfigurationJsonSerialization(std::shared_ptr<json::JsonSerializer> serializer);
     ConfigurationJsonSerialization(const ConfigurationJsonSerialization&) = delete;
     ConfigurationJsonSerialization& operator=(const ConfigurationJsonSerialization&) = delete;

@@ -1,21 +1,20 @@
 #include "configuration/service/ValueJson.hpp"
 
-#include <Poco/NumberParser.h>
-
 #include <algorithm>
 #include <limits>
 #include <new>
+#include <sstream>
 #include <string_view>
 #include <type_traits>
 #include <typeinfo>
 
+#include "configuration/service/NumberText.hpp"
 #include "framework/common/TextConversion.hpp"
 
 namespace velkor::configuration {
 
 namespace {
 
-using Poco::NumberParser;
 using Poco::Dynamic::Var;
 using Poco::JSON::Array;
 using Poco::JSON::Object;
@@ -25,26 +24,10 @@ const T* heldBy(const Var& json) {
     return json.type() == typeid(T) ? &json.extract<T>() : nullptr;
 }
 
-bool parse(const std::string& text, bool& content) {
-    return NumberParser::tryParseBool(text, content);
-}
-
-bool parse(const std::string& text, int& content) {
-    return NumberParser::tryParse(text, content);
-}
-
-bool parse(const std::string& text, unsigned int& content) {
-    return NumberParser::tryParseUnsigned(text, content);
-}
-
-bool parse(const std::string& text, double& content) {
-    return NumberParser::tryParseFloat(text, content);
-}
-
 template <class T>
 void readText(const std::string& text, T& content) {
     T parsed{};
-    if (parse(text, parsed)) content = parsed;
+    if (parseText(text, parsed)) content = parsed;
 }
 
 bool isNested(const Var& json) {
@@ -71,15 +54,31 @@ void readNumber(const Var& json, T& content) {
     if (number >= lowest && number <= highest) content = static_cast<T>(number);
 }
 
-template <class T>
-void convert(const Var& json, T& content) {
+template <class Conversion>
+void tryTo(const Conversion& convert) {
     try {
-        content = json.convert<T>();
+        convert();
     } catch (const std::bad_alloc&) {
         throw;
     } catch (...) {
         return;  // the default stays
     }
+}
+
+template <class T>
+void convert(const Var& json, T& content) {
+    tryTo([&] { content = json.convert<T>(); });
+}
+
+// As POCO converts it, whose stream would silently end the text where memory ends.
+template <class Nested>
+void convertNested(const Nested& json, std::string& content) {
+    tryTo([&] {
+        std::ostringstream out;
+        out.exceptions(std::ios::badbit);
+        json.stringify(out, 2);
+        content = out.str();
+    });
 }
 
 // Whatever is often refused is found out without an exception: hostile text can hold millions of
@@ -169,6 +168,10 @@ void readJson(const Var& json, std::u16string& content) {
 void readJson(const Var& json, std::string& content) {
     if (const auto* same = heldBy<std::string>(json)) {
         content = *same;
+    } else if (const auto* object = asObject(json)) {
+        convertNested(*object, content);
+    } else if (const auto* array = asArray(json)) {
+        convertNested(*array, content);
     } else if (!json.isEmpty()) {
         convert(json, content);
     }

@@ -57,6 +57,10 @@ void JsonSerializerImpl::unregisterMessage(const std::type_info& type) {
     byName.erase(withdrawn->name);
 }
 
+void JsonSerializerImpl::requireKnown(const std::string& name) const {
+    formOf(name);
+}
+
 JsonMessage JsonSerializerImpl::encode(const std::unique_ptr<Message>& message) const {
     if (message == nullptr) throw std::bad_typeid();
     const Message& content = *message;

@@ -42,6 +42,9 @@ public:
     /// Does nothing when `type` is not registered.
     void unregisterMessage(const std::type_info& type) override;
 
+    /// Throws `UnknownMessageType` "Unknown message type: " and `name` when there is no such type.
+    void requireKnown(const std::string& name) const;
+
     /// `message` as text, see `renderJson`. Throws `UnknownMessageType` "Unknown message type: "
     /// and the platform's name of the type; `std::bad_typeid` for a null message; what the
     /// registered function throws.

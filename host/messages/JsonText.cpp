@@ -158,6 +158,7 @@ Object::Ptr parseJsonObject(const std::string& text) {
 
 std::string renderJson(const Object& object) {
     std::ostringstream out;
+    out.exceptions(std::ios::badbit);  // lack of memory must not end the text early
     out.imbue(std::locale::classic());
     renderObject(object, out);
     return out.str();

@@ -30,7 +30,7 @@ Poco::JSON::Object::Ptr parseJsonObject(const std::string& text);
 /// The text of `object` on a single line, members sorted by name; valid JSON whatever it holds: a
 /// number that is not finite is null, and what is no UTF-8 in a text becomes U+FFFD. `object` is
 /// left as it is. Nested as deep as objects are nested: what deserialisers and handlers make is
-/// flat.
+/// flat. Lack of memory throws `std::bad_alloc`, so that a text is complete.
 std::string renderJson(const Poco::JSON::Object& object);
 
 }  // namespace velkor::host

@@ -1,62 +1,83 @@
 #include "host/messages/MessageDispatcher.hpp"
 
-#include <cstring>
 #include <exception>
 #include <new>
 #include <stdexcept>
 #include <utility>
 
+#include "configuration/StoreErrors.hpp"
 #include "framework/Future.hpp"
-#include "framework/Message.hpp"
-#include "framework/RoutingErrors.hpp"
 #include "host/messages/JsonText.hpp"
 
 namespace velkor::host {
 
 namespace {
 
-DispatchError failed(DispatchFailure failure, const std::exception& error) {
-    return {failure, error.what()};
+using configuration::Refusal;
+
+class ForbiddenMessageType : public std::invalid_argument {
+public:
+    using std::invalid_argument::invalid_argument;
+};
+
+DispatchFailure failureOf(Refusal refusal) {
+    switch (refusal) {
+        case Refusal::missingOption:
+            return DispatchFailure::missingOption;
+        case Refusal::notWritable:
+            return DispatchFailure::notWritable;
+        case Refusal::duplicateSource:
+            return DispatchFailure::duplicateSource;
+        case Refusal::fileNotOpened:
+            return DispatchFailure::fileNotOpened;
+        case Refusal::notRunning:
+            return DispatchFailure::notRunning;
+        case Refusal::misrouted:
+            return DispatchFailure::misrouted;
+        case Refusal::other:
+            break;
+    }
+    return DispatchFailure::other;
 }
 
-bool saysNotRunning(const std::exception& error) {
-    return std::strcmp(error.what(), routing_errors::notRunning) == 0;
+DispatchError failed(DispatchFailure failure, const std::exception& error) {
+    return {failure, error.what()};
 }
 
 }  // namespace
 
 MessageDispatcher::MessageDispatcher(std::shared_ptr<const JsonSerializerImpl> registry,
-                                     std::shared_ptr<ServiceProvider> provider)
-    : serializer(std::move(registry)), service(std::move(provider)) {}
+                                     std::shared_ptr<ServiceProvider> provider,
+                                     MessageTypeNames allowed)
+    : serializer(std::move(registry)),
+      service(std::move(provider)),
+      allowedTypes(std::move(allowed)) {}
 
+// Routing errors are in the future, while the errors of handlers are thrown.
 DispatchResult MessageDispatcher::dispatch(const JsonMessage& request) const {
     try {
-        return encodeReply(service->deliver(serializer->decode(request), Address(), nullptr));
+        requireAllowed(request.type);
+        return serializer->encode(
+            service->deliver(serializer->decode(request), Address(), nullptr).get());
     } catch (const std::bad_alloc&) {
         throw;
     } catch (const UnknownMessageType& error) {
         return failed(DispatchFailure::unknownType, error);
+    } catch (const ForbiddenMessageType& error) {
+        return failed(DispatchFailure::forbiddenType, error);
     } catch (const NoJsonObject& error) {
         return failed(DispatchFailure::noJsonObject, error);
     } catch (const std::exception& error) {
-        return failed(DispatchFailure::service, error);
+        return failed(failureOf(configuration::refusalOf(error)), error);
     } catch (...) {
-        return DispatchError{DispatchFailure::service, "Unknown error"};
+        return DispatchError{DispatchFailure::other, "Unknown error"};
     }
 }
 
-// Routing errors are in the future, while the errors of handlers are thrown.
-DispatchResult MessageDispatcher::encodeReply(Future<std::unique_ptr<Message>> future) const {
-    std::unique_ptr<Message> reply;
-    try {
-        reply = future.get();
-    } catch (const std::invalid_argument& error) {
-        return failed(DispatchFailure::routing, error);
-    } catch (const std::runtime_error& error) {
-        if (!saysNotRunning(error)) throw;
-        return failed(DispatchFailure::notRunning, error);
-    }
-    return serializer->encode(reply);
+void MessageDispatcher::requireAllowed(const std::string& type) const {
+    if (allowedTypes.count(type) != 0) return;
+    serializer->requireKnown(type);
+    throw ForbiddenMessageType("Message type not allowed: " + type);
 }
 
 }  // namespace velkor::host

@@ -1,10 +1,10 @@
 #pragma once
 
 #include <memory>
+#include <set>
 #include <string>
 #include <variant>
 
-#include "framework/Future.hpp"
 #include "framework/Message.hpp"
 #include "framework/ServiceProvider.hpp"
 #include "host/messages/JsonSerializerImpl.hpp"
@@ -13,11 +13,16 @@ namespace velkor::host {
 
 /// Why a request got no reply.
 enum class DispatchFailure {
-    unknownType,   ///< No message type of that name, or the reply has no JSON form.
-    noJsonObject,  ///< The text is no JSON object, or breaks a limit: see `parseJsonObject`.
-    notRunning,    ///< The service is not running.
-    routing,       ///< The message is not for the service.
-    service,       ///< The service refused: an error of the store, for example.
+    unknownType,      ///< No message type of that name, or the reply has no JSON form.
+    forbiddenType,    ///< The front end may not send messages of that type.
+    noJsonObject,     ///< The text is no JSON object, or breaks a limit: see `parseJsonObject`.
+    notRunning,       ///< The service is not running.
+    misrouted,        ///< The message is not for the service.
+    missingOption,    ///< The key has gone; a key that never was is answered without an option.
+    notWritable,      ///< No source takes the write.
+    duplicateSource,  ///< A source of that name is there already.
+    fileNotOpened,    ///< The property file can't be opened.
+    other,            ///< Anything else that the service failed with.
 };
 
 /// A request that got no reply.
@@ -29,25 +34,33 @@ struct DispatchError {
 /// The reply, or why there is none.
 using DispatchResult = std::variant<JsonMessage, DispatchError>;
 
-/// Answers requests that come as JSON text. Immutable: safe for concurrent use as far as the
-/// service is. Shares the registry and the service with the rest of the host.
+/// The names of message types.
+using MessageTypeNames = std::set<std::string>;
+
+/// Answers the requests of one front end, which come as JSON text. Immutable: safe for concurrent
+/// use as far as the service is. Shares the registry and the service with the rest of the host.
 class MessageDispatcher {
 public:
-    /// Requests are built by `serializer` and delivered to `service`; neither is null.
+    /// Requests of the `allowed` types are built by `serializer` and delivered to `service`;
+    /// neither is null.
     MessageDispatcher(std::shared_ptr<const JsonSerializerImpl> serializer,
-                      std::shared_ptr<ServiceProvider> service);
+                      std::shared_ptr<ServiceProvider> service, MessageTypeNames allowed);
 
     /// Delivers `request` and waits for the reply, on the calling thread and under no lock.
     /// Only lack of memory throws (`std::bad_alloc`). The acknowledgement of a request that has no
-    /// reply of its own is of type "velkor/Message", with the text "{}". The text of an error is
-    /// what the failing part says, or "Unknown error".
+    /// reply of its own is of type "velkor/Message", with the text "{}".
+    ///
+    /// A type that is not allowed is refused before the text is looked at: "Message type not
+    /// allowed: " and its name. The text of any other error is what the failing part says, or
+    /// "Unknown error".
     DispatchResult dispatch(const JsonMessage& request) const;
 
 private:
-    DispatchResult encodeReply(Future<std::unique_ptr<Message>> future) const;
+    void requireAllowed(const std::string& type) const;
 
     std::shared_ptr<const JsonSerializerImpl> serializer;
     std::shared_ptr<ServiceProvider> service;
+    MessageTypeNames allowedTypes;
 };
 
 }  // namespace velkor::host

@@ -88,7 +88,8 @@ TEST(ConfigurationValueTest, DefaultIsFalse) {
 }
 
 TEST(ConfigurationValueTest, ThereAreTwelveKinds) {
-    EXPECT_EQ(typeTags.size(), std::size(kinds));
+    EXPECT_EQ(typeTags.size(), 12U);
+    EXPECT_EQ(std::size(kinds), 12U);
 }
 
 TEST(ConfigurationValueTest, KindsAreVisitedInIndexOrder) {

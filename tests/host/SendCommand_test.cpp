@@ -8,8 +8,7 @@
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
-#include "configuration/service/ConfigurationJsonSerialization.hpp"
-#include "configuration/service/ConfigurationServiceProviderImpl.hpp"
+#include "host/messages/MessageService.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
@@ -20,18 +19,13 @@ using Words = std::vector<std::string>;
 
 class SendCommandTest : public ::testing::Test {
 protected:
-    SendCommandTest() { provider->setRunning(true); }
-
     std::string send(Words arguments) { return registry->find("send")->run(std::move(arguments)); }
 
     std::shared_ptr<configuration::ConfigurationImpl> store =
         std::make_shared<configuration::ConfigurationImpl>();
-    std::shared_ptr<JsonSerializerImpl> serializer = std::make_shared<JsonSerializerImpl>();
-    configuration::ConfigurationJsonSerialization serialization{serializer};
-    std::shared_ptr<configuration::ConfigurationServiceProviderImpl> provider =
-        std::make_shared<configuration::ConfigurationServiceProviderImpl>(store);
+    MessageService service{store};
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
-    SendCommand command{std::make_shared<MessageDispatcher>(serializer, provider), registry};
+    SendCommand command{service.dispatcherFor(allRequestTypes()), registry};
 };
 
 TEST_F(SendCommandTest, ShowsTypeAndContentOfTheReply) {
@@ -63,6 +57,11 @@ TEST_F(SendCommandTest, RefusesAnUnknownType) {
               "Unknown message type: velkor/configuration/Nope");
 }
 
+TEST_F(SendCommandTest, RefusesATypeThatIsNoRequest) {
+    EXPECT_EQ(thrownText<CommandError>([&] { send({"ConfigurationKeysResponse"}); }),
+              "Message type not allowed: velkor/configuration/ConfigurationKeysResponse");
+}
+
 TEST_F(SendCommandTest, RefusesContentThatIsNoJsonObject) {
     EXPECT_THROW(send({"ConfigurationGet", "[]"}), CommandError);
 }
@@ -83,7 +82,7 @@ TEST_F(SendCommandTest, TakesTheContentAsItWasTyped) {
 
 TEST_F(SendCommandTest, SuggestsTheTypesOfRequests) {
     EXPECT_EQ(registry->find("send")->suggestions()(),
-              (Words{"ConfigurationGet", "ConfigurationSet", "ConfigurationKeys",
+              (Words{"ConfigurationSet", "ConfigurationGet", "ConfigurationKeys",
                      "AddPropertyFileSource"}));
 }
 

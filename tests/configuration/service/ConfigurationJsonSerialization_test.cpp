@@ -228,6 +228,12 @@ TEST_F(MessageJson, AddPropertyFileSourceIsRead) {
     EXPECT_EQ(request->path, u"/\u20ac");
 }
 
+TEST_F(MessageJson, PathBeyondTheBasicPlaneIsReadBackUnchanged) {
+    const AddPropertyFileSource request("n", "g", 0, true, u"/\U0001d11e");
+    EXPECT_EQ(forms.fromObject<AddPropertyFileSource>(forms.toObject(request))->path,
+              u"/\U0001d11e");
+}
+
 TEST_F(MessageJson, AddPropertyFileSourceWithoutMembersIsReadOnlyAndElseEmpty) {
     const auto request = forms.fromText<AddPropertyFileSource>("{}");
     EXPECT_EQ(request->name, "");

@@ -125,6 +125,19 @@ TEST_F(ServiceOverAMock, GetThrowsTheErrorOfACancelledFuture) {
     }
 }
 
+TEST_F(ServiceOverAMock, GetThrowsTheErrorOfAFutureThatGaveItsValueAlready) {
+    Future<bool> spent = makeReadyFuture(true);
+    spent.get();
+    EXPECT_CALL(*store, has("k")).WillOnce(Return(ByMove(std::move(spent))));
+    try {
+        deliver(message(ConfigurationGet("k")));
+        FAIL() << "no exception";
+    } catch (const std::runtime_error& error) {
+        EXPECT_STREQ(error.what(),
+                     "Future already returned it's value or has an associated continuation.");
+    }
+}
+
 TEST_F(ServiceOverAMock, GetWaitsForTheStore) {
     Promise<bool> promise;
     EXPECT_CALL(*store, has("k")).WillOnce(Return(ByMove(promise.getFuture())));
@@ -145,6 +158,7 @@ TEST_F(ServiceOverAMock, SetWithoutSourceUsesTheTwoArgumentForm) {
         .WillOnce(Return(ByMove(makeReadyFuture(ConfigurationValue(5)))));
     const auto reply =
         as<ConfigurationOptionResponse>(deliver(message(ConfigurationSet("k", 5, ""))).get());
+    EXPECT_EQ(reply->option->key, "k");
     EXPECT_EQ(reply->option->source, "");
 }
 
@@ -163,6 +177,37 @@ TEST_F(ServiceOverAMock, SetRepliesWithTheValueOfTheStoreNotTheOneSent) {
     const auto reply =
         as<ConfigurationOptionResponse>(deliver(message(ConfigurationSet("k", 5, ""))).get());
     EXPECT_EQ(textOf(reply->option->value), "string old");
+}
+
+TEST_F(ServiceOverAMock, SetCarriesEveryKindOfValueBothWaysUnchanged) {
+    const std::vector<ConfigurationValue> values{
+        true,
+        -1,
+        1U,
+        0.5,
+        std::u16string(1, char16_t(0xd800)),
+        std::string("\xff\0", 2),
+        std::vector<bool>{true, false},
+        std::vector<int>{-1},
+        std::vector<unsigned int>{1},
+        std::vector<double>{-0.5},
+        std::vector<std::string>{"", "a"},
+        std::vector<std::u16string>{u"", u"\u20ac"},
+    };
+    ASSERT_EQ(values.size(), typeTags.size());
+    for (const ConfigurationValue& value : values) {
+        EXPECT_CALL(*store, set("k", value))
+            .WillOnce(Return(ByMove(makeReadyFuture(ConfigurationValue(value)))));
+        const auto reply = as<ConfigurationOptionResponse>(
+            deliver(message(ConfigurationSet("k", value, ""))).get());
+        EXPECT_TRUE(reply->option->value == value) << textOf(value);
+    }
+}
+
+TEST_F(ServiceOverAMock, SetWithSourceThrowsWhatTheStoreRefusesWith) {
+    EXPECT_CALL(*store, set("k", _, "x"))
+        .WillOnce(Return(ByMove(failed<ConfigurationValue>("refused"))));
+    EXPECT_THROW(deliver(message(ConfigurationSet("k", 5, "x"))), std::runtime_error);
 }
 
 TEST_F(ServiceOverAMock, SetLeavesTheRequestItsValue) {

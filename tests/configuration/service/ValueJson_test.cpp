@@ -130,6 +130,14 @@ TEST_F(ValueJson, BytesOfANarrowTextAreReadAsTheyAre) {
     EXPECT_EQ(textOf(forms.fromObject<ConfigurationSet>(message)->value), "string \xff\xfe\xc3");
 }
 
+TEST_F(ValueJson, BytesThatAreNoUtf8AreReadAsReplacementCharactersOfAWideText) {
+    Poco::JSON::Object::Ptr message = new Poco::JSON::Object;
+    message->set("value", forms.objectOf(std::u16string()));
+    message->getObject("value")->set("value", std::string("a\xff"));
+    EXPECT_TRUE(forms.fromObject<ConfigurationSet>(message)->value ==
+                ConfigurationValue(std::u16string(u"a\ufffd")));
+}
+
 TEST_F(ValueJson, LoneSurrogateIsWrittenAsReplacementCharacter) {
     EXPECT_EQ(written<std::string>(std::u16string(1, char16_t(0xd800))), "\ufffd");
 }

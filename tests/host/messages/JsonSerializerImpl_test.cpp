@@ -93,6 +93,12 @@ TEST_F(Registry, RefusesToDecodeAnUnknownName) {
     }
 }
 
+TEST_F(Registry, RequiresANameOnlyWhileItIsRegistered) {
+    EXPECT_THROW(serializer.requireKnown("note"), UnknownMessageType);
+    registerNote();
+    EXPECT_NO_THROW(serializer.requireKnown("note"));
+}
+
 TEST_F(Registry, LooksAtTheNameBeforeTheText) {
     EXPECT_THROW(serializer.decode({"other", "no json"}), UnknownMessageType);
 }

@@ -14,6 +14,8 @@
 #include <variant>
 #include <vector>
 
+#include "configuration/StoreErrors.hpp"
+#include "framework/RoutingErrors.hpp"
 #include "tests/host/messages/RunningService.hpp"
 
 namespace velkor::host {
@@ -93,7 +95,7 @@ TEST_F(Dispatcher, SaysThatTheServiceIsNotRunning) {
 
 TEST_F(Dispatcher, SaysThatTheMessageIsNotForTheService) {
     const auto result = service.send("ConfigurationKeysResponse", "{}");
-    EXPECT_EQ(outcomeOf(result), "failure routing");
+    EXPECT_EQ(outcomeOf(result), "failure misrouted");
     EXPECT_EQ(errorText(result), std::string("Incorrect message type. Expected: ") +
                                      typeid(ServiceMessage<ConfigurationServiceProvider>).name() +
                                      " but found " +
@@ -101,19 +103,20 @@ TEST_F(Dispatcher, SaysThatTheMessageIsNotForTheService) {
 }
 
 TEST_F(Dispatcher, DeliversTheAcknowledgementToNobody) {
-    EXPECT_EQ(outcomeOf(service.dispatcher.dispatch({"velkor/Message", "{}"})), "failure routing");
+    EXPECT_EQ(outcomeOf(service.dispatcher.dispatch({"velkor/Message", "{}"})),
+              "failure misrouted");
 }
 
 TEST_F(Dispatcher, SaysWhatTheStoreRefuses) {
     const auto result = service.send("ConfigurationSet", R"({"key":"k","source":"nowhere"})");
-    EXPECT_EQ(outcomeOf(result), "failure service");
+    EXPECT_EQ(outcomeOf(result), "failure not writable");
     EXPECT_EQ(errorText(result), "Source not found or not writable: k, nowhere");
 }
 
 TEST_F(Dispatcher, SaysThatAPropertyFileIsMissing) {
     const auto result =
         service.send("AddPropertyFileSource", R"({"name":"n","path":"/no/such/file"})");
-    EXPECT_EQ(outcomeOf(result), "failure service");
+    EXPECT_EQ(outcomeOf(result), "failure file not opened");
     EXPECT_EQ(errorText(result), "Property file could not be opened: /no/such/file");
 }
 
@@ -121,13 +124,55 @@ TEST_F(Dispatcher, SaysThatAPropertyFileIsMissing) {
 TEST_F(Dispatcher, TellsATakenNameFromAWrongMessage) {
     EXPECT_EQ(outcomeOf(service.send("AddPropertyFileSource",
                                      R"({"name":"override","path":"/dev/null"})")),
-              "failure service");
+              "failure duplicate source");
 }
 
 TEST_F(Dispatcher, AcknowledgesAPropertyFile) {
     EXPECT_EQ(
         outcomeOf(service.send("AddPropertyFileSource", R"({"name":"n","path":"/dev/null"})")),
         "reply velkor/Message {}");
+}
+
+/// A dispatcher of a front end that may only read.
+class ReadingDispatcher : public Dispatcher {
+protected:
+    DispatchResult send(const std::string& type, const std::string& json) const {
+        return reading.dispatch({type, json});
+    }
+
+    MessageDispatcher reading{service.serializer, service.provider,
+                              MessageTypeNames{"velkor/configuration/ConfigurationGet", "nobody"}};
+};
+
+TEST_F(ReadingDispatcher, AnswersWhatIsAllowed) {
+    EXPECT_EQ(outcomeOf(send("velkor/configuration/ConfigurationGet", "{}")),
+              "reply velkor/configuration/ConfigurationOptionResponse {}");
+}
+
+TEST_F(ReadingDispatcher, RefusesWhatIsNotAllowed) {
+    const auto result = send("velkor/configuration/ConfigurationSet", R"({"key":"k"})");
+    EXPECT_EQ(outcomeOf(result), "failure forbidden type");
+    EXPECT_EQ(errorText(result), "Message type not allowed: velkor/configuration/ConfigurationSet");
+    EXPECT_FALSE(service.store->has("k").get());
+}
+
+TEST_F(ReadingDispatcher, RefusesWithoutLookingAtTheText) {
+    EXPECT_EQ(outcomeOf(send("velkor/configuration/ConfigurationSet", "no json")),
+              "failure forbidden type");
+}
+
+TEST_F(ReadingDispatcher, TellsAnUnknownTypeFromOneThatIsNotAllowed) {
+    EXPECT_EQ(outcomeOf(send("somebody", "{}")), "failure unknown type");
+}
+
+TEST_F(ReadingDispatcher, KnowsNoMoreTypesThanThereAre) {
+    EXPECT_EQ(outcomeOf(send("nobody", "{}")), "failure unknown type");
+}
+
+TEST_F(ReadingDispatcher, AllowsNamesOnlyAsTheyAreWritten) {
+    EXPECT_EQ(outcomeOf(send("velkor/configuration/configurationget", "{}")),
+              "failure unknown type");
+    EXPECT_EQ(outcomeOf(send("ConfigurationGet", "{}")), "failure unknown type");
 }
 
 /// Answers the one request there is with what its function gives or throws.
@@ -148,8 +193,45 @@ private:
 
 DispatchResult answered(ScriptedService::Reply (*answer)()) {
     const MessageDispatcher dispatcher(std::make_shared<JsonSerializerImpl>(),
-                                       std::make_shared<ScriptedService>(answer));
+                                       std::make_shared<ScriptedService>(answer),
+                                       MessageTypeNames{"velkor/Message"});
     return dispatcher.dispatch({"velkor/Message", "{}"});
+}
+
+/// Fails with `Error` and the given text, in the future.
+template <class Error>
+ScriptedService::Reply failing(const std::string& text) {
+    return makeFailedFuture<std::unique_ptr<Message>>(std::make_exception_ptr(Error(text)));
+}
+
+TEST(DispatcherOverAnyService, TellsTheKindsOfFailuresApart) {
+    namespace texts = configuration::store_errors;
+    using std::invalid_argument;
+    using std::runtime_error;
+    EXPECT_EQ(outcomeOf(answered([] { return failing<runtime_error>(texts::noSuchOption); })),
+              "failure missing option");
+    EXPECT_EQ(outcomeOf(answered([] { return failing<runtime_error>(texts::noWritableSource); })),
+              "failure not writable");
+    EXPECT_EQ(outcomeOf(answered([] { return failing<invalid_argument>(texts::duplicateSource); })),
+              "failure duplicate source");
+    EXPECT_EQ(outcomeOf(answered([] { return failing<runtime_error>(texts::fileNotOpened); })),
+              "failure file not opened");
+    EXPECT_EQ(
+        outcomeOf(answered([] { return failing<runtime_error>(routing_errors::notRunning); })),
+        "failure not running");
+    EXPECT_EQ(outcomeOf(answered(
+                  [] { return failing<invalid_argument>(routing_errors::notForThisObject); })),
+              "failure misrouted");
+    EXPECT_EQ(outcomeOf(answered([] { return failing<invalid_argument>(texts::nullSource); })),
+              "failure other");
+}
+
+// Handlers throw, and a service may do so however it likes.
+TEST(DispatcherOverAnyService, TellsTheKindsOfThrownFailuresApart) {
+    EXPECT_EQ(outcomeOf(answered([]() -> ScriptedService::Reply {
+                  throw std::runtime_error(configuration::store_errors::noSuchOption);
+              })),
+              "failure missing option");
 }
 
 struct Unregistered : Message {};
@@ -165,7 +247,7 @@ TEST(DispatcherOverAnyService, SaysThatAReplyHasNoJsonForm) {
 TEST(DispatcherOverAnyService, SaysThatThereIsNoReply) {
     EXPECT_EQ(
         outcomeOf(answered([] { return makeReadyFuture<std::unique_ptr<Message>>(nullptr); })),
-        "failure service");
+        "failure other");
 }
 
 TEST(DispatcherOverAnyService, SaysWhatTheReplyFailsWith) {
@@ -173,13 +255,13 @@ TEST(DispatcherOverAnyService, SaysWhatTheReplyFailsWith) {
         return makeFailedFuture<std::unique_ptr<Message>>(
             std::make_exception_ptr(std::runtime_error("too late")));
     });
-    EXPECT_EQ(outcomeOf(result), "failure service");
+    EXPECT_EQ(outcomeOf(result), "failure other");
     EXPECT_EQ(errorText(result), "too late");
 }
 
 TEST(DispatcherOverAnyService, SurvivesWhatIsNoException) {
     const auto result = answered([]() -> ScriptedService::Reply { throw 5; });
-    EXPECT_EQ(outcomeOf(result), "failure service");
+    EXPECT_EQ(outcomeOf(result), "failure other");
     EXPECT_EQ(errorText(result), "Unknown error");
 }
 

@@ -8,6 +8,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/service/ConfigurationJsonSerialization.hpp"
 #include "configuration/service/ConfigurationServiceProviderImpl.hpp"
+#include "configuration/service/MessageTypes.hpp"
 #include "host/messages/JsonSerializerImpl.hpp"
 #include "host/messages/MessageDispatcher.hpp"
 
@@ -30,7 +31,14 @@ public:
     std::shared_ptr<host::JsonSerializerImpl> serializer =
         std::make_shared<host::JsonSerializerImpl>();
     configuration::ConfigurationJsonSerialization serialization{serializer};
-    host::MessageDispatcher dispatcher{serializer, provider};
+    host::MessageDispatcher dispatcher{serializer, provider, everyType()};
+
+private:
+    static host::MessageTypeNames everyType() {
+        host::MessageTypeNames names{"velkor/Message"};
+        configuration::forEachMessageType([&](const auto& type) { names.insert(type.name()); });
+        return names;
+    }
 };
 
 /// The name of a failure, for readable comparisons.
@@ -38,14 +46,24 @@ inline std::string nameOf(host::DispatchFailure failure) {
     switch (failure) {
         case host::DispatchFailure::unknownType:
             return "unknown type";
+        case host::DispatchFailure::forbiddenType:
+            return "forbidden type";
         case host::DispatchFailure::noJsonObject:
             return "no JSON object";
         case host::DispatchFailure::notRunning:
             return "not running";
-        case host::DispatchFailure::routing:
-            return "routing";
-        case host::DispatchFailure::service:
-            return "service";
+        case host::DispatchFailure::misrouted:
+            return "misrouted";
+        case host::DispatchFailure::missingOption:
+            return "missing option";
+        case host::DispatchFailure::notWritable:
+            return "not writable";
+        case host::DispatchFailure::duplicateSource:
+            return "duplicate source";
+        case host::DispatchFailure::fileNotOpened:
+            return "file not opened";
+        case host::DispatchFailure::other:
+            return "other";
     }
     return "no such failure";
 }

@@ -1,0 +1,29 @@
+#include "host/messages/MessageService.hpp"
+
+#include <utility>
+
+#include "configuration/service/ConfigurationServiceProviderImpl.hpp"
+#include "configuration/service/MessageTypes.hpp"
+
+namespace velkor::host {
+
+MessageTypeNames allRequestTypes() {
+    MessageTypeNames names;
+    configuration::forEachRequestType([&](const auto& type) { names.insert(type.name()); });
+    return names;
+}
+
+MessageService::MessageService(std::shared_ptr<configuration::Configuration> store)
+    : serializer(std::make_shared<JsonSerializerImpl>()),
+      serialization(serializer),
+      provider(
+          std::make_shared<configuration::ConfigurationServiceProviderImpl>(std::move(store))) {
+    provider->setRunning(true);
+}
+
+std::shared_ptr<const MessageDispatcher> MessageService::dispatcherFor(
+    MessageTypeNames allowed) const {
+    return std::make_shared<MessageDispatcher>(serializer, provider, std::move(allowed));
+}
+
+}  // namespace velkor::host
