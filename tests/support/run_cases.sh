@@ -12,7 +12,7 @@ timeout --kill-after=5 "$limit" "$program" >"$output" 2>&1 || status=$?
 awk '
     /^\[ RUN      \]/ { held = $0; next }
     /\[       OK \]/ { held = ""; next }
-    /^\[  (FAILED|SKIPPED) \]/ && held != "" { print held; held = "" }
+    /\[  (FAILED |SKIPPED) \]/ && held != "" { print held; held = "" }
     held != "" { held = held "\n" $0; next }
     /^\[-+\]/ || /^$/ { next }
     { print }
