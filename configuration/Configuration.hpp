@@ -87,7 +87,9 @@ public:
     /// Values are delivered on the thread that makes the change. During a `set` that thread holds
     /// the store: a subscriber may call the store, but must not wait for another thread that does.
     /// Deliveries made by two threads may overlap, and a write from inside `onNext` is delivered
-    /// nested: a subscriber that needs the newest value in all cases asks the store for it.
+    /// nested. The older value may then come last, also when a single writer changes the key while
+    /// this watch is being subscribed to or asked for more: a subscriber that needs the newest
+    /// value in all cases asks the store with `get`.
     /// What a subscriber throws is reported on standard error as "Error in configuration value
     /// subscriber: " followed by the key; the others are served.
     /// Throws `std::bad_weak_ptr` when no shared pointer owns the store.

@@ -32,7 +32,8 @@ class VELKOR_EXPORT ServiceProvider : public Lifecycle,
 public:
     ~ServiceProvider() override;
 
-    /// Called by the host around the time in which the service runs.
+    /// For a host that wants to tell the service when it starts and stops running. This library
+    /// calls neither; whether the service runs is said by `setRunning` alone.
     virtual void onStart() = 0;
     virtual void onStop() = 0;
 

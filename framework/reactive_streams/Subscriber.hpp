@@ -10,8 +10,9 @@ namespace velkor::reactive_streams {
 /// What a consumer of a stream implements.
 ///
 /// The publisher promises: `onSubscribe` first and once; values only as far as they were requested;
-/// at most one of `onComplete` and `onError`, after the last value; no lock of the publisher held
-/// during any call. Every method may call `request` and `cancel` on the subscription.
+/// at most one of `onComplete` and `onError`, and no value that is published after it; no lock of
+/// the publisher held during any call. A value that another thread is delivering when the stream
+/// ends may still come. Every method may call `request` and `cancel` on the subscription.
 /// The implementer keeps the subscription weakly and expects calls on whatever thread publishes.
 template <class T>
 class Subscriber {

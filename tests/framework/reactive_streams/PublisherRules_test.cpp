@@ -11,6 +11,7 @@
 #include <thread>
 #include <vector>
 
+#include "framework/reactive_streams/CallbackSubscriber.hpp"
 #include "tests/framework/reactive_streams/BrokenPublisher.hpp"
 #include "tests/framework/reactive_streams/PublisherFixture.hpp"
 #include "tests/support/BoundedWait.hpp"
@@ -141,6 +142,19 @@ TEST_F(PublisherDeviations, Rule1_3_DeliveriesOfTwoThreadsMayOverlap) {
     EXPECT_TRUE(meeting->met);
 }
 
+TEST_F(PublisherDeviations,
+       Rule1_8_CancelOnAnotherThreadStillLetsQueuedValuesWithinTheDemandBegin) {
+    publisher = makeStream(2);
+    publisher->publish(1);
+    publisher->publish(2);
+    subscriber->whenNext = [this](int value) {
+        if (value == 1) std::thread([this] { subscriber->cancel(); }).join();
+    };
+    subscribe(3);
+    publisher->publish(3);
+    EXPECT_THAT(subscriber->values, ElementsAre(1, 2));
+}
+
 TEST_F(PublisherDeviations, Rule1_9_EndOnAnotherThreadMayOvertakeOnSubscribe) {
     subscriber->whenSubscribed = [this] {
         std::thread([this] { publisher->complete(); }).join();
@@ -187,6 +201,72 @@ TEST_F(PublisherDeviations, Rule3_16_ExceptionOfOnNextReachesTheCallerOfRequest)
     publisher->publish(1);
     subscribe(0);
     EXPECT_THROW(subscriber->request(1), std::runtime_error);
+}
+
+/// A number that stops at a gate, if it has one, when it is moved. The way of a value to a callback
+/// that takes it by value is one move: the callback begins after the gate has opened.
+class Travelling {
+public:
+    struct Gate {
+        velkor::testing::Latch reached;
+        velkor::testing::Latch opened;
+    };
+
+    explicit Travelling(int value, Gate* onItsWay = nullptr) : number(value), gate(onItsWay) {}
+    Travelling(const Travelling& other) = default;
+    Travelling(Travelling&& other) noexcept : number(other.number), gate(other.gate) {
+        if (gate == nullptr) return;
+        gate->reached.countDown();
+        EXPECT_TRUE(gate->opened.wait());
+    }
+    Travelling& operator=(const Travelling&) = delete;
+    Travelling& operator=(Travelling&&) = delete;
+    ~Travelling() = default;
+
+    const int number;
+
+private:
+    Gate* const gate;
+};
+
+/// What happens while another thread has a value in its hands.
+class PublisherDeviationsOnTwoThreads : public ::testing::Test {
+protected:
+    /// Callbacks that write down in which order they begin.
+    Callbacks<Travelling> recording() {
+        return {[this](Travelling value) { begun.push_back(std::to_string(value.number)); },
+                [this] { begun.emplace_back("complete"); }};
+    }
+
+    /// Runs `meanwhile` when a value that `deliver` hands over on another thread is on its way.
+    template <class Deliver, class Meanwhile>
+    void whileOnItsWay(Deliver deliver, Meanwhile meanwhile) {
+        std::thread other(deliver);
+        EXPECT_TRUE(gate.reached.wait());
+        meanwhile();
+        gate.opened.countDown();
+        other.join();
+    }
+
+    Travelling::Gate gate;
+    std::vector<std::string> begun;
+    std::shared_ptr<StreamOf<Travelling>> publisher =
+        std::make_shared<StreamOf<Travelling>>(1, [] {});
+    SubscriptionHandle watch;
+};
+
+TEST_F(PublisherDeviationsOnTwoThreads, Rule1_3_QueuedValueMayBeginAfterANewerOne) {
+    publisher->publishFirst(Travelling(1, &gate));
+    whileOnItsWay([this] { watch = reactive_streams::subscribe(*publisher, recording()); },
+                  [this] { publisher->publish(Travelling(2)); });
+    EXPECT_THAT(begun, ElementsAre("2", "1"));
+}
+
+TEST_F(PublisherDeviationsOnTwoThreads, Rule1_7_ValueMayBeginAfterCompletion) {
+    watch = reactive_streams::subscribe(*publisher, recording());
+    whileOnItsWay([this] { publisher->publish(Travelling(1, &gate)); },
+                  [this] { publisher->complete(); });
+    EXPECT_THAT(begun, ElementsAre("complete", "1"));
 }
 
 }  // namespace
