@@ -1,0 +1,97 @@
+#include "host/console/SendCommand.hpp"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "configuration/service/ConfigurationJsonSerialization.hpp"
+#include "configuration/service/ConfigurationServiceProviderImpl.hpp"
+#include "tests/support/Thrown.hpp"
+
+namespace velkor::host {
+namespace {
+
+using velkor::testing::thrownText;
+using Words = std::vector<std::string>;
+
+class SendCommandTest : public ::testing::Test {
+protected:
+    SendCommandTest() { provider->setRunning(true); }
+
+    std::string send(Words arguments) { return registry->find("send")->run(std::move(arguments)); }
+
+    std::shared_ptr<configuration::ConfigurationImpl> store =
+        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<JsonSerializerImpl> serializer = std::make_shared<JsonSerializerImpl>();
+    configuration::ConfigurationJsonSerialization serialization{serializer};
+    std::shared_ptr<configuration::ConfigurationServiceProviderImpl> provider =
+        std::make_shared<configuration::ConfigurationServiceProviderImpl>(store);
+    std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
+    SendCommand command{std::make_shared<MessageDispatcher>(serializer, provider), registry};
+};
+
+TEST_F(SendCommandTest, ShowsTypeAndContentOfTheReply) {
+    store->set("a", 1);
+    EXPECT_EQ(send({"velkor/configuration/ConfigurationGet", R"({"key":"a"})"}),
+              "velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"a","source":"override","value":{"type":"int","value":1}})");
+}
+
+TEST_F(SendCommandTest, TakesTheLastWordOfATypeName) {
+    EXPECT_EQ(send({"ConfigurationGet", R"({"key":"a"})"}),
+              "velkor/configuration/ConfigurationOptionResponse {}");
+}
+
+TEST_F(SendCommandTest, NeedsNoContent) {
+    EXPECT_EQ(send({"ConfigurationKeys"}),
+              R"(velkor/configuration/ConfigurationKeysResponse {"keys":[]})");
+}
+
+TEST_F(SendCommandTest, ChangesTheStore) {
+    send({"ConfigurationSet", R"({"key":"a","value":{"type":"string","value":"it's"}})"});
+    EXPECT_EQ(boost::get<std::string>(store->get("a").get()), "it's");
+}
+
+TEST_F(SendCommandTest, RefusesAnUnknownType) {
+    EXPECT_EQ(thrownText<CommandError>([&] {
+                  send({"Nope", "{}"});
+              }),
+              "Unknown message type: velkor/configuration/Nope");
+}
+
+TEST_F(SendCommandTest, RefusesContentThatIsNoJsonObject) {
+    EXPECT_THROW(send({"ConfigurationGet", "[]"}), CommandError);
+}
+
+TEST_F(SendCommandTest, ReportsARefusalOfTheService) {
+    const char* const request = R"({"key":"a","source":"nobody"})";
+    EXPECT_EQ(thrownText<CommandError>([&] {
+                  send({"ConfigurationSet", request});
+              }),
+              "Source not found or not writable: a, nobody");
+}
+
+TEST_F(SendCommandTest, TakesTheContentAsItWasTyped) {
+    CommandLine line(R"(ConfigurationGet  {"key": "a  'b"} )");
+    EXPECT_EQ(registry->find("send")->readArguments(line),
+              (Words{"ConfigurationGet", R"({"key": "a  'b"})"}));
+}
+
+TEST_F(SendCommandTest, SuggestsTheTypesOfRequests) {
+    EXPECT_EQ(registry->find("send")->suggestions()(),
+              (Words{"ConfigurationGet", "ConfigurationSet", "ConfigurationKeys",
+                     "AddPropertyFileSource"}));
+}
+
+TEST_F(SendCommandTest, IsWithdrawnWithItsOwner) {
+    const auto other = std::make_shared<CommandRegistry>();
+    { const SendCommand shortLived(nullptr, other); }
+    EXPECT_EQ(other->names(), Words{});
+}
+
+}  // namespace
+}  // namespace velkor::host
