@@ -23,7 +23,6 @@
 #include "host/console/LineEditor.hpp"
 #include "host/console/LineReader.hpp"
 #include "host/console/Output.hpp"
-#include "host/console/SendCommand.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
 #include "host/messages/MessageDispatcher.hpp"
@@ -69,10 +68,9 @@ public:
           console(registry, output),
           service(store),
           storeCommands(store, registry),
-          sendCommand(service.dispatcher(), registry),
-          hostCommands(
-              {store, std::make_shared<Watches>(store, showValue()), [this] { console.quit(); }},
-              registry) {}
+          hostCommands({store, std::make_shared<Watches>(store, showValue()), service.dispatcher(),
+                        [this] { console.quit(); }},
+                       registry) {}
 
     /// Gives whether all sources could be added; reports those that could not.
     bool load(const std::vector<SourceRequest>& requests) {
@@ -114,7 +112,6 @@ private:
     Console console;
     MessageService service;
     configuration::ConfigurationCommandProvider storeCommands;
-    SendCommand sendCommand;
     HostCommands hostCommands;
 };
 

@@ -39,26 +39,35 @@ std::string unknownCommandText(const std::string& name, const std::vector<std::s
 }  // namespace
 
 Future<bool> CommandRegistry::registerCommand(CommandDescriptor command) {
-    return registerCommand(std::move(command), CommandTraits());
-}
-
-Future<bool> CommandRegistry::registerCommand(CommandDescriptor command, CommandTraits traits) {
     if (!isWellFormed(command)) return makeReadyFuture(false);
-    const auto added = std::make_shared<const Command>(std::move(command), std::move(traits));
-    const common::MutexLock lock(mutex);
-    const bool taken = std::any_of(registered.begin(), registered.end(), isCalled(added->name()));
-    if (!taken) registered.push_back(added);
-    return makeReadyFuture(!taken);
+    auto accepted = makeReadyFuture(true);  // beforehand, since making it may fail
+    const bool isNew = add(std::make_shared<const Command>(std::move(command), CommandTraits()));
+    return isNew ? std::move(accepted) : makeReadyFuture(false);
 }
 
 Future<bool> CommandRegistry::unregisterCommand(const std::string& name) {
+    auto withdrawn = makeReadyFuture(true);  // beforehand, since making it may fail
     CommandPtr removed;
     const common::MutexLock lock(mutex);
     const auto found = std::find_if(registered.begin(), registered.end(), isCalled(name));
     if (found == registered.end()) return makeReadyFuture(false);
-    removed = *found;
+    removed = std::move(*found);
     registered.erase(found);
-    return makeReadyFuture(true);
+    return withdrawn;
+}
+
+bool CommandRegistry::add(CommandPtr command) {
+    const common::MutexLock lock(mutex);
+    const bool taken = std::any_of(registered.begin(), registered.end(), isCalled(command->name()));
+    if (!taken) registered.push_back(std::move(command));
+    return !taken;
+}
+
+// The caller's reference keeps the command alive until the mutex is released.
+void CommandRegistry::remove(const CommandPtr& command) noexcept {
+    const common::MutexLock lock(mutex);
+    const auto found = std::find(registered.begin(), registered.end(), command);
+    if (found != registered.end()) registered.erase(found);
 }
 
 CommandRegistry::CommandPtr CommandRegistry::find(const std::string& name) const {

@@ -14,7 +14,8 @@ namespace velkor::host {
 ///
 /// Thread-safe. No handler runs under the mutex, and none is destroyed under it: a handler may
 /// register and withdraw commands, its own too, and ends in peace after it was withdrawn. All
-/// futures are resolved when they are returned.
+/// futures are resolved when they are returned. A call that throws, for want of memory, has changed
+/// nothing.
 class CommandRegistry final : public administration::Administration {
 public:
     using CommandPtr = std::shared_ptr<const Command>;
@@ -23,10 +24,14 @@ public:
     /// the limits contradict each other.
     Future<bool> registerCommand(administration::CommandDescriptor command) override;
 
-    /// As above, with what the console should know of the command.
-    Future<bool> registerCommand(administration::CommandDescriptor command, CommandTraits traits);
-
     Future<bool> unregisterCommand(const std::string& name) override;
+
+    /// Adds `command`, which is well-formed. Gives false, and changes nothing, when its name is
+    /// taken.
+    bool add(CommandPtr command) VELKOR_EXCLUDES(mutex);
+
+    /// Withdraws `command` itself, if it is there still; another one of its name stays.
+    void remove(const CommandPtr& command) noexcept VELKOR_EXCLUDES(mutex);
 
     /// The command called `name` or, when there is none, the one whose name ends in "." and `name`.
     /// Throws `CommandError` "Unknown command: " with the name and similar names, or "Ambiguous

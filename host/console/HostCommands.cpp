@@ -1,8 +1,10 @@
 #include "host/console/HostCommands.hpp"
 
 #include <cstdint>
+#include <iterator>
 #include <utility>
 
+#include "host/console/SendCommand.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
 
@@ -73,6 +75,19 @@ std::string quit(const Context& context, const Arguments&) {
     return "";
 }
 
+std::string send(const Context& context, const Arguments& arguments) {
+    return sendMessage(*context.services.messages, arguments);
+}
+
+std::vector<std::string> suggestCommands(const Context& context) {
+    const auto registry = context.registry.lock();
+    return registry ? registry->names() : std::vector<std::string>();
+}
+
+std::vector<std::string> suggestRequests(const Context&) {
+    return requestTypes();
+}
+
 struct HostCommand {
     const char* name;
     const char* argumentNames;
@@ -80,6 +95,8 @@ struct HostCommand {
     std::string (*run)(const Context&, const Arguments&);
     std::uint8_t minimumArguments;
     std::uint8_t maximumArguments;
+    bool takesRawRest = false;
+    std::vector<std::string> (*suggest)(const Context&) = nullptr;
 };
 
 constexpr HostCommand commands[] = {
@@ -87,42 +104,37 @@ constexpr HostCommand commands[] = {
     {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
     {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
     {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
-    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1},
+    {"send", "TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2, true,
+     suggestRequests},
+    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
+     suggestCommands},
     {"quit", "", "End the session.", quit, 0, 0},
 };
 
-CommandTraits traitsOf(const HostCommand& command,
-                       const std::weak_ptr<CommandRegistry>& weakRegistry) {
-    CommandTraits traits;
-    traits.arguments = command.argumentNames;
-    if (command.run == help) {
-        traits.suggestions = [weakRegistry] {
-            const auto registry = weakRegistry.lock();
-            return registry ? registry->names() : std::vector<std::string>();
-        };
+CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
+                                        const std::shared_ptr<const Context>& context) {
+    const auto handler = [run = command.run, context](Arguments&& arguments) {
+        return run(*context, arguments);
+    };
+    CommandTraits traits{command.argumentNames, command.takesRawRest};
+    if (command.suggest != nullptr) {
+        traits.suggestions = [suggest = command.suggest, context] { return suggest(*context); };
     }
-    return traits;
+    return std::make_shared<const Command>(
+        administration::CommandDescriptor{command.name, command.description, handler,
+                                          command.minimumArguments, command.maximumArguments},
+        std::move(traits));
 }
 
 }  // namespace
 
-HostCommands::HostCommands(HostServices services, std::shared_ptr<CommandRegistry> commandRegistry)
-    : registry(std::move(commandRegistry)) {
+HostCommands::HostCommands(HostServices services,
+                           const std::shared_ptr<CommandRegistry>& registry) {
     const auto context = std::make_shared<const Context>(Context{std::move(services), registry});
+    registrations.reserve(std::size(commands));
     for (const HostCommand& command : commands) {
-        const auto handler = [run = command.run, context](Arguments&& arguments) {
-            return run(*context, arguments);
-        };
-        auto accepted =
-            registry->registerCommand({command.name, command.description, handler,
-                                       command.minimumArguments, command.maximumArguments},
-                                      traitsOf(command, registry));
-        if (accepted.get()) names.emplace_back(command.name);
+        registrations.emplace_back(registry, makeCommand(command, context));
     }
-}
-
-HostCommands::~HostCommands() {
-    for (const auto& name : names) registry->unregisterCommand(name);
 }
 
 }  // namespace velkor::host

@@ -27,7 +27,8 @@ std::shared_ptr<CommandRegistry> makeRegistry() {
     registry->registerCommand({"sources", "", nothing, 0, 0});
     CommandTraits traits;
     traits.suggestions = [] { return Words{"Get", "Set"}; };
-    registry->registerCommand({"send", "", nothing, 1, 2}, traits);
+    registry->add(std::make_shared<const Command>(
+        administration::CommandDescriptor{"send", "", nothing, 1, 2}, traits));
     return registry;
 }
 

@@ -17,13 +17,16 @@ namespace {
 using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
+const Words hostNames{"sources", "explain", "watch", "unwatch", "send", "help", "quit"};
+
 class HostCommandsTest : public ::testing::Test {
 protected:
     HostServices services() {
         const auto show = [this](const auto& key, const auto& value) {
             shown.push_back(optionText(key, value));
         };
-        return {store, std::make_shared<Watches>(store, show), [this] { quitting = true; }};
+        return {store, std::make_shared<Watches>(store, show), nullptr,
+                [this] { quitting = true; }};
     }
 
     std::string run(const std::string& name, Words arguments = {}) {
@@ -39,7 +42,7 @@ protected:
 };
 
 TEST_F(HostCommandsTest, AreRegisteredInOrder) {
-    EXPECT_EQ(registry->names(), (Words{"sources", "explain", "watch", "unwatch", "help", "quit"}));
+    EXPECT_EQ(registry->names(), hostNames);
 }
 
 TEST_F(HostCommandsTest, AreWithdrawnWithTheirOwner) {
@@ -48,12 +51,29 @@ TEST_F(HostCommandsTest, AreWithdrawnWithTheirOwner) {
     EXPECT_EQ(other->names(), Words{});
 }
 
-TEST_F(HostCommandsTest, LeaveACommandOfTheSameNameToItsOwner) {
+class HostCommandNameTest : public HostCommandsTest,
+                            public ::testing::WithParamInterface<std::string> {};
+
+TEST_P(HostCommandNameTest, StaysWithTheCommandThatHasItAlready) {
     const auto other = std::make_shared<CommandRegistry>();
-    other->registerCommand({"quit", "", [](Words&&) { return std::string("mine"); }, 0, 0});
+    other->registerCommand({GetParam(), "", [](Words&&) { return std::string("mine"); }, 0, 0});
     { const HostCommands shortLived(services(), other); }
-    EXPECT_EQ(other->find("quit")->run({}), "mine");
+    EXPECT_EQ(other->names(), Words{GetParam()});
+    EXPECT_EQ(other->find(GetParam())->run({}), "mine");
 }
+
+TEST_P(HostCommandNameTest, StaysWithACommandThatGotItLater) {
+    const auto other = std::make_shared<CommandRegistry>();
+    {
+        const HostCommands shortLived(services(), other);
+        other->unregisterCommand(GetParam());
+        other->registerCommand({GetParam(), "", [](Words&&) { return std::string("mine"); }, 0, 0});
+    }
+    EXPECT_EQ(other->names(), Words{GetParam()});
+}
+
+INSTANTIATE_TEST_SUITE_P(Names, HostCommandNameTest, ::testing::ValuesIn(hostNames),
+                         [](const auto& tested) { return tested.param; });
 
 TEST_F(HostCommandsTest, KeepNothingAliveThroughTheRegistry) {
     const std::weak_ptr<CommandRegistry> weak = [this] {

@@ -10,6 +10,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/service/ConfigurationJsonSerialization.hpp"
 #include "configuration/service/ConfigurationServiceProviderImpl.hpp"
+#include "host/console/HostCommands.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
@@ -31,7 +32,9 @@ protected:
     std::shared_ptr<configuration::ConfigurationServiceProviderImpl> provider =
         std::make_shared<configuration::ConfigurationServiceProviderImpl>(store);
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
-    SendCommand command{std::make_shared<MessageDispatcher>(serializer, provider), registry};
+    HostCommands commands{{store, std::make_shared<Watches>(store, [](const auto&, const auto&) {}),
+                           std::make_shared<MessageDispatcher>(serializer, provider), [] {}},
+                          registry};
 };
 
 TEST_F(SendCommandTest, ShowsTypeAndContentOfTheReply) {
@@ -85,12 +88,6 @@ TEST_F(SendCommandTest, SuggestsTheTypesOfRequests) {
     EXPECT_EQ(registry->find("send")->suggestions()(),
               (Words{"ConfigurationGet", "ConfigurationSet", "ConfigurationKeys",
                      "AddPropertyFileSource"}));
-}
-
-TEST_F(SendCommandTest, IsWithdrawnWithItsOwner) {
-    const auto other = std::make_shared<CommandRegistry>();
-    { const SendCommand shortLived(nullptr, other); }
-    EXPECT_EQ(other->names(), Words{});
 }
 
 }  // namespace
