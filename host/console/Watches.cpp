@@ -12,32 +12,40 @@ Watches::Watches(std::shared_ptr<configuration::Configuration> watchedStore, Sho
     : store(std::move(watchedStore)), show(std::move(showValue)) {}
 
 bool Watches::add(const std::string& key) {
+    const auto watch = std::make_shared<reactive_streams::SubscriptionHandle>();
     {
         const common::MutexLock lock(mutex);
-        if (!handles.try_emplace(key).second) return false;
+        if (!watches.try_emplace(key, watch).second) return false;
     }
     reactive_streams::SubscriptionHandle handle;
     try {
         handle = open(key);
     } catch (...) {
-        remove(key);
+        forget(key, watch);
         throw;
     }
-    // The values that `open` has shown may have been the reason to remove the watch again.
+    // The key may have been removed since, even by the values that `open` has shown, and added
+    // again.
     const common::MutexLock lock(mutex);
-    const auto reserved = handles.find(key);
-    if (reserved != handles.end()) reserved->second = std::move(handle);
+    const auto found = watches.find(key);
+    if (found != watches.end() && found->second == watch) *watch = std::move(handle);
     return true;
 }
 
 bool Watches::remove(const std::string& key) {
-    reactive_streams::SubscriptionHandle removed;
+    Watch removed;
     const common::MutexLock lock(mutex);
-    const auto found = handles.find(key);
-    if (found == handles.end()) return false;
+    const auto found = watches.find(key);
+    if (found == watches.end()) return false;
     removed = std::move(found->second);
-    handles.erase(found);
+    watches.erase(found);
     return true;
+}
+
+void Watches::forget(const std::string& key, const Watch& watch) {
+    const common::MutexLock lock(mutex);
+    const auto found = watches.find(key);
+    if (found != watches.end() && found->second == watch) watches.erase(found);
 }
 
 reactive_streams::SubscriptionHandle Watches::open(const std::string& key) const {

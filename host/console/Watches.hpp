@@ -24,20 +24,26 @@ public:
     Watches(std::shared_ptr<configuration::Configuration> store, Show show);
 
     /// Shows the value of `key`, if there is one, and every later one. Gives false, and does
-    /// nothing, when the key is watched already. What showing the value throws passes on, and the
-    /// key is not watched then.
+    /// nothing, when the key is watched already. What showing the value throws passes on, and this
+    /// watch is over then; so it is when the key was removed meanwhile.
     bool add(const std::string& key) VELKOR_EXCLUDES(mutex);
 
     /// Shows no further values of `key`. Gives false when the key was not watched.
     bool remove(const std::string& key) VELKOR_EXCLUDES(mutex);
 
 private:
+    /// What keeps one watch open, once it is; its address tells it from a later one of the key.
+    using Watch = std::shared_ptr<reactive_streams::SubscriptionHandle>;
+
     reactive_streams::SubscriptionHandle open(const std::string& key) const;
+    void forget(const std::string& key, const Watch& watch) VELKOR_EXCLUDES(mutex);
 
     const std::shared_ptr<configuration::Configuration> store;
     const Show show;
     common::Mutex mutex;
-    std::map<std::string, reactive_streams::SubscriptionHandle> handles VELKOR_GUARDED_BY(mutex);
+    // Cancelling a handle may wait for the thread that writes to the store, and that may show a
+    // value meanwhile: handles end with the mutex released.
+    std::map<std::string, Watch> watches VELKOR_GUARDED_BY(mutex);
 };
 
 }  // namespace velkor::host
