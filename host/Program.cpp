@@ -73,8 +73,8 @@ public:
                        registry) {}
 
     /// Gives whether all sources could be added; reports those that could not.
-    bool load(const std::vector<SourceRequest>& requests) {
-        const auto failures = loadSources(*store, requests);
+    bool load(const std::vector<SourceRequest>& requests, const SourceLimits& limits) {
+        const auto failures = loadSources(*store, requests, limits);
         for (const auto& failure : failures) output.message(failure);
         return failures.empty();
     }
@@ -130,7 +130,7 @@ ExitCode runSession(const Options& options, Output& output) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
     Session session(output);
-    const bool allLoaded = session.load(options.sources);
+    const bool allLoaded = session.load(options.sources, options.limits);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;

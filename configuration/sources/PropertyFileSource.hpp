@@ -3,6 +3,7 @@
 #include <memory>
 #include <set>
 #include <string>
+#include <string_view>
 
 #include "configuration/sources/ConfigurationSource.hpp"
 #include "configuration/sources/ValueTable.hpp"
@@ -20,6 +21,9 @@ public:
     /// Reads the property file at `path`. Throws `std::runtime_error` "Property file could not be
     /// opened: " followed by the path in UTF-8. Content never fails; a read error ends the file.
     explicit PropertyFileSource(const std::u16string& path);
+
+    /// Takes `text` for the content of a property file, for a host that reads files its own way.
+    explicit PropertyFileSource(std::string_view text);
 
     PropertyFileSource(const PropertyFileSource&) = delete;
     PropertyFileSource& operator=(const PropertyFileSource&) = delete;

@@ -1,10 +1,10 @@
 #include "host/sources/SourceLoader.hpp"
 
 #include <exception>
-#include <filesystem>
+#include <new>
 #include <set>
 
-#include "framework/common/TextConversion.hpp"
+#include "host/sources/SourceKinds.hpp"
 
 namespace velkor::host {
 
@@ -21,10 +21,10 @@ public:
 
     std::string nameOf(const SourceRequest& request) {
         if (request.name) return *request.name;
-        const std::string stem = std::filesystem::path(request.path).stem().string();
-        std::string name = stem;
+        const std::string usual = sourceKind(request.kind).usualName(request);
+        std::string name = usual;
         for (unsigned number = 2; !taken.insert(name).second; ++number) {
-            name = stem + '-' + std::to_string(number);
+            name = usual + '-' + std::to_string(number);
         }
         return name;
     }
@@ -33,19 +33,26 @@ private:
     std::set<std::string> taken{"override", "default"};  // the store's own
 };
 
+void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
+                const SourceRequest& request, const SourceLimits& limits) {
+    store
+        .addSource(name, request.group, request.order, !request.writable,
+                   sourceKind(request.kind).make(request, limits))
+        .get();
+}
+
 }  // namespace
 
-std::vector<std::string> loadSources(configuration::Configuration& store,
-                                     const std::vector<SourceRequest>& requests) {
+std::vector<std::string> loadSources(configuration::ConfigurationImpl& store,
+                                     const std::vector<SourceRequest>& requests,
+                                     const SourceLimits& limits) {
     std::vector<std::string> failures;
     SourceNames names(requests);
-    const common::TextConversion conversion("UTF-8");
     for (const auto& request : requests) {
         try {
-            store
-                .addPropertyFileSource(names.nameOf(request), request.group, request.order,
-                                       !request.writable, conversion.toUtf16(request.path))
-                .get();
+            loadSource(store, names.nameOf(request), request, limits);
+        } catch (const std::bad_alloc&) {
+            failures.push_back("Out of memory while loading: " + request.location);
         } catch (const std::exception& error) {
             failures.emplace_back(error.what());
         }

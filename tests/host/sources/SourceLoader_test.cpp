@@ -27,6 +27,10 @@ protected:
         return {name, file.path().string()};
     }
 
+    Words load(const std::vector<SourceRequest>& requests, const SourceLimits& limits = {}) {
+        return loadSources(*store, requests, limits);
+    }
+
     Words sourceNames() {
         Words names;
         for (const auto& each : store->describeSources().get()) names.push_back(each.name);
@@ -42,18 +46,18 @@ protected:
 };
 
 TEST_F(SourceLoaderTest, NamesASourceLikeItsFile) {
-    EXPECT_EQ(loadSources(*store, {file(base)}), Words{});
+    EXPECT_EQ(load({file(base)}), Words{});
     EXPECT_EQ(sourceNames(), (Words{"override", "base", "default"}));
 }
 
 TEST_F(SourceLoaderTest, ALaterFileOverridesAnEarlierOne) {
-    loadSources(*store, {file(base), file(site)});
+    load({file(base), file(site)});
     EXPECT_EQ(value("port"), "'2'");
     EXPECT_EQ(value("host"), "'a'");
 }
 
 TEST_F(SourceLoaderTest, AWriteOverridesEveryFile) {
-    loadSources(*store, {file(base), file(site)});
+    load({file(base), file(site)});
     store->set("port", 3);
     EXPECT_EQ(value("port"), "3");
 }
@@ -61,30 +65,42 @@ TEST_F(SourceLoaderTest, AWriteOverridesEveryFile) {
 TEST_F(SourceLoaderTest, NumbersNamesThatAreTaken) {
     const TemporaryFile other("", "base.conf");
     const TemporaryFile reserved("", "default.properties");
-    loadSources(*store, {file(base), file(other), file(base), file(reserved)});
+    load({file(base), file(other), file(base), file(reserved)});
     EXPECT_EQ(sourceNames(),
               (Words{"override", "default-2", "base-3", "base-2", "base", "default"}));
 }
 
 TEST_F(SourceLoaderTest, LeavesGivenNamesToTheirSources) {
-    EXPECT_EQ(loadSources(*store, {file(base), source("base", site)}), Words{});
+    EXPECT_EQ(load({file(base), source("base", site)}), Words{});
     EXPECT_EQ(sourceNames(), (Words{"override", "base", "base-2", "default"}));
 }
 
 TEST_F(SourceLoaderTest, ReportsANameGivenTwice) {
-    EXPECT_EQ(loadSources(*store, {source("a", base), source("a", site)}),
+    EXPECT_EQ(load({source("a", base), source("a", site)}),
               Words{"Source with the requested name already exists: a"});
 }
 
 TEST_F(SourceLoaderTest, ReportsEveryFileThatCantBeOpenedAndLoadsTheOthers) {
-    EXPECT_EQ(loadSources(*store, {{std::nullopt, "/no/\u00e9"}, file(base), {"n", "/no/b"}}),
-              (Words{"Property file could not be opened: /no/\u00e9",
-                     "Property file could not be opened: /no/b"}));
+    EXPECT_EQ(load({{std::nullopt, "/no/\u00e9"}, file(base), {"n", "/no/b"}}),
+              (Words{"Property file could not be opened: /no/\u00e9: No such file or directory",
+                     "Property file could not be opened: /no/b: No such file or directory"}));
     EXPECT_EQ(sourceNames(), (Words{"override", "base", "default"}));
 }
 
+TEST_F(SourceLoaderTest, ReportsAFileAboveTheLimitAndLoadsTheOthers) {
+    EXPECT_EQ(load({{std::nullopt, "/dev/zero"}, file(base)}, {1000}),
+              Words{"Property file is larger than 1000 bytes: /dev/zero"});
+    EXPECT_EQ(sourceNames(), (Words{"override", "base", "default"}));
+}
+
+TEST_F(SourceLoaderTest, ReportsAKindThatThereIsNot) {
+    SourceRequest request = source("n", base);
+    request.kind = "web";
+    EXPECT_EQ(load({request}), Words{"Unknown kind of source: web"});
+}
+
 TEST_F(SourceLoaderTest, TakesOverGroupOrderAndAccess) {
-    loadSources(*store, {{"n", base.path().string(), "server", -3, true}});
+    load({{"n", base.path().string(), "server", -3, true}});
     const auto description = store->describeSources().get().front();
     EXPECT_EQ(description.name, "n");
     EXPECT_EQ(description.group, "server.");
