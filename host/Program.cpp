@@ -15,9 +15,11 @@
 #include "framework/common/DiagnosticLogger.hpp"
 #include "host/LogSink.hpp"
 #include "host/Options.hpp"
+#include "host/SessionStore.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "host/console/Completer.hpp"
 #include "host/console/Console.hpp"
+#include "host/console/DescriptorBuffer.hpp"
 #include "host/console/GivenLines.hpp"
 #include "host/console/HostCommands.hpp"
 #include "host/console/LineEditor.hpp"
@@ -61,9 +63,10 @@ private:
 /// The store with everything that can be done to it on the console.
 class Session {
 public:
-    explicit Session(Output& sessionOutput)
+    Session(Output& sessionOutput, const SourceLimits& sourceLimits)
         : output(sessionOutput),
-          store(std::make_shared<ConfigurationImpl>()),
+          limits(sourceLimits),
+          store(std::make_shared<SessionStore>(limits)),
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output),
           service(store),
@@ -73,7 +76,7 @@ public:
                        registry) {}
 
     /// Gives whether all sources could be added; reports those that could not.
-    bool load(const std::vector<SourceRequest>& requests, const SourceLimits& limits) {
+    bool load(const std::vector<SourceRequest>& requests) {
         const auto failures = loadSources(*store, requests, limits);
         for (const auto& failure : failures) output.message(failure);
         return failures.empty();
@@ -107,6 +110,7 @@ private:
     }
 
     Output& output;
+    const SourceLimits limits;
     std::shared_ptr<ConfigurationImpl> store;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
@@ -129,8 +133,8 @@ ExitCode runSession(const Options& options, Output& output) {
     for (const auto& log : options.logs) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
-    Session session(output);
-    const bool allLoaded = session.load(options.sources, options.limits);
+    Session session(output, options.limits);
+    const bool allLoaded = session.load(options.sources);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
@@ -139,7 +143,9 @@ ExitCode runSession(const Options& options, Output& output) {
 }  // namespace
 
 ExitCode runProgram(const std::vector<std::string>& arguments) {
-    Output output(std::cout,
+    DescriptorBuffer standardOutput(STDOUT_FILENO);
+    std::ostream answers(&standardOutput);
+    Output output(answers,
                   isTerminal(STDOUT_FILENO) ? Output::Answers::escaped : Output::Answers::exact,
                   std::cerr);
     ExitCode exitCode = ExitCode::fine;

@@ -4,6 +4,7 @@
 #include <utility>
 
 #include "host/console/CommandLine.hpp"
+#include "host/console/Interruption.hpp"
 
 namespace velkor::host {
 
@@ -43,12 +44,15 @@ bool Console::run(LineSource& lines) {
             allFine = false;
             output.message(lines.position() + error.what());
         }
+        // What was interrupted may have left the cursor in the middle of a line.
+        if (Interruption::take()) output.answer("\n");
     }
     return allFine;
 }
 
 bool Console::runNext(LineSource& lines) {
     const auto line = lines.nextLine();
+    Interruption::take();  // what came before the command is not about it
     if (line) execute(*line);
     return line.has_value();
 }
@@ -62,6 +66,8 @@ void Console::execute(const std::string& line) {
     std::string answer;
     try {
         answer = command->run(std::move(arguments));
+    } catch (const Interrupted&) {
+        return;
     } catch (...) {
         throw CommandError(failureText(*command));
     }

@@ -13,7 +13,8 @@ namespace velkor::host {
 ///
 /// A line is a command and its arguments, split as `CommandLine` says. An empty line and a line
 /// whose first byte that is no blank is # do nothing. What can't be carried out is reported as one
-/// message, and the next line follows.
+/// message, and the next line follows. So it does when Ctrl-C ends a command, see `Interruption`,
+/// which then has not failed.
 class Console {
 public:
     /// Runs the commands of `registry` and writes to `output`, which must live as long.

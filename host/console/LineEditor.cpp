@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "host/TerminalText.hpp"
+#include "host/console/Interruption.hpp"
 
 namespace velkor::host {
 
@@ -54,6 +55,7 @@ public:
     }
 
     std::optional<std::string> read() {
+        const InterruptionPause pause;
         do {
             cancelled = false;
             int length = 0;
@@ -136,6 +138,7 @@ private:
     const std::unique_ptr<History, HistoryDeleter> lines;
     const std::unique_ptr<EditLine, EditLineDeleter> editor;
     bool cancelled = false;
+    const Interruption interruption;
 };
 
 LineEditor::LineEditor(Complete complete)

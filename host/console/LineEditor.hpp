@@ -10,9 +10,10 @@
 namespace velkor::host {
 
 /// Lines typed on the terminal at standard input, with editing, history (kept in memory) and
-/// completion by the Tab key. Ctrl-C drops the line, Ctrl-D on an empty line ends the input. The
-/// terminal is in its ordinary mode again whenever no line is being read, and when a signal ends
-/// the program meanwhile. Reads the user's own key bindings from ~/.editrc.
+/// completion by the Tab key. Ctrl-C drops the line, Ctrl-D on an empty line ends the input. While
+/// no line is being read, Ctrl-C is an `Interruption`. The terminal is in its ordinary mode again
+/// whenever no line is being read, and when a signal ends the program meanwhile. Reads the user's
+/// own key bindings from ~/.editrc.
 ///
 /// There may be one at a time. Needs the character type locale to be one of UTF-8.
 class LineEditor final : public LineSource {

@@ -20,7 +20,8 @@ public:
 
     Output(std::ostream& answerStream, Answers answerForm, std::ostream& messageStream);
 
-    /// Writes `text`, with a line feed where a text that is not empty lacks one at its end.
+    /// Writes `text`, with a line feed where a text that is not empty lacks one at its end. Once
+    /// Ctrl-C was pressed, see `Interruption`, what is left of it is dropped; that is no failure.
     void answer(std::string_view text) VELKOR_EXCLUDES(mutex);
 
     /// Writes one line of what the operator should know.

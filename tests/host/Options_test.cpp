@@ -154,7 +154,7 @@ INSTANTIATE_TEST_SUITE_P(
         UsageCase{"EmptyPath", {"--source", "n="}, "--source n=: NAME=PATH is needed"},
         UsageCase{"EmptyName", {"--source", "=p"}, "--source =p: NAME=PATH is needed"},
         UsageCase{"NothingAtAll", {"--source", ""}, "--source : NAME=PATH is needed"},
-        badSize("SizeEmpty", ""), badSize("SizeNegative", "-1"), badSize("SizeBlank", " 1"),
+        badSize("SizeNegative", "-1"), badSize("SizeBlank", " 1"),
         badSize("SizeWithoutNumber", "KiB"), badSize("SizeWithUnknownUnit", "1KB"),
         badSize("SizeWithTextBehind", "1KiBs"), badSize("SizeFractional", "0.5GiB"),
         badSize("SizeOverflowing", "18446744073709551616"),

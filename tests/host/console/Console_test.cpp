@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <csignal>
 #include <memory>
 #include <sstream>
 #include <stdexcept>
@@ -9,6 +10,7 @@
 #include <vector>
 
 #include "host/console/GivenLines.hpp"
+#include "host/console/Interruption.hpp"
 #include "host/console/LineReader.hpp"
 
 namespace velkor::host {
@@ -117,6 +119,34 @@ TEST_F(ConsoleTest, EndsWhenNobodyReadsTheAnswers) {
     answers.setstate(std::ios::badbit);
     EXPECT_TRUE(run({"count", "count"}));
     EXPECT_EQ(calls, 1);
+}
+
+TEST_F(ConsoleTest, ACommandThatIsInterruptedHasNotFailed) {
+    const Interruption interruption;
+    add("list", [](Words&&) -> std::string {
+        std::raise(SIGINT);
+        throw Interrupted();
+    });
+    EXPECT_TRUE(run({"list", "echo a"}));
+    EXPECT_EQ(messages.str(), "");
+    EXPECT_EQ(answers.str(), "\n<a>\n");
+}
+
+TEST_F(ConsoleTest, DropsTheAnswerOfACommandThatIsInterrupted) {
+    const Interruption interruption;
+    add("list", [](Words&&) {
+        std::raise(SIGINT);
+        return std::string("b");
+    });
+    EXPECT_TRUE(run({"list", "echo a"}));
+    EXPECT_EQ(answers.str(), "\n<a>\n");
+}
+
+TEST_F(ConsoleTest, AnInterruptionBetweenCommandsEndsNone) {
+    const Interruption interruption;
+    std::raise(SIGINT);
+    EXPECT_TRUE(run({"echo a"}));
+    EXPECT_EQ(answers.str(), "<a>\n");
 }
 
 TEST_F(ConsoleTest, SaysWhichLineOfTheInputFailed) {

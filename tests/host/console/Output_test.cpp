@@ -3,9 +3,12 @@
 #include <gtest/gtest.h>
 
 #include <cerrno>
+#include <csignal>
 #include <sstream>
 #include <streambuf>
 #include <string>
+
+#include "host/console/Interruption.hpp"
 
 namespace velkor::host {
 namespace {
@@ -77,6 +80,35 @@ TEST_F(OutputTest, HasAReasonWhereTheSystemGivesNone) {
     answers.setstate(std::ios::badbit);
     exact.answer("a");
     EXPECT_EQ(exact.failure(), EIO);
+}
+
+TEST_F(OutputTest, DropsAnAnswerThatIsInterruptedAndStaysOpen) {
+    const Interruption interruption;
+    std::raise(SIGINT);
+    exact.answer("a");
+    Interruption::take();
+    exact.answer("b");
+    EXPECT_EQ(answers.str(), "b\n");
+    EXPECT_TRUE(exact.isOpen());
+}
+
+// Ctrl-C is pressed while a text is written.
+class InterruptedTerminal : public std::streambuf {
+    std::streamsize xsputn(const char*, std::streamsize) override {
+        std::raise(SIGINT);
+        errno = EINTR;
+        return 0;
+    }
+};
+
+TEST_F(OutputTest, StaysOpenWhenWritingIsInterrupted) {
+    const Interruption interruption;
+    InterruptedTerminal terminal;
+    std::ostream stream(&terminal);
+    Output output(stream, Output::Answers::exact, messages);
+    output.answer("a");
+    EXPECT_TRUE(output.isOpen());
+    EXPECT_TRUE(stream.good());
 }
 
 }  // namespace
