@@ -36,15 +36,4 @@ bool Interruption::take() noexcept {
     return requested.exchange(false);
 }
 
-InterruptionPause::InterruptionPause() noexcept {
-    sigset_t interrupts;
-    sigemptyset(&interrupts);
-    sigaddset(&interrupts, SIGINT);
-    pthread_sigmask(SIG_BLOCK, &interrupts, &previous);
-}
-
-InterruptionPause::~InterruptionPause() {
-    pthread_sigmask(SIG_SETMASK, &previous, nullptr);
-}
-
 }  // namespace velkor::host

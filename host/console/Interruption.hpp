@@ -33,17 +33,4 @@ private:
     struct sigaction previous {};
 };
 
-/// Puts SIGINT off while it lives, for the thread that made it.
-class InterruptionPause {
-public:
-    InterruptionPause() noexcept;
-    ~InterruptionPause();
-
-    InterruptionPause(const InterruptionPause&) = delete;
-    InterruptionPause& operator=(const InterruptionPause&) = delete;
-
-private:
-    sigset_t previous{};
-};
-
 }  // namespace velkor::host

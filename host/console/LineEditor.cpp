@@ -11,6 +11,7 @@
 
 #include "host/TerminalText.hpp"
 #include "host/console/Interruption.hpp"
+#include "host/console/SignalPause.hpp"
 
 namespace velkor::host {
 
@@ -55,7 +56,10 @@ public:
     }
 
     std::optional<std::string> read() {
-        const InterruptionPause pause;
+        // The editing library loses the terminal's mode to SIGINT, and its own memory to a new size
+        // of the terminal in the middle of a line: it learns the size between two lines.
+        const SignalPause pause{SIGINT, SIGWINCH};
+        el_resize(editor.get());
         do {
             cancelled = false;
             int length = 0;

@@ -10,6 +10,7 @@
 #include <poll.h>
 #include <pty.h>
 #include <signal.h>
+#include <sys/ioctl.h>
 #include <sys/types.h>
 #include <termios.h>
 #include <unistd.h>
@@ -64,6 +65,14 @@ public:
             if (showsWithin(interval, text)) return true;
         }
         return false;
+    }
+
+    /// Gives the terminal another size, of which the system tells the program.
+    void resize(unsigned rows, unsigned columns) const {
+        winsize size{};
+        size.ws_row = static_cast<unsigned short>(rows);
+        size.ws_col = static_cast<unsigned short>(columns);
+        ::ioctl(keys, TIOCSWINSZ, &size);
     }
 
     /// Sends the program a signal.

@@ -5,8 +5,9 @@
 #include <cerrno>
 #include <csignal>
 
-#include <sys/wait.h>
 #include <unistd.h>
+
+#include "host/console/SignalPause.hpp"
 
 namespace velkor::host {
 namespace {
@@ -41,7 +42,7 @@ TEST(Interruption, GivesTheSignalItsFormerMeaningBack) {
 TEST(Interruption, IsPutOffByAPause) {
     const Interruption interruption;
     {
-        const InterruptionPause pause;
+        const SignalPause pause{SIGINT};
         ::raise(SIGINT);
         EXPECT_FALSE(Interruption::isRequested());
     }

@@ -123,6 +123,21 @@ TEST_F(LineEditorTest, WatchedValuesStandOnLinesOfTheirOwn) {
     EXPECT_TRUE(terminal.shows("\r\nserver.port = 1\r\nvelkor> "));
 }
 
+TEST_F(LineEditorTest, TheTerminalMayGetAnotherSizeWhileALineIsEdited) {
+    for (const unsigned columns : {2U, 10U, 80U}) {
+        terminal.resize(1, columns);
+        terminal.type(std::string(60, 'x') + "typed");
+        EXPECT_TRUE(terminal.shows("typed"));
+        terminal.resize(24, 80);
+        terminal.type("again");
+        EXPECT_TRUE(terminal.shows("again"));
+        terminal.type(controlC);
+        EXPECT_TRUE(terminal.shows("^C\r\nvelkor> "));
+    }
+    enter("get server.port");
+    EXPECT_TRUE(terminal.shows("'8080'\r\n"));
+}
+
 TEST_F(LineEditorTest, MessagesNameNoLineNumber) {
     enter("nope");
     EXPECT_TRUE(terminal.shows("velkor-config: Unknown command: nope\r\nvelkor> "));
