@@ -367,14 +367,14 @@ TEST_F(PropertyFileLocale, HostsCLocaleChangesNothing) {
 }
 
 TEST(PropertyFileSourceText, IsParsedLikeAFile) {
-    PropertyFileSource source(std::string_view("a=\\u20ac\n# b=2\nc=3"));
+    PropertyFileSource source(PropertyText{"a=\\u20ac\n# b=2\nc=3"});
     EXPECT_THAT(source.keys(), ElementsAre("a", "c"));
     EXPECT_EQ(textOf(source.get("a")), "string \u20ac");
 }
 
 TEST(PropertyFileSourceText, NeedNotLiveOn) {
     std::string text = "a=1\n";
-    PropertyFileSource source{std::string_view(text)};
+    PropertyFileSource source{PropertyText{text}};
     text.assign(text.size(), 'x');
     EXPECT_EQ(textOf(source.get("a")), "string 1");
 }
