@@ -2,19 +2,25 @@
 #include <memory>
 
 #include "configuration/ConfigurationImpl.hpp"
+#include "configuration/admin/ValueFormat.hpp"
 #include "framework/reactive_streams/CallbackSubscriber.hpp"
 
+using velkor::configuration::formatValue;
+
 int main() {
+    // A store lives in a shared pointer.
     const auto store = std::make_shared<velkor::configuration::ConfigurationImpl>();
-    // Its keys begin with "server."; order 100 is behind "override", which takes the writes.
-    store->addInMemorySource("factory", "server", 100, true, {{"port", 8080}});
+    store->addPropertyFileSource("site", "", 1000, true, "examples/site.properties");
 
     const auto watch = velkor::reactive_streams::subscribe(
-        *store->watchOption("server.port"),
-        {[](const auto& port) { std::cout << "port " << boost::get<int>(port) << '\n'; }});
+        *store->watchOption("server.port"), {[](const auto& port) {
+            formatValue(std::cout << "port ", port);
+            std::cout << '\n';
+        }});
 
-    store->set("server.port", 9090);
+    store->set("server.port", 9090);  // order 0, in front of the file
     for (const auto& layer : store->explain("server.port").get()) {
-        std::cout << layer.source << " says " << boost::get<int>(layer.value) << '\n';
+        formatValue(std::cout << layer.source << " says ", layer.value);
+        std::cout << '\n';
     }
 }

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <charconv>
 #include <iterator>
+#include <limits>
 #include <string_view>
 #include <utility>
 
@@ -20,6 +21,7 @@ constexpr const char* description =
 constexpr const char* footer =
     "Values of later sources override those of earlier ones, and what 'set' writes overrides\n"
     "them all, unless an order says otherwise: the smaller order wins.\n"
+    "SIZE is a number of bytes, also with KiB, MiB or GiB behind it.\n"
     "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
     "separated by commas.\n"
     "\n"
@@ -28,6 +30,18 @@ constexpr const char* footer =
 constexpr const char* groupSetting = "group=";
 constexpr const char* orderSetting = "order=";
 constexpr const char* writableSetting = "writable";
+
+struct SizeUnit {
+    std::string_view name;
+    std::uintmax_t bytes;
+};
+
+constexpr SizeUnit sizeUnits[] = {
+    {"", 1},
+    {"KiB", std::uintmax_t{1} << 10U},
+    {"MiB", std::uintmax_t{1} << 20U},
+    {"GiB", std::uintmax_t{1} << 30U},
+};
 
 [[noreturn]] void fail(const std::string& option, const std::string& text,
                        const std::string& reason) {
@@ -94,6 +108,8 @@ public:
         add(files, "FILE", "", "A property file, added as a read-only source.");
         add(sources, "--source", "NAME=PATH[,group=G][,order=N][,writable]",
             "A property file with all that a source has.");
+        add(fileSizes, "--max-file-size", "SIZE",
+            "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
         add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
         app.footer(footer);
@@ -117,6 +133,7 @@ public:
         }
         for (const auto& text : lines.texts) options.lines.push_back(unguarded(text));
         for (const auto& text : logs.texts) options.logs.push_back(parseLog(unguarded(text)));
+        for (const auto& text : fileSizes.texts) options.limits.fileBytes = parseFileSize(text);
         collectSources(options);
         return options;
     }
@@ -148,6 +165,7 @@ private:
     CLI::App app{description, "velkor-config"};
     Repeatable files;
     Repeatable sources;
+    Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;
 };
@@ -167,6 +185,20 @@ SourceRequest parseSource(const std::string& text) {
     SourceRequest request{parts.front().substr(0, equals), parts.front().substr(equals + 1)};
     for (std::size_t i = 1; i < parts.size(); ++i) applySetting(request, parts[i], text);
     return request;
+}
+
+std::uintmax_t parseFileSize(const std::string& text) {
+    std::uintmax_t count = 0;
+    const char* const end = text.data() + text.size();
+    const auto [unitText, error] = std::from_chars(text.data(), end, count);
+    const std::string_view unit(unitText, static_cast<std::size_t>(end - unitText));
+    const auto* const found = std::find_if(std::begin(sizeUnits), std::end(sizeUnits),
+                                           [&](const auto& each) { return each.name == unit; });
+    const bool isKnown = error == std::errc() && found != std::end(sizeUnits);
+    if (!isKnown || count > std::numeric_limits<std::uintmax_t>::max() / found->bytes) {
+        fail("--max-file-size", text, "a number of bytes is needed, such as 1048576 or 64MiB");
+    }
+    return count * found->bytes;
 }
 
 LogRequest parseLog(const std::string& text) {

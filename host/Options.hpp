@@ -1,24 +1,13 @@
 #pragma once
 
-#include <optional>
+#include <cstdint>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
+#include "host/sources/SourceRequest.hpp"
+
 namespace velkor::host {
-
-/// A property file that the user wants to be a source.
-struct SourceRequest {
-    /// Behind "override" and before "default". Among sources of one order the one added last wins,
-    /// so that files override those before them.
-    static constexpr int defaultOrder = 1000;
-
-    std::optional<std::string> name{};  ///< Nothing: one is made from the path.
-    std::string path;
-    std::string group{};
-    int order = defaultOrder;
-    bool writable = false;
-};
 
 /// A log channel and the mask of the severities that it shall write.
 struct LogRequest {
@@ -29,7 +18,8 @@ struct LogRequest {
 /// What the command line asks for.
 struct Options {
     std::vector<SourceRequest> sources{};  ///< In the order of the command line.
-    std::vector<std::string> lines{};      ///< Command lines; empty: they are read.
+    SourceLimits limits{};
+    std::vector<std::string> lines{};  ///< Command lines; empty: they are read.
     std::vector<LogRequest> logs{};
     std::string information{};  ///< What --help or --version wants shown, instead of all else.
 };
@@ -45,6 +35,9 @@ Options parseOptions(const std::vector<std::string>& arguments);
 
 /// Understands NAME=PATH[,group=G][,order=N][,writable]. Throws `UsageError`.
 SourceRequest parseSource(const std::string& text);
+
+/// Understands a number of bytes with KiB, MiB, GiB or nothing behind it. Throws `UsageError`.
+std::uintmax_t parseFileSize(const std::string& text);
 
 /// Understands CHANNEL=SEVERITIES, see `parseSeverities`. Throws `UsageError`.
 LogRequest parseLog(const std::string& text);

@@ -11,21 +11,22 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "framework/common/DiagnosticLogger.hpp"
-#include "host/CommandRegistry.hpp"
-#include "host/Completer.hpp"
-#include "host/Console.hpp"
-#include "host/GivenLines.hpp"
-#include "host/HostCommands.hpp"
-#include "host/LineEditor.hpp"
-#include "host/LineReader.hpp"
 #include "host/LogSink.hpp"
 #include "host/Options.hpp"
-#include "host/Output.hpp"
-#include "host/SendCommand.hpp"
-#include "host/SourceLoader.hpp"
-#include "host/ValueText.hpp"
-#include "host/Watches.hpp"
+#include "host/SessionStore.hpp"
+#include "host/console/CommandRegistry.hpp"
+#include "host/console/Completer.hpp"
+#include "host/console/Console.hpp"
+#include "host/console/DescriptorBuffer.hpp"
+#include "host/console/GivenLines.hpp"
+#include "host/console/HostCommands.hpp"
+#include "host/console/LineEditor.hpp"
+#include "host/console/LineReader.hpp"
+#include "host/console/Output.hpp"
+#include "host/console/ValueText.hpp"
+#include "host/console/Watches.hpp"
 #include "host/messages/MessageService.hpp"
+#include "host/sources/SourceLoader.hpp"
 
 namespace velkor::host {
 
@@ -40,21 +41,21 @@ bool isTerminal(int descriptor) {
 /// The store with everything that can be done to it on the console.
 class Session {
 public:
-    explicit Session(Output& sessionOutput)
+    Session(Output& sessionOutput, const SourceLimits& sourceLimits)
         : output(sessionOutput),
-          store(std::make_shared<ConfigurationImpl>()),
+          limits(sourceLimits),
+          store(std::make_shared<SessionStore>(limits)),
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output),
           service(store),
           storeCommands(store, registry),
-          sendCommand(service.dispatcherFor(allRequestTypes()), registry),
-          hostCommands(
-              {store, std::make_shared<Watches>(store, showValue()), [this] { console.quit(); }},
-              registry) {}
+          hostCommands({store, std::make_shared<Watches>(store, showValue()),
+                        service.dispatcherFor(allRequestTypes()), [this] { console.quit(); }},
+                       registry) {}
 
     /// Gives whether all sources could be added; reports those that could not.
     bool load(const std::vector<SourceRequest>& requests) {
-        const auto failures = loadSources(*store, requests);
+        const auto failures = loadSources(*store, requests, limits);
         for (const auto& failure : failures) output.message(failure);
         return failures.empty();
     }
@@ -87,12 +88,12 @@ private:
     }
 
     Output& output;
+    const SourceLimits limits;
     std::shared_ptr<ConfigurationImpl> store;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
     MessageService service;
     configuration::ConfigurationCommandProvider storeCommands;
-    SendCommand sendCommand;
     HostCommands hostCommands;
 };
 
@@ -110,7 +111,7 @@ ExitCode runSession(const Options& options, Output& output) {
     for (const auto& log : options.logs) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
-    Session session(output);
+    Session session(output, options.limits);
     const bool allLoaded = session.load(options.sources);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
@@ -120,7 +121,9 @@ ExitCode runSession(const Options& options, Output& output) {
 }  // namespace
 
 ExitCode runProgram(const std::vector<std::string>& arguments) {
-    Output output(std::cout,
+    DescriptorBuffer standardOutput(STDOUT_FILENO);
+    std::ostream answers(&standardOutput);
+    Output output(answers,
                   isTerminal(STDOUT_FILENO) ? Output::Answers::escaped : Output::Answers::exact,
                   std::cerr);
     ExitCode exitCode = ExitCode::fine;

@@ -2,7 +2,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <iterator>
 #include <locale>
 #include <sstream>
 #include <string>
@@ -108,9 +107,21 @@ administration::CommandHandler handlerOf(const Command& command,
     };
 }
 
-// Withdraws the first `count` commands.
-void withdraw(administration::Administration& registry, std::size_t count) {
-    for (std::size_t row = 0; row < count; ++row) registry.unregisterCommand(commands[row].name);
+administration::CommandDescriptor descriptorOf(
+    const Command& command, const std::shared_ptr<Configuration>& configuration) {
+    return {command.name, command.description, handlerOf(command, configuration),
+            command.minimumArguments, command.maximumArguments};
+}
+
+// Withdraws the first `count` commands, each whatever became of the others.
+void withdrawQuietly(administration::Administration& registry, std::size_t count) noexcept {
+    for (std::size_t row = 0; row < count; ++row) {
+        try {
+            registry.unregisterCommand(commands[row].name);
+        } catch (...) {
+            continue;
+        }
+    }
 }
 
 }  // namespace
@@ -118,22 +129,21 @@ void withdraw(administration::Administration& registry, std::size_t count) {
 ConfigurationCommandProvider::ConfigurationCommandProvider(
     std::shared_ptr<Configuration> store, std::shared_ptr<administration::Administration> registry)
     : configuration(std::move(store)), administration(std::move(registry)) {
-    std::size_t registered = 0;
+    std::size_t offered = 0;
     try {
         for (const Command& command : commands) {
-            administration->registerCommand({command.name, command.description,
-                                             handlerOf(command, configuration),
-                                             command.minimumArguments, command.maximumArguments});
-            ++registered;
+            auto descriptor = descriptorOf(command, configuration);
+            ++offered;  // a registry that throws may have taken the command nevertheless
+            administration->registerCommand(std::move(descriptor));
         }
     } catch (...) {
-        withdraw(*administration, registered);
+        withdrawQuietly(*administration, offered);
         throw;
     }
 }
 
 ConfigurationCommandProvider::~ConfigurationCommandProvider() {
-    withdraw(*administration, std::size(commands));
+    for (const Command& command : commands) administration->unregisterCommand(command.name);
     administration.reset();
     configuration.reset();
 }

@@ -24,7 +24,8 @@ namespace velkor::configuration {
 class VELKOR_EXPORT ConfigurationCommandProvider : public administration::CommandProvider {
 public:
     /// Registers set, get and list, in this order, without waiting for the registry's answers. When
-    /// the registry throws, what it took is withdrawn and the exception passes on.
+    /// memory runs out or the registry throws, each command that was offered to it is withdrawn,
+    /// the one that it threw at too, and the exception passes on.
     ConfigurationCommandProvider(std::shared_ptr<Configuration> configuration,
                                  std::shared_ptr<administration::Administration> administration);
     ConfigurationCommandProvider(const ConfigurationCommandProvider&) = delete;

@@ -2,10 +2,16 @@
 
 #include <memory>
 #include <string>
+#include <string_view>
 
 #include "configuration/sources/TableSource.hpp"
 
 namespace velkor::configuration {
+
+/// The content of a property file. Refers to it.
+struct PropertyText {
+    std::string_view content;
+};
 
 /// A read-only layer that holds the properties of one file. The file is read once, in the
 /// constructor; later changes to it are not seen. Every value is narrow text (`std::string`), byte
@@ -18,6 +24,9 @@ public:
     /// Reads the property file at `path`. Throws `std::runtime_error` "Property file could not be
     /// opened: " followed by the path in UTF-8. Content never fails; a read error ends the file.
     explicit PropertyFileSource(const std::u16string& path);
+
+    /// Takes `text` for the content of a property file, for a host that reads files its own way.
+    explicit PropertyFileSource(PropertyText text);
 
     /// Throws `std::runtime_error` "PropertyFileSource does not support writing".
     ConfigurationValue set(const std::string& key, ConfigurationValue value) override;

@@ -1,8 +1,6 @@
 #pragma once
 
-#include <cstdio>
 #include <cstdlib>
-#include <memory>
 #include <stdexcept>
 #include <string>
 #include <string_view>
@@ -11,6 +9,8 @@
 #include <signal.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include "tests/host/StreamFile.hpp"
 
 namespace velkor::host {
 
@@ -31,6 +31,7 @@ struct ChildResult {
     for (const auto& argument : arguments) argv.push_back(const_cast<char*>(argument.c_str()));
     argv.push_back(nullptr);
     ::alarm(childLifetime);
+    ::signal(SIGINT, SIG_DFL);  // a runner in the background may have it ignored
     ::execv(VELKOR_CONFIG_PROGRAM, argv.data());
     ::_exit(127);
 }
@@ -41,33 +42,6 @@ inline int waitForExit(pid_t child) {
     if (::waitpid(child, &status, 0) != child) throw std::runtime_error("no such child");
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
 }
-
-/// A file without a name that serves as a standard stream of a child.
-class StreamFile {
-public:
-    explicit StreamFile(std::string_view content = "") : file(std::tmpfile()) {
-        if (!file) throw std::runtime_error("no temporary file");
-        std::fwrite(content.data(), 1, content.size(), file.get());
-        std::rewind(file.get());
-    }
-
-    int descriptor() const { return ::fileno(file.get()); }
-
-    std::string content() const {
-        std::string text;
-        std::rewind(file.get());
-        for (int byte = std::fgetc(file.get()); byte != EOF; byte = std::fgetc(file.get())) {
-            text += static_cast<char>(byte);
-        }
-        return text;
-    }
-
-private:
-    struct Closer {
-        void operator()(std::FILE* stream) const { std::fclose(stream); }
-    };
-    std::unique_ptr<std::FILE, Closer> file;
-};
 
 /// Runs the program under test with `standardInput` as its input. A given descriptor, -1 for none
 /// at all, takes the place of its standard output.

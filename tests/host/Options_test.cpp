@@ -21,7 +21,7 @@ std::string usageError(const Words& arguments) {
 
 Words pathsOf(const Options& options) {
     Words paths;
-    for (const auto& source : options.sources) paths.push_back(source.path);
+    for (const auto& source : options.sources) paths.push_back(source.location);
     return paths;
 }
 
@@ -36,7 +36,7 @@ TEST(Options, OfNothingAreEmpty) {
 TEST(Options, AFileIsAReadOnlySourceBehindOverride) {
     const auto source = parseOptions({"a/b.properties"}).sources.at(0);
     EXPECT_EQ(source.name, std::nullopt);
-    EXPECT_EQ(source.path, "a/b.properties");
+    EXPECT_EQ(source.location, "a/b.properties");
     EXPECT_EQ(source.group, "");
     EXPECT_EQ(source.order, 1000);
     EXPECT_FALSE(source.writable);
@@ -45,7 +45,7 @@ TEST(Options, AFileIsAReadOnlySourceBehindOverride) {
 TEST(Options, ASourceSaysItInFull) {
     const auto source = parseOptions({"--source", "n=p.x,group=g,order=-5,writable"}).sources.at(0);
     EXPECT_EQ(source.name, "n");
-    EXPECT_EQ(source.path, "p.x");
+    EXPECT_EQ(source.location, "p.x");
     EXPECT_EQ(source.group, "g");
     EXPECT_EQ(source.order, -5);
     EXPECT_TRUE(source.writable);
@@ -59,7 +59,7 @@ TEST(Options, ASourceNeedsNoSettings) {
 }
 
 TEST(Options, APathMayHoldAnEqualsSign) {
-    EXPECT_EQ(parseSource("n=a=b").path, "a=b");
+    EXPECT_EQ(parseSource("n=a=b").location, "a=b");
 }
 
 TEST(Options, FilesAndSourcesKeepTheirCommonOrder) {
@@ -82,6 +82,22 @@ TEST(Options, LinesAreKeptInOrderAndAsTheyAre) {
               (Words{"set a 'b, c'", "-x", "", "list"}));
 }
 
+TEST(Options, FilesMayHave256MiBUnlessTheCommandLineSaysOtherwise) {
+    EXPECT_EQ(parseOptions({}).limits.fileBytes, 268'435'456U);
+    EXPECT_EQ(parseOptions({"--max-file-size", "1KiB", "a"}).limits.fileBytes, 1024U);
+    EXPECT_EQ(parseOptions({"--max-file-size=1", "--max-file-size=2"}).limits.fileBytes, 2U);
+}
+
+TEST(Options, AFileSizeMayHaveAUnit) {
+    EXPECT_EQ(parseFileSize("0"), 0U);
+    EXPECT_EQ(parseFileSize("12345"), 12'345U);
+    EXPECT_EQ(parseFileSize("3KiB"), 3'072U);
+    EXPECT_EQ(parseFileSize("64MiB"), 67'108'864U);
+    EXPECT_EQ(parseFileSize("1GiB"), 1'073'741'824U);
+    EXPECT_EQ(parseFileSize("18446744073709551615"), 18'446'744'073'709'551'615U);
+    EXPECT_EQ(parseFileSize("17179869183GiB"), 18'446'744'072'635'809'792U);
+}
+
 TEST(Options, LogNamesAChannelAndItsSeverities) {
     const auto logs =
         parseOptions({"--log", "velkor::configuration=debug,trace", "--log=b=24"}).logs;
@@ -94,8 +110,9 @@ TEST(Options, LogNamesAChannelAndItsSeverities) {
 
 TEST(Options, HelpDescribesEveryOption) {
     const std::string help = parseOptions({"--help"}).information;
-    for (const char* part : {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "-c LINE",
-                             "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
+    for (const char* part :
+         {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "--max-file-size SIZE",
+          "-c LINE", "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
         EXPECT_NE(help.find(part), std::string::npos) << part;
     }
 }
@@ -114,6 +131,12 @@ struct UsageCase {
     }
 };
 
+UsageCase badSize(const char* name, const std::string& size) {
+    return {name,
+            {"--max-file-size=" + size},
+            "--max-file-size " + size + ": a number of bytes is needed, such as 1048576 or 64MiB"};
+}
+
 class BadOptionsTest : public ::testing::TestWithParam<UsageCase> {};
 
 TEST_P(BadOptionsTest, AreRefusedWithAClearText) {
@@ -131,6 +154,11 @@ INSTANTIATE_TEST_SUITE_P(
         UsageCase{"EmptyPath", {"--source", "n="}, "--source n=: NAME=PATH is needed"},
         UsageCase{"EmptyName", {"--source", "=p"}, "--source =p: NAME=PATH is needed"},
         UsageCase{"NothingAtAll", {"--source", ""}, "--source : NAME=PATH is needed"},
+        badSize("SizeNegative", "-1"), badSize("SizeBlank", " 1"),
+        badSize("SizeWithoutNumber", "KiB"), badSize("SizeWithUnknownUnit", "1KB"),
+        badSize("SizeWithTextBehind", "1KiBs"), badSize("SizeFractional", "0.5GiB"),
+        badSize("SizeOverflowing", "18446744073709551616"),
+        badSize("SizeOverflowingByItsUnit", "17179869184GiB"),
         UsageCase{"UnknownSetting",
                   {"--source", "n=p,ordre=5"},
                   "--source n=p,ordre=5: unknown setting: ordre=5"},

@@ -120,13 +120,36 @@ TEST(Program, ReportsEverySourceThatCantBeLoadedAndGoesOn) {
         runProgram({"/no/a", "--source", "override=" + serviceFile, "-c", "set a 1", "-c", "list"});
     EXPECT_EQ(result.out, "a = 1\n");
     EXPECT_EQ(result.err,
-              "velkor-config: Property file could not be opened: /no/a\n"
+              "velkor-config: Property file could not be opened: /no/a: No such file or directory\n"
               "velkor-config: Source with the requested name already exists: override\n");
     EXPECT_EQ(result.exitCode, 3);
 }
 
 TEST(Program, ASourceThatCantBeLoadedDecidesTheExitStatus) {
     EXPECT_EQ(runProgram({"/no/a", "-c", "nope"}).exitCode, 3);
+}
+
+TEST(Program, StopsReadingAFileAtTheLimit) {
+    const auto result = runProgram({"--max-file-size", "1MiB", "/dev/zero", "-c", "sources"});
+    EXPECT_EQ(result.err, "velkor-config: Property file is larger than 1048576 bytes: /dev/zero\n");
+    EXPECT_EQ(result.out.find("zero"), std::string::npos);
+    EXPECT_EQ(result.exitCode, 3);
+}
+
+TEST(Program, StopsReadingAFileThatHasNoEnd) {
+    const auto result = runProgram({"/dev/zero", "-c", "set a 1", "-c", "get a"});
+    EXPECT_EQ(result.err,
+              "velkor-config: Property file is larger than 268435456 bytes: /dev/zero\n");
+    EXPECT_EQ(result.out, "1\n");
+    EXPECT_EQ(result.exitCode, 3);
+}
+
+TEST(Program, ReportsAFileThatCantBeRead) {
+    const auto result = runProgram({"/proc/self/mem", "-c", "list"});
+    EXPECT_EQ(result.err,
+              "velkor-config: Property file could not be read: /proc/self/mem: Input/output "
+              "error\n");
+    EXPECT_EQ(result.exitCode, 3);
 }
 
 TEST(Program, ShowsItsVersion) {

@@ -4,11 +4,13 @@
 #include <cstddef>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include <poll.h>
 #include <pty.h>
 #include <signal.h>
+#include <sys/ioctl.h>
 #include <sys/types.h>
 #include <termios.h>
 #include <unistd.h>
@@ -53,16 +55,24 @@ public:
     }
 
     /// Whether `text` appears after what earlier calls have waited for.
-    [[nodiscard]] bool shows(const std::string& text) {
-        const auto deadline = std::chrono::steady_clock::now() + velkor::testing::patience;
-        for (;;) {
-            const std::size_t found = screen.find(text, seen);
-            if (found != std::string::npos) {
-                seen = found + text.size();
-                return true;
-            }
-            if (std::chrono::steady_clock::now() > deadline || !readMore()) return false;
+    [[nodiscard]] bool shows(const std::string& text) { return showsWithin(patience, text); }
+
+    /// Presses `key` until `text` appears; for a key that is lost when it comes too early.
+    [[nodiscard]] bool showsAfterPressing(const std::string& key, const std::string& text) {
+        constexpr std::chrono::milliseconds interval{20};
+        for (auto waited = interval; waited < patience; waited += interval) {
+            type(key);
+            if (showsWithin(interval, text)) return true;
         }
+        return false;
+    }
+
+    /// Gives the terminal another size, of which the system tells the program.
+    void resize(unsigned rows, unsigned columns) const {
+        winsize size{};
+        size.ws_row = static_cast<unsigned short>(rows);
+        size.ws_col = static_cast<unsigned short>(columns);
+        ::ioctl(keys, TIOCSWINSZ, &size);
     }
 
     /// Sends the program a signal.
@@ -73,6 +83,16 @@ public:
         termios settings{};
         return ::tcgetattr(keys, &settings) == 0 && (settings.c_lflag & ICANON) != 0 &&
                (settings.c_lflag & ISIG) != 0;
+    }
+
+    /// Whether the terminal is ordinary, or becomes so: no line is edited.
+    [[nodiscard]] bool becomesOrdinary() const {
+        const auto deadline = std::chrono::steady_clock::now() + patience;
+        while (!isOrdinary()) {
+            if (std::chrono::steady_clock::now() > deadline) return false;
+            std::this_thread::yield();
+        }
+        return true;
     }
 
     /// Everything that has appeared.
@@ -87,11 +107,26 @@ public:
     }
 
 private:
+    using Milliseconds = std::chrono::milliseconds;
+
+    static constexpr Milliseconds patience = velkor::testing::patience;
+
+    bool showsWithin(Milliseconds limit, const std::string& text) {
+        const auto deadline = std::chrono::steady_clock::now() + limit;
+        for (;;) {
+            const std::size_t found = screen.find(text, seen);
+            if (found != std::string::npos) {
+                seen = found + text.size();
+                return true;
+            }
+            if (std::chrono::steady_clock::now() > deadline || !readMore(limit)) return false;
+        }
+    }
+
     // False at the end of the program, and when nothing appears for too long.
-    bool readMore() {
+    bool readMore(Milliseconds limit = patience) {
         pollfd ready{keys, POLLIN, 0};
-        const auto limit = std::chrono::milliseconds(velkor::testing::patience).count();
-        if (::poll(&ready, 1, static_cast<int>(limit)) != 1) return false;
+        if (::poll(&ready, 1, static_cast<int>(limit.count())) != 1) return false;
         char buffer[4096];
         const ssize_t count = ::read(keys, buffer, sizeof buffer);
         if (count <= 0) return false;

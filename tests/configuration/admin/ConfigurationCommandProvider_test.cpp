@@ -3,12 +3,14 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <cstddef>
 #include <functional>
 #include <memory>
 #include <set>
 #include <stdexcept>
 #include <string>
 #include <thread>
+#include <tuple>
 #include <type_traits>
 #include <vector>
 
@@ -448,22 +450,62 @@ TEST_F(FailingStore, ThrowForTheTextOfANumberLeavesSet) {
     EXPECT_THAT(throwsFrom("set", {"a", "5"}), ThrowsMessage<std::logic_error>(StrEq("string 5")));
 }
 
-TEST(ConfigurationCommandProvider, WithdrawsWhatAThrowingRegistryTook) {
-    class FullAdministration : public RecordingAdministration {
-    public:
-        Future<bool> registerCommand(administration::CommandDescriptor command) override {
-            if (commands.size() == 2) throw std::length_error("full");
-            return RecordingAdministration::registerCommand(std::move(command));
-        }
-    };
-    const auto registry = std::make_shared<FullAdministration>();
-    EXPECT_THROW(ConfigurationCommandProvider(std::make_shared<ConfigurationImpl>(), registry),
-                 std::length_error);
-    EXPECT_THAT(
-        registry->events,
-        ElementsAre("register velkor.configuration.set", "register velkor.configuration.get",
-                    "unregister velkor.configuration.set", "unregister velkor.configuration.get"));
+// Throws at one registration, counted from 0, before or after it took the command.
+class ThrowingAdministration : public RecordingAdministration {
+public:
+    ThrowingAdministration(std::size_t throwingRegistration, bool takesBeforeItThrows)
+        : failing(throwingRegistration), takes(takesBeforeItThrows) {}
+
+    Future<bool> registerCommand(administration::CommandDescriptor command) override {
+        const bool fails = commands.size() == failing;
+        if (!fails || takes) registered.insert(command.name);
+        auto accepted = RecordingAdministration::registerCommand(std::move(command));
+        if (fails) throw std::length_error("full");
+        return accepted;
+    }
+
+    Future<bool> unregisterCommand(const std::string& name) override {
+        registered.erase(name);
+        auto withdrawn = RecordingAdministration::unregisterCommand(name);
+        if (throwsAtWithdrawals) throw std::logic_error("no");
+        return withdrawn;
+    }
+
+    std::set<std::string> registered;
+    bool throwsAtWithdrawals = false;
+
+private:
+    const std::size_t failing;
+    const bool takes;
+};
+
+class ThrowingRegistry : public ::testing::TestWithParam<std::tuple<std::size_t, bool>> {
+protected:
+    void construct() const {
+        ConfigurationCommandProvider(std::make_shared<ConfigurationImpl>(), registry);
+    }
+
+    const std::shared_ptr<ThrowingAdministration> registry =
+        std::make_shared<ThrowingAdministration>(std::get<0>(GetParam()), std::get<1>(GetParam()));
+};
+
+TEST_P(ThrowingRegistry, KeepsNoCommand) {
+    EXPECT_THAT([this] { construct(); }, ThrowsMessage<std::length_error>(StrEq("full")));
+    EXPECT_THAT(registry->registered, IsEmpty());
 }
+
+TEST_P(ThrowingRegistry, IsAskedToWithdrawEachCommandAlsoWhenItThrowsThere) {
+    registry->throwsAtWithdrawals = true;
+    EXPECT_THAT([this] { construct(); }, ThrowsMessage<std::length_error>(StrEq("full")));
+    EXPECT_THAT(registry->registered, IsEmpty());
+}
+
+INSTANTIATE_TEST_SUITE_P(Registrations, ThrowingRegistry,
+                         ::testing::Combine(::testing::Values(0U, 1U, 2U), ::testing::Bool()),
+                         [](const auto& tested) {
+                             return std::string(std::get<1>(tested.param) ? "After" : "Before") +
+                                    std::to_string(std::get<0>(tested.param));
+                         });
 
 }  // namespace
 }  // namespace velkor::configuration

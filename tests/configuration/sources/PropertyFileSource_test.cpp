@@ -11,6 +11,7 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 #include <thread>
 #include <type_traits>
 #include <vector>
@@ -363,6 +364,19 @@ TEST_F(PropertyFileLocale, HostsCLocaleChangesNothing) {
     const Properties properties = testing::readProperties(file);
     std::setlocale(LC_ALL, "C");
     EXPECT_EQ(properties, expected);
+}
+
+TEST(PropertyFileSourceText, IsParsedLikeAFile) {
+    PropertyFileSource source(PropertyText{"a=\\u20ac\n# b=2\nc=3"});
+    EXPECT_THAT(source.keys(), ElementsAre("a", "c"));
+    EXPECT_EQ(textOf(source.get("a")), "string \u20ac");
+}
+
+TEST(PropertyFileSourceText, NeedNotLiveOn) {
+    std::string text = "a=1\n";
+    PropertyFileSource source{PropertyText{text}};
+    text.assign(text.size(), 'x');
+    EXPECT_EQ(textOf(source.get("a")), "string 1");
 }
 
 }  // namespace

@@ -1,0 +1,63 @@
+#include "host/console/Command.hpp"
+
+#include <cstdint>
+#include <limits>
+#include <utility>
+
+namespace velkor::host {
+
+namespace {
+
+// A descriptor can't say more than this, so it stands for "as many as you like".
+constexpr auto unlimited = std::numeric_limits<std::uint8_t>::max();
+
+std::string counted(unsigned count) {
+    if (count == 0) return "no arguments";
+    return std::to_string(count) + (count == 1 ? " argument" : " arguments");
+}
+
+}  // namespace
+
+std::string_view Command::shortName() const noexcept {
+    const std::string_view full = name();
+    return full.substr(full.rfind('.') + 1);
+}
+
+std::string Command::argumentText() const {
+    return traits.arguments.empty() ? limits() : traits.arguments;
+}
+
+std::vector<std::string> Command::readArguments(CommandLine& line) const {
+    std::vector<std::string> arguments;
+    while (!traits.takesRawRest || arguments.size() + 1 < descriptor.maximumArguments) {
+        auto word = line.nextWord();
+        if (!word) return arguments;
+        arguments.push_back(*std::move(word));
+    }
+    const std::string_view rest = line.takeRest();
+    if (!rest.empty()) arguments.emplace_back(rest);
+    return arguments;
+}
+
+std::string Command::run(std::vector<std::string>&& arguments) const {
+    const std::size_t count = arguments.size();
+    const bool tooMany =
+        descriptor.maximumArguments != unlimited && count > descriptor.maximumArguments;
+    if (count < descriptor.minimumArguments || tooMany) {
+        throw CommandError(name() + " takes " + limits() + "; given: " + std::to_string(count));
+    }
+    return descriptor.handler(std::move(arguments));
+}
+
+std::string Command::limits() const {
+    const unsigned least = descriptor.minimumArguments;
+    const unsigned most = descriptor.maximumArguments;
+    if (least == most) return counted(most);
+    if (most == unlimited) {
+        return least == 0 ? "any number of arguments" : "at least " + counted(least);
+    }
+    if (least == 0) return "at most " + counted(most);
+    return std::to_string(least) + " to " + counted(most);
+}
+
+}  // namespace velkor::host

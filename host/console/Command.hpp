@@ -1,0 +1,69 @@
+#pragma once
+
+#include <functional>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "framework/administration/Administration.hpp"
+#include "host/console/CommandLine.hpp"
+
+namespace velkor::host {
+
+/// A command that can't be carried out as it was typed.
+class CommandError : public std::runtime_error {
+public:
+    using std::runtime_error::runtime_error;
+};
+
+/// What the console knows of a command beyond its descriptor.
+struct CommandTraits {
+    /// The names of the arguments as help shows them; empty: help shows how many there are.
+    std::string arguments{};
+    /// The last argument is the rest of the line as it was typed, quotes and blanks included.
+    bool takesRawRest = false;
+    /// What the first argument may be, for completion; empty: a key of the store.
+    std::function<std::vector<std::string>()> suggestions{};
+};
+
+/// One command of the console. Immutable; its handler may run on several threads at once.
+class Command {
+public:
+    Command(administration::CommandDescriptor commandDescriptor, CommandTraits commandTraits)
+        : descriptor(std::move(commandDescriptor)), traits(std::move(commandTraits)) {}
+
+    const std::string& name() const noexcept { return descriptor.name; }
+    const std::string& description() const noexcept { return descriptor.description; }
+
+    /// What follows the last "." of the name; the whole name when there is none.
+    std::string_view shortName() const noexcept;
+
+    /// The arguments as help shows them: their names, or else how many there may be.
+    std::string argumentText() const;
+
+    /// What the first argument may be; not callable when that is a key.
+    const std::function<std::vector<std::string>()>& suggestions() const noexcept {
+        return traits.suggestions;
+    }
+
+    /// Whether there may be arguments at all.
+    bool takesArguments() const noexcept { return descriptor.maximumArguments > 0; }
+
+    /// The arguments of this command on `line`, whose first word has been read already. Throws
+    /// `CommandLineError`.
+    std::vector<std::string> readArguments(CommandLine& line) const;
+
+    /// Calls the handler and gives its answer. Throws `CommandError` with the name, " takes ", the
+    /// limits, "; given: " and the number when that is outside the limits; what the handler throws
+    /// passes on.
+    std::string run(std::vector<std::string>&& arguments) const;
+
+private:
+    std::string limits() const;
+
+    const administration::CommandDescriptor descriptor;
+    const CommandTraits traits;
+};
+
+}  // namespace velkor::host

@@ -1,0 +1,77 @@
+#include "host/console/Console.hpp"
+
+#include <exception>
+#include <utility>
+
+#include "host/console/CommandLine.hpp"
+#include "host/console/Interruption.hpp"
+
+namespace velkor::host {
+
+namespace {
+
+constexpr char commentMark = '#';
+
+bool isComment(const std::string& line, const CommandLine& words) {
+    return line[words.wordStart()] == commentMark;
+}
+
+/// What a handler threw, so that the message can name the command.
+std::string failureText(const Command& command) {
+    try {
+        throw;
+    } catch (const CommandError& error) {
+        return error.what();
+    } catch (const std::exception& error) {
+        return command.name() + ": " + error.what();
+    } catch (...) {
+        return command.name() + ": unknown error";
+    }
+}
+
+}  // namespace
+
+Console::Console(std::shared_ptr<const CommandRegistry> commandRegistry, Output& consoleOutput)
+    : registry(std::move(commandRegistry)), output(consoleOutput) {}
+
+bool Console::run(LineSource& lines) {
+    quitting = false;
+    bool allFine = true;
+    while (!quitting && output.isOpen()) {
+        try {
+            if (!runNext(lines)) break;
+        } catch (const std::exception& error) {
+            allFine = false;
+            output.message(lines.position() + error.what());
+        }
+        // What was interrupted may have left the cursor in the middle of a line.
+        if (Interruption::take()) output.answer("\n");
+    }
+    return allFine;
+}
+
+bool Console::runNext(LineSource& lines) {
+    const auto line = lines.nextLine();
+    Interruption::take();  // what came before the command is not about it
+    if (line) execute(*line);
+    return line.has_value();
+}
+
+void Console::execute(const std::string& line) {
+    CommandLine words(line);
+    const auto name = words.nextWord();
+    if (!name || isComment(line, words)) return;
+    const auto command = registry->find(*name);
+    auto arguments = command->readArguments(words);
+    std::string answer;
+    try {
+        answer = command->run(std::move(arguments));
+    } catch (const Interrupted&) {
+        return;
+    } catch (...) {
+        throw CommandError(failureText(*command));
+    }
+    output.answer(answer);
+}
+
+}  // namespace velkor::host

@@ -1,0 +1,39 @@
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include "host/console/CommandRegistry.hpp"
+#include "host/console/LineSource.hpp"
+#include "host/console/Output.hpp"
+
+namespace velkor::host {
+
+/// Carries out command lines, one after the other, on the thread that calls it.
+///
+/// A line is a command and its arguments, split as `CommandLine` says. An empty line and a line
+/// whose first byte that is no blank is # do nothing. What can't be carried out is reported as one
+/// message, and the next line follows. So it does when Ctrl-C ends a command, see `Interruption`,
+/// which then has not failed.
+class Console {
+public:
+    /// Runs the commands of `registry` and writes to `output`, which must live as long.
+    Console(std::shared_ptr<const CommandRegistry> registry, Output& output);
+
+    /// Carries out `lines` until there are no more, `quit` is called or nobody reads the answers.
+    /// Gives whether every line could be carried out.
+    bool run(LineSource& lines);
+
+    /// Ends `run` after the line that is being carried out. For a handler to call.
+    void quit() noexcept { quitting = true; }
+
+private:
+    bool runNext(LineSource& lines);
+    void execute(const std::string& line);
+
+    std::shared_ptr<const CommandRegistry> registry;
+    Output& output;
+    bool quitting = false;
+};
+
+}  // namespace velkor::host

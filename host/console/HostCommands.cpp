@@ -1,0 +1,140 @@
+#include "host/console/HostCommands.hpp"
+
+#include <cstdint>
+#include <iterator>
+#include <utility>
+
+#include "host/console/SendCommand.hpp"
+#include "host/console/Table.hpp"
+#include "host/console/ValueText.hpp"
+
+namespace velkor::host {
+
+namespace {
+
+using Arguments = std::vector<std::string>;
+
+/// What a handler works on. The registry is held weakly, since it holds the handlers.
+struct Context {
+    HostServices services;
+    std::weak_ptr<CommandRegistry> registry;
+};
+
+std::string showSources(const Context& context, const Arguments&) {
+    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS"}};
+    for (const auto& source : context.services.store->describeSources().get()) {
+        rows.push_back({source.name, source.group.empty() ? "-" : source.group,
+                        std::to_string(source.order), source.readOnly ? "read-only" : "writable"});
+    }
+    return formatTable(rows);
+}
+
+std::string explain(const Context& context, const Arguments& arguments) {
+    const auto options = context.services.store->explain(arguments.at(0)).get();
+    if (options.empty()) return "No configuration option with key: " + arguments.at(0);
+    std::vector<std::vector<std::string>> rows;
+    rows.reserve(options.size());
+    for (const auto& option : options) {
+        rows.push_back(
+            {rows.empty() ? "effective" : "overridden", option.source, valueText(option.value)});
+    }
+    return formatTable(rows);
+}
+
+std::string watch(const Context& context, const Arguments& arguments) {
+    if (context.services.watches->add(arguments.at(0))) return "";
+    throw CommandError("Watched already: " + arguments.at(0));
+}
+
+std::string unwatch(const Context& context, const Arguments& arguments) {
+    if (context.services.watches->remove(arguments.at(0))) return "";
+    throw CommandError("Not watched: " + arguments.at(0));
+}
+
+std::string helpFor(const Command& command) {
+    std::string text = command.name() + ' ' + '(' + command.argumentText() + ")\n";
+    if (command.shortName() != command.name()) {
+        text += "Short: " + std::string(command.shortName()) + '\n';
+    }
+    return text + command.description() + '\n';
+}
+
+std::string help(const Context& context, const Arguments& arguments) {
+    const auto registry = context.registry.lock();
+    if (!registry) return "";
+    if (!arguments.empty()) return helpFor(*registry->find(arguments.at(0)));
+    std::vector<std::vector<std::string>> rows;
+    for (const auto& command : registry->commands()) {
+        rows.push_back({command->name(), command->argumentText(), command->description()});
+    }
+    return formatTable(rows) + "A command may be called by the last word of its name.\n";
+}
+
+std::string quit(const Context& context, const Arguments&) {
+    context.services.quit();
+    return "";
+}
+
+std::string send(const Context& context, const Arguments& arguments) {
+    return sendMessage(*context.services.messages, arguments);
+}
+
+std::vector<std::string> suggestCommands(const Context& context) {
+    const auto registry = context.registry.lock();
+    return registry ? registry->names() : std::vector<std::string>();
+}
+
+std::vector<std::string> suggestRequests(const Context&) {
+    return requestTypes();
+}
+
+struct HostCommand {
+    const char* name;
+    const char* argumentNames;
+    const char* description;
+    std::string (*run)(const Context&, const Arguments&);
+    std::uint8_t minimumArguments;
+    std::uint8_t maximumArguments;
+    bool takesRawRest = false;
+    std::vector<std::string> (*suggest)(const Context&) = nullptr;
+};
+
+constexpr HostCommand commands[] = {
+    {"sources", "", "List the sources in order of precedence.", showSources, 0, 0},
+    {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
+    {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
+    {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
+    {"send", "TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2, true,
+     suggestRequests},
+    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
+     suggestCommands},
+    {"quit", "", "End the session.", quit, 0, 0},
+};
+
+CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
+                                        const std::shared_ptr<const Context>& context) {
+    const auto handler = [run = command.run, context](Arguments&& arguments) {
+        return run(*context, arguments);
+    };
+    CommandTraits traits{command.argumentNames, command.takesRawRest};
+    if (command.suggest != nullptr) {
+        traits.suggestions = [suggest = command.suggest, context] { return suggest(*context); };
+    }
+    return std::make_shared<const Command>(
+        administration::CommandDescriptor{command.name, command.description, handler,
+                                          command.minimumArguments, command.maximumArguments},
+        std::move(traits));
+}
+
+}  // namespace
+
+HostCommands::HostCommands(HostServices services,
+                           const std::shared_ptr<CommandRegistry>& registry) {
+    const auto context = std::make_shared<const Context>(Context{std::move(services), registry});
+    registrations.reserve(std::size(commands));
+    for (const HostCommand& command : commands) {
+        registrations.emplace_back(registry, makeCommand(command, context));
+    }
+}
+
+}  // namespace velkor::host

@@ -1,0 +1,47 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <vector>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "framework/administration/CommandProvider.hpp"
+#include "host/console/CommandRegistration.hpp"
+#include "host/console/Watches.hpp"
+#include "host/messages/MessageDispatcher.hpp"
+
+namespace velkor::host {
+
+/// What the host's own commands work on. No member is empty.
+struct HostServices {
+    std::shared_ptr<configuration::ConfigurationImpl> store;
+    std::shared_ptr<Watches> watches;
+    std::shared_ptr<const MessageDispatcher> messages;
+    std::function<void()> quit;  ///< Ends the session.
+};
+
+/// Keeps the host's own commands registered while it lives:
+///
+/// - sources: a table of all sources in order of precedence.
+/// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
+///   is the effective one.
+/// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.
+/// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest
+///   of the line as it was typed.
+/// - help [COMMAND], quit.
+///
+/// Handlers share the services, so they may run after this object is gone. Called with too few
+/// arguments they throw `std::out_of_range`.
+class HostCommands final : public administration::CommandProvider {
+public:
+    /// Registers the commands in this order; a name that is taken stays with its owner. When this
+    /// throws, none of them is left registered.
+    HostCommands(HostServices services, const std::shared_ptr<CommandRegistry>& registry);
+    HostCommands(const HostCommands&) = delete;
+    HostCommands& operator=(const HostCommands&) = delete;
+
+private:
+    std::vector<CommandRegistration> registrations;
+};
+
+}  // namespace velkor::host

@@ -1,0 +1,39 @@
+#include "host/console/Interruption.hpp"
+
+#include <atomic>
+
+namespace velkor::host {
+
+namespace {
+
+std::atomic<bool> requested{false};
+static_assert(std::atomic<bool>::is_always_lock_free, "a signal handler sets it");
+
+void request(int) {
+    requested = true;
+}
+
+}  // namespace
+
+Interruption::Interruption() noexcept {
+    requested = false;
+    struct sigaction action {};
+    action.sa_handler = request;  // without SA_RESTART: a system call that waits gives up
+    sigemptyset(&action.sa_mask);
+    sigaction(SIGINT, &action, &previous);
+}
+
+Interruption::~Interruption() {
+    sigaction(SIGINT, &previous, nullptr);
+    requested = false;
+}
+
+bool Interruption::isRequested() noexcept {
+    return requested;
+}
+
+bool Interruption::take() noexcept {
+    return requested.exchange(false);
+}
+
+}  // namespace velkor::host

@@ -1,0 +1,39 @@
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <string>
+
+#include "host/console/Completer.hpp"
+#include "host/console/LineSource.hpp"
+
+namespace velkor::host {
+
+/// Lines typed on the terminal at standard input, with editing, history (kept in memory) and
+/// completion by the Tab key. Ctrl-C drops the line, Ctrl-D on an empty line ends the input. While
+/// no line is being read, Ctrl-C is an `Interruption`. The terminal is in its ordinary mode again
+/// whenever no line is being read, and when a signal ends the program meanwhile. Reads the user's
+/// own key bindings from ~/.editrc.
+///
+/// There may be one at a time. Needs the character type locale to be one of UTF-8.
+class LineEditor final : public LineSource {
+public:
+    /// What may follow the given text before the cursor.
+    using Complete = std::function<Completion(const std::string&)>;
+
+    /// Takes over the terminal. Throws `std::runtime_error` "The terminal can't be used for line
+    /// editing.".
+    explicit LineEditor(Complete complete);
+    ~LineEditor() override;
+
+    LineEditor(const LineEditor&) = delete;
+    LineEditor& operator=(const LineEditor&) = delete;
+
+    std::optional<std::string> nextLine() override;
+
+private:
+    class Session;
+    std::unique_ptr<Session> session;
+};
+
+}  // namespace velkor::host

@@ -1,0 +1,22 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "host/messages/MessageDispatcher.hpp"
+
+namespace velkor::host {
+
+/// Delivers the message that `arguments`, TYPE [JSON], describe and gives the reply as one line,
+/// the type and the JSON text.
+///
+/// TYPE is the name of a message type, or its last word; JSON is {} when there is none. A request
+/// without a reply throws `CommandError` with the dispatcher's text; one without a TYPE
+/// `std::out_of_range`.
+std::string sendMessage(const MessageDispatcher& dispatcher,
+                        const std::vector<std::string>& arguments);
+
+/// The last words of the types that can be sent.
+std::vector<std::string> requestTypes();
+
+}  // namespace velkor::host

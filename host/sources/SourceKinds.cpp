@@ -1,0 +1,38 @@
+#include "host/sources/SourceKinds.hpp"
+
+#include <algorithm>
+#include <filesystem>
+#include <iterator>
+#include <stdexcept>
+
+#include "host/sources/PropertyFile.hpp"
+
+namespace velkor::host {
+
+namespace {
+
+std::string stemOfPath(const SourceRequest& request) {
+    return std::filesystem::path(request.location).stem().string();
+}
+
+std::shared_ptr<configuration::ConfigurationSource> makeFile(const SourceRequest& request,
+                                                             const SourceLimits& limits) {
+    return loadPropertyFile(request.location, limits);
+}
+
+constexpr SourceKind kinds[] = {
+    {"file", stemOfPath, makeFile},
+};
+
+}  // namespace
+
+const SourceKind& sourceKind(std::string_view name) {
+    const auto* const found = std::find_if(std::begin(kinds), std::end(kinds),
+                                           [&](const auto& kind) { return kind.name == name; });
+    if (found == std::end(kinds)) {
+        throw std::invalid_argument("Unknown kind of source: " + std::string(name));
+    }
+    return *found;
+}
+
+}  // namespace velkor::host

@@ -1,0 +1,63 @@
+#include "host/sources/SourceLoader.hpp"
+
+#include <exception>
+#include <new>
+#include <set>
+
+#include "host/sources/SourceKinds.hpp"
+
+namespace velkor::host {
+
+namespace {
+
+/// Gives each source without a name one that no other source has.
+class SourceNames {
+public:
+    explicit SourceNames(const std::vector<SourceRequest>& requests) {
+        for (const auto& request : requests) {
+            if (request.name) taken.insert(*request.name);
+        }
+    }
+
+    std::string nameOf(const SourceRequest& request) {
+        if (request.name) return *request.name;
+        const std::string usual = sourceKind(request.kind).usualName(request);
+        std::string name = usual;
+        for (unsigned number = 2; !taken.insert(name).second; ++number) {
+            name = usual + '-' + std::to_string(number);
+        }
+        return name;
+    }
+
+private:
+    std::set<std::string> taken{"override", "default"};  // the store's own
+};
+
+void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
+                const SourceRequest& request, const SourceLimits& limits) {
+    store
+        .addSource(name, request.group, request.order, !request.writable,
+                   sourceKind(request.kind).make(request, limits))
+        .get();
+}
+
+}  // namespace
+
+std::vector<std::string> loadSources(configuration::ConfigurationImpl& store,
+                                     const std::vector<SourceRequest>& requests,
+                                     const SourceLimits& limits) {
+    std::vector<std::string> failures;
+    SourceNames names(requests);
+    for (const auto& request : requests) {
+        try {
+            loadSource(store, names.nameOf(request), request, limits);
+        } catch (const std::bad_alloc&) {
+            failures.push_back("Out of memory while loading: " + request.location);
+        } catch (const std::exception& error) {
+            failures.emplace_back(error.what());
+        }
+    }
+    return failures;
+}
+
+}  // namespace velkor::host

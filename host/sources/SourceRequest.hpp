@@ -1,0 +1,30 @@
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace velkor::host {
+
+/// A source that the user wants.
+struct SourceRequest {
+    /// Behind "override" and before "default". Among sources of one order the one added last wins,
+    /// so that files override those before them.
+    static constexpr int defaultOrder = 1000;
+
+    std::optional<std::string> name{};  ///< Nothing: one is made from the location.
+    std::string location;               ///< Where its values are: for a file its path.
+    std::string group{};
+    int order = defaultOrder;
+    bool writable = false;
+    std::string kind = "file";  ///< See `sourceKind`.
+};
+
+/// What the making of a source may cost.
+struct SourceLimits {
+    static constexpr std::uintmax_t usualFileBytes = std::uintmax_t{256} << 20U;
+
+    std::uintmax_t fileBytes = usualFileBytes;  ///< The largest file that is read.
+};
+
+}  // namespace velkor::host

@@ -1,0 +1,162 @@
+#include "host/console/HostCommands.hpp"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "configuration/admin/ConfigurationCommandProvider.hpp"
+#include "host/console/ValueText.hpp"
+#include "tests/support/Thrown.hpp"
+
+namespace velkor::host {
+namespace {
+
+using velkor::testing::thrownText;
+using Words = std::vector<std::string>;
+
+const Words hostNames{"sources", "explain", "watch", "unwatch", "send", "help", "quit"};
+
+class HostCommandsTest : public ::testing::Test {
+protected:
+    HostServices services() {
+        const auto show = [this](const auto& key, const auto& value) {
+            shown.push_back(optionText(key, value));
+        };
+        return {store, std::make_shared<Watches>(store, show), nullptr,
+                [this] { quitting = true; }};
+    }
+
+    std::string run(const std::string& name, Words arguments = {}) {
+        return registry->find(name)->run(std::move(arguments));
+    }
+
+    std::shared_ptr<configuration::ConfigurationImpl> store =
+        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
+    Words shown;
+    bool quitting = false;
+    HostCommands commands{services(), registry};
+};
+
+TEST_F(HostCommandsTest, AreRegisteredInOrder) {
+    EXPECT_EQ(registry->names(), hostNames);
+}
+
+TEST_F(HostCommandsTest, AreWithdrawnWithTheirOwner) {
+    const auto other = std::make_shared<CommandRegistry>();
+    { const HostCommands shortLived(services(), other); }
+    EXPECT_EQ(other->names(), Words{});
+}
+
+class HostCommandNameTest : public HostCommandsTest,
+                            public ::testing::WithParamInterface<std::string> {};
+
+TEST_P(HostCommandNameTest, StaysWithTheCommandThatHasItAlready) {
+    const auto other = std::make_shared<CommandRegistry>();
+    other->registerCommand({GetParam(), "", [](Words&&) { return std::string("mine"); }, 0, 0});
+    { const HostCommands shortLived(services(), other); }
+    EXPECT_EQ(other->names(), Words{GetParam()});
+    EXPECT_EQ(other->find(GetParam())->run({}), "mine");
+}
+
+TEST_P(HostCommandNameTest, StaysWithACommandThatGotItLater) {
+    const auto other = std::make_shared<CommandRegistry>();
+    {
+        const HostCommands shortLived(services(), other);
+        other->unregisterCommand(GetParam());
+        other->registerCommand({GetParam(), "", [](Words&&) { return std::string("mine"); }, 0, 0});
+    }
+    EXPECT_EQ(other->names(), Words{GetParam()});
+}
+
+INSTANTIATE_TEST_SUITE_P(Names, HostCommandNameTest, ::testing::ValuesIn(hostNames),
+                         [](const auto& tested) { return tested.param; });
+
+TEST_F(HostCommandsTest, KeepNothingAliveThroughTheRegistry) {
+    const std::weak_ptr<CommandRegistry> weak = [this] {
+        const auto other = std::make_shared<CommandRegistry>();
+        const HostCommands shortLived(services(), other);
+        return std::weak_ptr<CommandRegistry>(other);
+    }();
+    EXPECT_TRUE(weak.expired());
+}
+
+TEST_F(HostCommandsTest, SourcesListsThemInOrderOfPrecedence) {
+    store->addInMemorySource("site", "server", 5, true, {});
+    EXPECT_EQ(run("sources"),
+              "NAME      GROUP    ORDER       ACCESS\n"
+              "override  -        0           writable\n"
+              "site      server.  5           read-only\n"
+              "default   -        2147483647  writable\n");
+}
+
+TEST_F(HostCommandsTest, ExplainShowsTheEffectiveValueFirst) {
+    store->addInMemorySource("site", "server", 5, true, {{"port", std::string("80")}});
+    store->set("server.port", 1);
+    store->set("server.port", 0.5, "default");
+    EXPECT_EQ(run("explain", {"server.port"}),
+              "effective   override  1\n"
+              "overridden  site      '80'\n"
+              "overridden  default   0.5\n");
+}
+
+TEST_F(HostCommandsTest, ExplainSaysWhenNoSourceHoldsTheKey) {
+    EXPECT_EQ(run("explain", {"a"}), "No configuration option with key: a");
+}
+
+TEST_F(HostCommandsTest, WatchShowsValuesUntilUnwatch) {
+    store->set("a", 1);
+    EXPECT_EQ(run("watch", {"a"}), "");
+    store->set("a", 2);
+    EXPECT_EQ(run("unwatch", {"a"}), "");
+    store->set("a", 3);
+    EXPECT_EQ(shown, (Words{"a = 1", "a = 2"}));
+}
+
+TEST_F(HostCommandsTest, WatchRefusesAKeyThatIsWatched) {
+    run("watch", {"a"});
+    EXPECT_EQ(thrownText<CommandError>([&] { run("watch", {"a"}); }), "Watched already: a");
+}
+
+TEST_F(HostCommandsTest, UnwatchRefusesAKeyThatIsNotWatched) {
+    EXPECT_EQ(thrownText<CommandError>([&] { run("unwatch", {"a"}); }), "Not watched: a");
+}
+
+TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {
+    const configuration::ConfigurationCommandProvider storeCommands(store, registry);
+    const std::string help = run("help");
+    EXPECT_NE(help.find("explain                    KEY                      Show every source"),
+              std::string::npos);
+    EXPECT_NE(help.find("velkor.configuration.set   2 arguments              Set a configuration "
+                        "value.\n"),
+              std::string::npos);
+}
+
+TEST_F(HostCommandsTest, HelpDescribesOneCommand) {
+    const configuration::ConfigurationCommandProvider storeCommands(store, registry);
+    EXPECT_EQ(run("help", {"get"}),
+              "velkor.configuration.get (1 argument)\n"
+              "Short: get\n"
+              "Get a specific configuration value.\n");
+    EXPECT_EQ(run("help", {"watch"}),
+              "watch (KEY)\nShow the value of a key now and whenever it changes.\n");
+}
+
+TEST_F(HostCommandsTest, HelpRefusesAnUnknownCommand) {
+    EXPECT_THROW(run("help", {"nope"}), CommandError);
+}
+
+TEST_F(HostCommandsTest, HelpSuggestsCommandNames) {
+    EXPECT_EQ(registry->find("help")->suggestions()(), registry->names());
+}
+
+TEST_F(HostCommandsTest, QuitEndsTheSession) {
+    EXPECT_EQ(run("quit"), "");
+    EXPECT_TRUE(quitting);
+}
+
+}  // namespace
+}  // namespace velkor::host

@@ -1,0 +1,93 @@
+#include "host/console/SendCommand.hpp"
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "host/console/HostCommands.hpp"
+#include "host/messages/MessageService.hpp"
+#include "tests/support/Thrown.hpp"
+
+namespace velkor::host {
+namespace {
+
+using velkor::testing::thrownText;
+using Words = std::vector<std::string>;
+
+class SendCommandTest : public ::testing::Test {
+protected:
+    std::string send(Words arguments) { return registry->find("send")->run(std::move(arguments)); }
+
+    std::shared_ptr<configuration::ConfigurationImpl> store =
+        std::make_shared<configuration::ConfigurationImpl>();
+    MessageService service{store};
+    std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
+    HostCommands commands{{store, std::make_shared<Watches>(store, [](const auto&, const auto&) {}),
+                           service.dispatcherFor(allRequestTypes()), [] {}},
+                          registry};
+};
+
+TEST_F(SendCommandTest, ShowsTypeAndContentOfTheReply) {
+    store->set("a", 1);
+    EXPECT_EQ(send({"velkor/configuration/ConfigurationGet", R"({"key":"a"})"}),
+              "velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"a","source":"override","value":{"type":"int","value":1}})");
+}
+
+TEST_F(SendCommandTest, TakesTheLastWordOfATypeName) {
+    EXPECT_EQ(send({"ConfigurationGet", R"({"key":"a"})"}),
+              "velkor/configuration/ConfigurationOptionResponse {}");
+}
+
+TEST_F(SendCommandTest, NeedsNoContent) {
+    EXPECT_EQ(send({"ConfigurationKeys"}),
+              R"(velkor/configuration/ConfigurationKeysResponse {"keys":[]})");
+}
+
+TEST_F(SendCommandTest, ChangesTheStore) {
+    send({"ConfigurationSet", R"({"key":"a","value":{"type":"string","value":"it's"}})"});
+    EXPECT_EQ(boost::get<std::string>(store->get("a").get()), "it's");
+}
+
+TEST_F(SendCommandTest, RefusesAnUnknownType) {
+    EXPECT_EQ(thrownText<CommandError>([&] {
+                  send({"Nope", "{}"});
+              }),
+              "Unknown message type: velkor/configuration/Nope");
+}
+
+TEST_F(SendCommandTest, RefusesATypeThatIsNoRequest) {
+    EXPECT_EQ(thrownText<CommandError>([&] { send({"ConfigurationKeysResponse"}); }),
+              "Message type not allowed: velkor/configuration/ConfigurationKeysResponse");
+}
+
+TEST_F(SendCommandTest, RefusesContentThatIsNoJsonObject) {
+    EXPECT_THROW(send({"ConfigurationGet", "[]"}), CommandError);
+}
+
+TEST_F(SendCommandTest, ReportsARefusalOfTheService) {
+    const char* const request = R"({"key":"a","source":"nobody"})";
+    EXPECT_EQ(thrownText<CommandError>([&] {
+                  send({"ConfigurationSet", request});
+              }),
+              "Source not found or not writable: a, nobody");
+}
+
+TEST_F(SendCommandTest, TakesTheContentAsItWasTyped) {
+    CommandLine line(R"(ConfigurationGet  {"key": "a  'b"} )");
+    EXPECT_EQ(registry->find("send")->readArguments(line),
+              (Words{"ConfigurationGet", R"({"key": "a  'b"})"}));
+}
+
+TEST_F(SendCommandTest, SuggestsTheTypesOfRequests) {
+    EXPECT_EQ(registry->find("send")->suggestions()(),
+              (Words{"ConfigurationSet", "ConfigurationGet", "ConfigurationKeys",
+                     "AddPropertyFileSource"}));
+}
+
+}  // namespace
+}  // namespace velkor::host

@@ -1,0 +1,46 @@
+#include "host/sources/SourceKinds.hpp"
+
+#include <gtest/gtest.h>
+
+#include <optional>
+#include <stdexcept>
+#include <string>
+
+#include "tests/support/TemporaryFile.hpp"
+#include "tests/support/Thrown.hpp"
+
+namespace velkor::host {
+namespace {
+
+using velkor::testing::TemporaryFile;
+using velkor::testing::thrownText;
+
+SourceRequest requestFor(const std::string& location) {
+    return {std::nullopt, location};
+}
+
+TEST(SourceKinds, FileIsTheKindOfARequestThatNamesNone) {
+    EXPECT_EQ(requestFor("a").kind, sourceKind("file").name);
+}
+
+TEST(SourceKinds, FileMakesASourceOfThePropertiesThere) {
+    const TemporaryFile file("a=1\n");
+    EXPECT_TRUE(sourceKind("file").make(requestFor(file.path().string()), {})->has("a"));
+}
+
+TEST(SourceKinds, FileKeepsTheLimit) {
+    const SourceLimits limits{10};
+    EXPECT_THROW(sourceKind("file").make(requestFor("/dev/zero"), limits), std::runtime_error);
+}
+
+TEST(SourceKinds, FileIsCalledLikeItselfWithoutFolderAndLastExtension) {
+    EXPECT_EQ(sourceKind("file").usualName(requestFor("/a/b.c.properties")), "b.c");
+}
+
+TEST(SourceKinds, OthersAreRefused) {
+    EXPECT_EQ(thrownText<std::invalid_argument>([] { sourceKind("fil"); }),
+              "Unknown kind of source: fil");
+}
+
+}  // namespace
+}  // namespace velkor::host
