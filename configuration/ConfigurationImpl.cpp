@@ -1,6 +1,5 @@
 #include "configuration/ConfigurationImpl.hpp"
 
-#include <exception>
 #include <limits>
 #include <stdexcept>
 #include <typeinfo>
@@ -20,16 +19,9 @@ namespace velkor::configuration {
 namespace {
 
 using detail::ChangeList;
-using detail::KeyBuffer;
 using detail::Lookup;
 using detail::StoreLock;
 using detail::WatchList;
-using detail::WatchPublisher;
-
-template <class T, class Error = std::runtime_error>
-Future<T> failed(const std::string& message) {
-    return makeFailedFuture<T>(std::make_exception_ptr(Error(message)));
-}
 
 }  // namespace
 
@@ -97,12 +89,12 @@ Future<std::set<std::string>> ConfigurationImpl::keys() {
 
 std::shared_ptr<reactive_streams::PublisherAPI<ConfigurationValue>> ConfigurationImpl::watchOption(
     const std::string& key) {
-    std::shared_ptr<WatchPublisher> publisher;
+    std::shared_ptr<detail::WatchPublisher> publisher;
     ConfigurationValue current;
     {
         const Operation operation(*this, "watchOption: ", key);
         const std::uint64_t streamId = nextStreamId.fetch_add(1);
-        publisher = std::make_shared<WatchPublisher>(1, forgetting(streamId));
+        publisher = std::make_shared<detail::WatchPublisher>(1, forgetting(streamId));
         publishers->add(publisher, key, streamId);
         updateHasForeignCode();
         const Lookup layer(sources, key);
@@ -229,7 +221,7 @@ Future<ConfigurationValue> ConfigurationImpl::write(const detail::RegisteredSour
                                                     const std::string& key,
                                                     ConfigurationValue&& value) {
     storeLogger.write(common::debug, "set: ", key, "@", target.name);
-    KeyBuffer buffer(sources.keyBuffers());
+    detail::KeyBuffer buffer(sources.keyBuffers());
     const bool tells = target.reportsChanges;
     auto answer =
         makeReadyFuture(target.source->set(buffer.within(target.group, key), std::move(value)));

@@ -2,7 +2,6 @@
 // forgetting, and the stream of changes.
 
 #include <algorithm>
-#include <exception>
 #include <iterator>
 #include <stdexcept>
 #include <string_view>
@@ -39,11 +38,6 @@ private:
 using detail::ChangeList;
 using detail::ChangePublisher;
 using detail::Transaction;
-
-template <class T>
-Future<T> refused(const std::string& message) {
-    return makeFailedFuture<T>(std::make_exception_ptr(std::runtime_error(message)));
-}
 
 void serve(detail::StoreLock::Level& level, ChangeList::Due& due) {
     if (!due.empty()) level.releasedWhile([&] { due.serve(); });
@@ -86,7 +80,7 @@ Future<bool> ConfigurationImpl::unset(const std::string& key, const std::string&
 Future<bool> ConfigurationImpl::forget(const Change& change,
                                        const detail::RegisteredSource* target) {
     const std::string refusal = detail::refusalOf(change, target);
-    if (!refusal.empty()) return refused<bool>(refusal);
+    if (!refusal.empty()) return failed<bool>(refusal);
     storeLogger.write(common::debug, "unset: ", change.key, "@", target->name);
     detail::KeyBuffer buffer(sources.keyBuffers());
     const bool tells = target->reportsChanges;
@@ -102,7 +96,7 @@ Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Ch
     Transaction transaction(sources, changes);
     const std::string refusals = transaction.refusals();
     if (!refusals.empty()) {
-        return refused<std::vector<AppliedChange>>(store_errors::changesRefused + refusals);
+        return failed<std::vector<AppliedChange>>(store_errors::changesRefused + refusals);
     }
     const auto& outcome = transaction.outcome();
     if (dryRun) return makeReadyFuture(outcome);
