@@ -24,6 +24,7 @@ TEST(LogSink, WritesOnlyWhatIsEnabled) {
     const common::DiagnosticLogger logger("velkor::host::enabled");
     std::ostringstream out;
     const LogSink sink(out);
+    common::DiagnosticLogger::enable("velkor::host::enabled", common::error);
     logger.write(common::trace, "before");
     common::DiagnosticLogger::enable("velkor::host::enabled", common::trace);
     logger.write(common::trace, "after");

@@ -1,4 +1,9 @@
 #!/bin/sh
-# check_files.sh PREFIX EXPECTED: fails unless exactly the files listed in EXPECTED are in PREFIX.
+# check_files.sh PREFIX LIST...: fails unless exactly the files of the lists are in PREFIX.
 set -eu
-find "$1" ! -type d -printf '%P\n' | LC_ALL=C sort | diff -u "$2" -
+prefix=$1
+shift
+found=$(mktemp)
+trap 'rm -f "$found"' EXIT
+find "$prefix" ! -type d -printf '%P\n' | LC_ALL=C sort >"$found"
+LC_ALL=C sort -- "$@" | diff -u - "$found"

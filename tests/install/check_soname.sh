@@ -5,5 +5,5 @@ set -eu
 readelf=$1 folder=$2 number=$3
 shift 3
 for library; do
-    "$readelf" -d "$folder/lib$library.so" | grep -F "[lib$library.so.$number]"
+    "$readelf" -d "$folder/libvelkor-$library.so" | grep -F "[libvelkor-$library.so.$number]"
 done

@@ -1,0 +1,5 @@
+#include "framework/Number.hpp"
+
+int velkor::number() {
+    return 6;
+}

@@ -1,0 +1,5 @@
+#include "spare/Product.hpp"
+
+int velkor::product() {
+    return number() * IMAGINARY_UNIT;
+}

@@ -1,0 +1,7 @@
+#pragma once
+
+namespace velkor {
+
+__attribute__((visibility("default"))) int twice();
+
+}  // namespace velkor
