@@ -39,16 +39,14 @@ using velkor::testing::ValueSpeller;
 /// of a size, the number of an enumerator, all digits of a number.
 template <class T>
 std::string spelled(const T& value) {
-    if constexpr (std::is_same_v<T, bool>) {
-        return ValueSpeller()(value);
-    } else if constexpr (std::is_floating_point_v<T>) {
+    if constexpr (std::is_floating_point_v<T>) {
         std::ostringstream digits;
         digits.imbue(std::locale::classic());
         digits << std::setprecision(17) << value;
         return digits.str();
     } else if constexpr (std::is_enum_v<T>) {
         return std::to_string(static_cast<int>(value));
-    } else if constexpr (std::is_integral_v<T>) {
+    } else if constexpr (std::is_integral_v<T> && !std::is_same_v<T, bool>) {
         return std::to_string(value);
     } else {
         return ValueSpeller()(value);
