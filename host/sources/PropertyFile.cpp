@@ -75,8 +75,7 @@ std::string readFile(const std::string& path, std::uintmax_t mostBytes) {
 std::shared_ptr<configuration::PropertyFileSource> loadPropertyFile(const std::string& path,
                                                                     const SourceLimits& limits) {
     const std::string text = readFile(path, limits.fileBytes);
-    return std::make_shared<configuration::PropertyFileSource>(
-        configuration::PropertyText{text});
+    return std::make_shared<configuration::PropertyFileSource>(configuration::PropertyText{text});
 }
 
 }  // namespace velkor::host

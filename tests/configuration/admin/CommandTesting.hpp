@@ -39,7 +39,7 @@ public:
     std::vector<administration::CommandDescriptor> commands;
 };
 
-/// The three commands over a store.
+/// The commands over a store.
 class CommandTest : public ::testing::Test {
 protected:
     using Arguments = std::vector<std::string>;

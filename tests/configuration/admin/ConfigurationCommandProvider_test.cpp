@@ -69,7 +69,8 @@ TEST_F(CommandRegistration, DescribesList) {
 }
 
 TEST_F(CommandRegistration, HandlersShareTheStore) {
-    EXPECT_EQ(store.use_count(), 5) << "the test, the provider and three handlers";
+    const long handlers = static_cast<long>(registry->commands.size());
+    EXPECT_EQ(store.use_count(), 2 + handlers) << "the test, the provider and the handlers";
 }
 
 TEST_F(CommandRegistration, ProviderReleasesTheRegistryAndTheStore) {
@@ -127,7 +128,7 @@ TEST_F(CommandRegistration, ProviderMayBeDestroyedWhileAHandlerRuns) {
     source->whenHas = [this] { provider.reset(); };
     EXPECT_EQ(run("get", {"a"}), "1");
     EXPECT_EQ(provider, nullptr);
-    EXPECT_EQ(registry->events.size(), 6U);
+    EXPECT_EQ(registry->events.size(), 2 * registry->commands.size());
 }
 
 // A registry whose answers never come, or fail.
@@ -142,7 +143,7 @@ public:
         return makeFailedFuture<bool>(std::make_exception_ptr(std::runtime_error("refused")));
     }
 
-    int calls = 0;
+    std::size_t calls = 0;
     std::vector<Promise<bool>> pending;
 };
 
@@ -150,7 +151,7 @@ TEST_F(CommandRegistration, AnswersOfTheRegistryAreNotWaitedFor) {
     const auto silent = std::make_shared<SilentAdministration>();
     EXPECT_TRUE(testing::completes(
         [this, silent] { const ConfigurationCommandProvider local(store, silent); }));
-    EXPECT_EQ(silent->calls, 6);
+    EXPECT_EQ(silent->calls, 2 * registry->commands.size());
 }
 
 using GetCommand = testing::CommandTest;

@@ -7,12 +7,13 @@
 #include <set>
 #include <stdexcept>
 #include <string>
-#include <typeindex>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
 #include "configuration/service/ConfigurationMessages.hpp"
 #include "tests/configuration/service/JsonForms.hpp"
+#include "tests/configuration/service/MessageClasses.hpp"
 #include "tests/support/ValueText.hpp"
 
 namespace velkor::configuration {
@@ -41,28 +42,25 @@ protected:
     std::shared_ptr<RecordingSerializer> registry = std::make_shared<RecordingSerializer>();
 };
 
-TEST_F(Registration, NamesTheSixTypesInOrder) {
+TEST_F(Registration, NamesTheTypesInOrder) {
     const ConfigurationJsonSerialization registration(registry);
-    EXPECT_EQ(registry->calls, each("register", 6));
+    EXPECT_EQ(registry->calls, each("register", names.size()));
 }
 
 TEST_F(Registration, PairsEachNameWithItsClass) {
     const ConfigurationJsonSerialization registration(registry);
-    const std::vector<std::type_index> types{typeid(ConfigurationSet),
-                                             typeid(ConfigurationGet),
-                                             typeid(ConfigurationKeys),
-                                             typeid(ConfigurationKeysResponse),
-                                             typeid(ConfigurationOptionResponse),
-                                             typeid(AddPropertyFileSource)};
-    for (std::size_t i = 0; i < types.size(); ++i) {
-        EXPECT_EQ(registry->forms.at(types[i]).name, names[i]);
-    }
+    forEachMessageType([&](const auto& type) {
+        using Class = typename std::decay_t<decltype(type)>::Class;
+        EXPECT_EQ(registry->forms.at(typeid(Class)).name, type.name());
+    });
 }
 
 TEST_F(Registration, IsWithdrawnInTheSameOrder) {
     { const ConfigurationJsonSerialization registration(registry); }
-    registry->calls.erase(registry->calls.begin(), registry->calls.begin() + 6);
-    EXPECT_EQ(registry->calls, each("unregister", 6));
+    auto expected = each("register", names.size());
+    const auto withdrawals = each("unregister", names.size());
+    expected.insert(expected.end(), withdrawals.begin(), withdrawals.end());
+    EXPECT_EQ(registry->calls, expected);
 }
 
 TEST_F(Registration, KeepsTheRegistryAlive) {
@@ -287,10 +285,7 @@ TEST_F(MessageJson, ScalarMembersConvert) {
 template <class M>
 class AnyMessageJson : public MessageJson {};
 
-using AllMessages =
-    ::testing::Types<ConfigurationSet, ConfigurationGet, ConfigurationKeys,
-                     ConfigurationKeysResponse, ConfigurationOptionResponse, AddPropertyFileSource>;
-TYPED_TEST_SUITE(AnyMessageJson, AllMessages, );
+TYPED_TEST_SUITE(AnyMessageJson, velkor::testing::EveryMessageClass, );
 
 TYPED_TEST(AnyMessageJson, NullObjectReadsLikeAnEmptyOne) {
     EXPECT_EQ(this->forms.toText(std::move(*this->forms.template fromObject<TypeParam>(nullptr))),

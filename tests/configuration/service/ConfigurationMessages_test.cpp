@@ -10,11 +10,14 @@
 #include <vector>
 
 #include "configuration/service/ConfigurationServiceProvider.hpp"
+#include "tests/configuration/service/MessageClasses.hpp"
 #include "tests/support/ValueText.hpp"
 
 namespace velkor::configuration {
 namespace {
 
+using velkor::testing::EveryMessageClass;
+using velkor::testing::EveryRequestClass;
 using velkor::testing::textOf;
 
 /// Notes which of its operations was called, and with what; keeps the request if told to.
@@ -74,9 +77,7 @@ protected:
     std::shared_ptr<NotingProvider> provider = std::make_shared<NotingProvider>();
 };
 
-using Requests =
-    ::testing::Types<ConfigurationGet, ConfigurationSet, ConfigurationKeys, AddPropertyFileSource>;
-TYPED_TEST_SUITE(Request, Requests, );
+TYPED_TEST_SUITE(Request, EveryRequestClass, );
 
 TYPED_TEST(Request, ReachesItsOperationAndNoOther) {
     auto* const request = new TypeParam;
@@ -105,10 +106,7 @@ TYPED_TEST(Request, IsAMessageForConfigurationServices) {
 template <class M>
 class EveryMessage : public ::testing::Test {};
 
-using Messages =
-    ::testing::Types<ConfigurationGet, ConfigurationSet, ConfigurationKeys, AddPropertyFileSource,
-                     ConfigurationOptionResponse, ConfigurationKeysResponse>;
-TYPED_TEST_SUITE(EveryMessage, Messages, );
+TYPED_TEST_SUITE(EveryMessage, EveryMessageClass, );
 
 TYPED_TEST(EveryMessage, IsAMovableValueWithAVirtualDestructor) {
     EXPECT_TRUE(std::is_nothrow_move_constructible_v<TypeParam>);

@@ -2,7 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <boost/core/demangle.hpp>
 #include <string>
+#include <type_traits>
+#include <typeinfo>
 #include <vector>
 
 namespace velkor::configuration {
@@ -11,15 +14,15 @@ namespace {
 using Names = std::vector<std::string>;
 
 TEST(MessageTypes, AreNamedAfterTheirClasses) {
+    forEachMessageType([](const auto& type) {
+        using Class = typename std::decay_t<decltype(type)>::Class;
+        EXPECT_EQ("velkor::configuration::" + std::string(type.shortName),
+                  boost::core::demangle(typeid(Class).name()));
+    });
+}
+
+TEST(MessageTypes, AreRegisteredUnderTheirPrefixAndName) {
     EXPECT_EQ(messageTypeOf<ConfigurationSet>.name(), "velkor/configuration/ConfigurationSet");
-    EXPECT_EQ(messageTypeOf<ConfigurationGet>.name(), "velkor/configuration/ConfigurationGet");
-    EXPECT_EQ(messageTypeOf<ConfigurationKeys>.name(), "velkor/configuration/ConfigurationKeys");
-    EXPECT_EQ(messageTypeOf<ConfigurationKeysResponse>.name(),
-              "velkor/configuration/ConfigurationKeysResponse");
-    EXPECT_EQ(messageTypeOf<ConfigurationOptionResponse>.name(),
-              "velkor/configuration/ConfigurationOptionResponse");
-    EXPECT_EQ(messageTypeOf<AddPropertyFileSource>.name(),
-              "velkor/configuration/AddPropertyFileSource");
 }
 
 TEST(MessageTypes, AreVisitedInTheirOrder) {

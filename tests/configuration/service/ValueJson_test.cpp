@@ -5,6 +5,7 @@
 #include <cmath>
 #include <limits>
 #include <ostream>
+#include <set>
 #include <string>
 #include <typeinfo>
 #include <vector>
@@ -105,6 +106,12 @@ const std::vector<Case> cases{
 
 INSTANTIATE_TEST_SUITE_P(Kinds, ValueObject, ::testing::ValuesIn(cases),
                          [](const auto& tested) { return tested.param.name; });
+
+TEST(ValueObjects, AreTestedOfEveryKind) {
+    std::set<int> kinds;
+    for (const Case& tested : cases) kinds.insert(tested.value.which());
+    EXPECT_EQ(kinds.size(), typeTags.size());
+}
 
 class ValueJson : public ::testing::Test {
 protected:

@@ -99,6 +99,7 @@ TEST_F(WatchOption, EveryKindOfValueIsDelivered) {
                                                 std::vector<double>{1.5},
                                                 std::vector<std::string>{"a", "b"},
                                                 std::vector<std::u16string>{u"c"}};
+    ASSERT_EQ(kinds.size(), configuration::typeTags.size());
     for (const auto& value : kinds) store->set("key", value).get();
     EXPECT_TRUE(started.subscriber->values == kinds) << ::testing::PrintToString(started.values());
 }
