@@ -5,6 +5,7 @@
 #include <set>
 #include <string>
 #include <type_traits>
+#include <utility>
 
 #include "configuration/ConfigurationValue.hpp"
 #include "configuration/Option.hpp"
@@ -29,9 +30,8 @@ class VELKOR_EXPORT Configuration {
                                            std::is_same_v<std::decay_t<Text>, char*>>;
 
     template <class Path>
-    using EnableForPath =
-        std::enable_if_t<std::is_convertible_v<const Path&, std::filesystem::path> &&
-                         !std::is_convertible_v<const Path&, std::u16string>>;
+    using EnableForPath = std::enable_if_t<std::is_convertible_v<Path&&, std::filesystem::path> &&
+                                           !std::is_convertible_v<Path&&, std::u16string>>;
 
 public:
     virtual ~Configuration();
@@ -59,7 +59,8 @@ public:
 
     /// As above, with the characters up to the NUL that ends `text` as narrow text. Chosen for
     /// character literals and pointers to characters, which would become a bool otherwise. A null
-    /// pointer throws `std::invalid_argument` "A text must not be null.".
+    /// pointer throws `std::invalid_argument` "A text must not be null.". A class that overrides
+    /// `set` says `using Configuration::set`, or hides this.
     template <class Text, class = EnableForText<Text>>
     Future<ConfigurationValue> set(const std::string& key, Text&& text) {
         return set(key, ConfigurationValue(narrowText(text)));
@@ -107,8 +108,9 @@ public:
     /// As above, for a `std::filesystem::path` and what converts to one. The path is UTF-8.
     template <class Path, class = EnableForPath<Path>>
     Future<bool> addPropertyFileSource(const std::string& name, const std::string& group, int order,
-                                       bool readOnly, const Path& path) {
-        return addPropertyFileSource(name, group, order, readOnly, wideText(path));
+                                       bool readOnly, Path&& path) {
+        return addPropertyFileSource(name, group, order, readOnly,
+                                     wideText(std::forward<Path>(path)));
     }
 
     /// Adds a source that holds `values`; gives true. Fails with `std::invalid_argument` "Source

@@ -7,6 +7,7 @@
 
 #include "configuration/Loggers.hpp"
 #include "configuration/StoreErrors.hpp"
+#include "configuration/detail/AwaitedReport.hpp"
 #include "configuration/detail/ChangeList.hpp"
 #include "configuration/detail/Lookup.hpp"
 #include "configuration/detail/StoreOperation.hpp"
@@ -158,7 +159,7 @@ Future<bool> ConfigurationImpl::removeSource(const std::string& name) {
     const auto keys = entry->source->keys();
     const std::string prefix = entry->group;
     storeLock.retire(sources.list());
-    sources.erase(name);
+    sources.erase(*entry);
     version.fetch_add(1, std::memory_order_release);
     updateHasForeignCode();
     tellStreams(operation.mutexLevel(), prefix, keys);
@@ -222,11 +223,14 @@ Future<ConfigurationValue> ConfigurationImpl::write(const detail::RegisteredSour
                                                     ConfigurationValue&& value) {
     storeLogger.write(common::debug, "set: ", key, "@", target.name);
     detail::KeyBuffer buffer(sources.keyBuffers());
-    const bool tells = target.reportsChanges;
-    auto answer =
-        makeReadyFuture(target.source->set(buffer.within(target.group, key), std::move(value)));
-    if (!tells) reportChange("", key);
-    return answer;
+    const std::string& relativeKey = buffer.within(target.group, key);
+    if (target.reportsChanges) {
+        return makeReadyFuture(target.source->set(relativeKey, std::move(value)));
+    }
+    const detail::AwaitedReport report(awaited, key);
+    ConfigurationValue answer = target.source->set(relativeKey, std::move(value));
+    if (!report.hasCome()) reportChange("", key);
+    return makeReadyFuture(std::move(answer));
 }
 
 std::function<void()> ConfigurationImpl::forgetting(std::uint64_t streamId) {

@@ -22,6 +22,7 @@
 namespace velkor::configuration {
 
 namespace detail {
+class AwaitedReport;
 class ChangeList;
 class WatchList;
 }  // namespace detail
@@ -74,7 +75,7 @@ public:
     /// Fails with `std::invalid_argument` "Source with the requested name already exists: " and the
     /// name. A null source throws `std::invalid_argument` "A configuration source must not be
     /// null." before anything else happens. What the source throws, and lack of memory, leaves the
-    /// call; the source may be registered by then, without a listener.
+    /// call; the source may be registered by then, with or without a listener.
     ///
     /// The listener is installed last. As long as there is none, watchers are told of what is
     /// written to the source through the store by the store itself.
@@ -178,6 +179,8 @@ private:
     std::unique_ptr<detail::ChangeList> changeStreams VELKOR_GUARDED_BY(storeLock);
     // Where changes are collected instead of being told while several are made together.
     std::vector<std::string>* deferred VELKOR_GUARDED_BY(storeLock) = nullptr;
+    // What writes to sources without a listener wait for.
+    detail::AwaitedReport* awaited VELKOR_GUARDED_BY(storeLock) = nullptr;
     // Grows with every change. Counted by sources that change by themselves without the mutex.
     std::atomic<std::uint64_t> version{0};
     // There are watchers or sources of other libraries. Read without the mutex by the listeners.

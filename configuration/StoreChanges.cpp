@@ -10,6 +10,7 @@
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/StoreErrors.hpp"
+#include "configuration/detail/AwaitedReport.hpp"
 #include "configuration/detail/ChangeList.hpp"
 #include "configuration/detail/Lookup.hpp"
 #include "configuration/detail/StoreOperation.hpp"
@@ -83,10 +84,10 @@ Future<bool> ConfigurationImpl::forget(const Change& change,
     if (!refusal.empty()) return failed<bool>(refusal);
     storeLogger.write(common::debug, "unset: ", change.key, "@", target->name);
     detail::KeyBuffer buffer(sources.keyBuffers());
-    const bool tells = target->reportsChanges;
+    const detail::AwaitedReport report(awaited, change.key);
     const bool known =
         target->forgetting->unset(buffer.within(target->group, change.key)).has_value();
-    if (known && !tells) reportChange("", change.key);
+    if (known && !target->reportsChanges && !report.hasCome()) reportChange("", change.key);
     return makeReadyFuture(known);
 }
 
@@ -123,6 +124,7 @@ void ConfigurationImpl::onSourceChanged(const std::string& group, const std::str
     Operation operation(*this);
     detail::KeyBuffer buffer(sources.keyBuffers());
     const std::string& fullKey = buffer.joined(group, key);
+    detail::AwaitedReport::note(awaited, fullKey);
     if (deferred != nullptr) return deferred->push_back(fullKey);
     if (!changeStreams->empty()) {
         ChangeList::Due due;

@@ -11,11 +11,6 @@ namespace {
 
 constexpr char groupSeparator = '.';
 
-const ValueTable* tableOf(const ConfigurationSource& source) {
-    const auto* const tableSource = dynamic_cast<const TableSource*>(&source);
-    return tableSource == nullptr ? nullptr : tableSource->table();
-}
-
 auto isCalled(const std::string& name) {
     return [&name](const auto& entry) { return entry->name == name; };
 }
@@ -29,8 +24,14 @@ std::string normalisedGroup(std::string group) {
 
 RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
     : ConfigurationSourceMap(std::move(entry)),
-      table(tableOf(*source)),
-      forgetting(dynamic_cast<ForgettingSource*>(source.get())) {}
+      table(nullptr),
+      forgetting(dynamic_cast<ForgettingSource*>(source.get())),
+      foreign(true) {
+    if (const auto* const answering = dynamic_cast<const TableSource*>(source.get())) {
+        table = answering->table();
+        foreign = !answering->isBuiltIn();
+    }
+}
 
 SourceRegistry::SourceRegistry() : current(std::make_shared<SourceList>()) {}
 
@@ -50,9 +51,11 @@ std::shared_ptr<RegisteredSource> SourceRegistry::insert(ConfigurationSourceMap 
     return added;
 }
 
-void SourceRegistry::erase(const std::string& name) {
+void SourceRegistry::erase(const RegisteredSource& entry) {
     SourceList changed = *current;
-    changed.erase(std::remove_if(changed.begin(), changed.end(), isCalled(name)), changed.end());
+    changed.erase(std::remove_if(changed.begin(), changed.end(),
+                                 [&](const auto& present) { return present.get() == &entry; }),
+                  changed.end());
     replace(std::move(changed));
 }
 
@@ -66,22 +69,37 @@ const RegisteredSource* SourceRegistry::firstWritable(const std::string& key,
 }
 
 Layer SourceRegistry::firstHolder(const std::string& key, KeyBuffer& buffer) const {
-    Layer first;
-    visitHolders(key, buffer, [&](const Layer& layer) {
-        first = layer;
-        return true;
-    });
-    return first;
+    return nextHolder(current->data(), current->data() + current->size(), key, buffer);
 }
 
 std::vector<Option> SourceRegistry::holders(const std::string& key) {
     KeyBuffer buffer(buffers);
+    const auto layers = current;
+    const SourcePtr* const end = layers->data() + layers->size();
+    const SourcePtr* from = layers->data();
     std::vector<Option> all;
-    visitHolders(key, buffer, [&](const Layer& layer) {
+    while (const Layer layer = nextHolder(from, end, key, buffer)) {
         all.emplace_back(key, layer.entry->name, layer.value());
-        return false;
-    });
+        from = layer.next;
+    }
     return all;
+}
+
+// The walk: the first layer from `from` on that holds `key`.
+Layer SourceRegistry::nextHolder(const SourcePtr* from, const SourcePtr* end,
+                                 const std::string& key, KeyBuffer& buffer) {
+    for (; from != end; ++from) {
+        const RegisteredSource& entry = **from;
+        if (!entry.appliesTo(key)) continue;
+        const std::string& relativeKey = buffer.within(entry.group, key);
+        if (entry.table != nullptr) {
+            const ConfigurationValue* held = entry.table->find(relativeKey);
+            if (held != nullptr) return {&entry, &relativeKey, held, from + 1};
+        } else if (entry.source->has(relativeKey)) {
+            return {&entry, &relativeKey, nullptr, from + 1};
+        }
+    }
+    return {};
 }
 
 std::vector<SourceDescription> SourceRegistry::describe() const {
@@ -113,10 +131,12 @@ std::set<std::string> SourceRegistry::keys() const {
 }
 
 void SourceRegistry::replace(SourceList changed) {
-    const bool nowForeign = std::any_of(changed.begin(), changed.end(),
-                                        [](const auto& entry) { return entry->table == nullptr; });
-    current = std::make_shared<const SourceList>(std::move(changed));
-    foreign = nowForeign;
+    const auto next = std::make_shared<const SourceList>(std::move(changed));
+    current = next;
+    foreign =
+        std::any_of(next->begin(), next->end(), [](const auto& entry) { return entry->foreign; });
+    asked = std::any_of(next->begin(), next->end(),
+                        [](const auto& entry) { return entry->table == nullptr; });
 }
 
 }  // namespace velkor::configuration::detail

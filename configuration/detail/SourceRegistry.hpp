@@ -30,6 +30,7 @@ struct RegisteredSource : ConfigurationSourceMap {
 
     const ValueTable* table;       ///< What it answers from; null: the source itself is asked.
     ForgettingSource* forgetting;  ///< The source, if keys can be taken out of it; else null.
+    bool foreign;                  ///< It is not of one of this library's own classes.
     bool reportsChanges = false;   ///< The store's listener is installed.
 };
 
@@ -39,6 +40,7 @@ struct Layer {
     const RegisteredSource* entry = nullptr;
     const std::string* relativeKey = nullptr;
     const ConfigurationValue* held = nullptr;
+    const std::shared_ptr<RegisteredSource>* next = nullptr;  ///< Where the walk goes on.
 
     ConfigurationValue value() const { return held ? *held : entry->source->get(*relativeKey); }
     explicit operator bool() const { return entry != nullptr; }
@@ -49,7 +51,8 @@ struct Layer {
 /// list that it began with, which whoever changes the registry keeps alive (see `list`).
 class SourceRegistry {
 public:
-    using SourceList = std::vector<std::shared_ptr<RegisteredSource>>;
+    using SourcePtr = std::shared_ptr<RegisteredSource>;
+    using SourceList = std::vector<SourcePtr>;
 
     /// A registry without sources.
     SourceRegistry();
@@ -58,8 +61,11 @@ public:
     /// who calls `insert` or `erase`.
     const std::shared_ptr<const SourceList>& list() const noexcept { return current; }
 
-    /// Whether there are sources that don't answer from a table.
+    /// Whether there are sources that run code of others: not one of this library's own classes.
     bool hasForeignSources() const noexcept { return foreign; }
+
+    /// Whether there are sources that see it when they are asked: that answer from no table.
+    bool hasAskedSources() const noexcept { return asked; }
 
     /// The source called `name`, or null.
     const RegisteredSource* find(const std::string& name) const;
@@ -67,8 +73,8 @@ public:
     /// Adds `entry` in front of the sources of the same or a greater order.
     std::shared_ptr<RegisteredSource> insert(ConfigurationSourceMap entry);
 
-    /// Removes the source called `name`, if there is one.
-    void erase(const std::string& name);
+    /// Removes `entry`, if it is still there.
+    void erase(const RegisteredSource& entry);
 
     /// The first writable source whose group begins `key`, of those called `sourceName` if that is
     /// not null; or null.
@@ -77,20 +83,6 @@ public:
 
     /// The layer that decides `key`, if any. Lives as long as `buffer` and the list.
     Layer firstHolder(const std::string& key, KeyBuffer& buffer) const;
-
-    /// Calls `visit` with each layer that holds `key`, in order of precedence, until it gives true.
-    template <class Visit>
-    void visitHolders(const std::string& key, KeyBuffer& buffer, Visit&& visit) const {
-        const SourceList& layers = *current;
-        for (const auto& entry : layers) {
-            if (!entry->appliesTo(key)) continue;
-            const std::string& relativeKey = buffer.within(entry->group, key);
-            const ConfigurationValue* held =
-                entry->table ? entry->table->find(relativeKey) : nullptr;
-            if (held == nullptr && (entry->table || !entry->source->has(relativeKey))) continue;
-            if (visit(Layer{entry.get(), &relativeKey, held})) return;
-        }
-    }
 
     /// Strings for keys with a group removed or added.
     KeyBufferPool& keyBuffers() noexcept { return buffers; }
@@ -105,10 +97,13 @@ public:
     std::set<std::string> keys() const;
 
 private:
+    static Layer nextHolder(const SourcePtr* from, const SourcePtr* end, const std::string& key,
+                            KeyBuffer& buffer);
     void replace(SourceList changed);
 
     std::shared_ptr<const SourceList> current;
     bool foreign = false;
+    bool asked = false;
     KeyBufferPool buffers;
 };
 

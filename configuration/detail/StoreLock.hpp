@@ -58,17 +58,13 @@ class VELKOR_SCOPED_CAPABILITY StoreLock::Level {
 public:
     /// Takes a level. Throws `std::system_error` when the system refuses.
     explicit Level(StoreLock& storeLock) VELKOR_ACQUIRE(storeLock)
-        : owner(storeLock), own(storeLock.mutex), lock(own) {
-        ++owner.levels;
-    }
+        : owner(storeLock), own(storeLock.mutex), lock(own), outermost(owner.levels++ == 0) {}
 
     /// Counts the level that `callers` holds already, and goes on holding afterwards. What is let
     /// go of meanwhile stays until the mutex is released by `releasedWhile` or by another level.
     Level(StoreLock& storeLock, std::unique_lock<std::recursive_mutex>& callers)
         VELKOR_ACQUIRE(storeLock)
-        : owner(storeLock), lock(callers) {
-        ++owner.levels;
-    }
+        : owner(storeLock), lock(callers), outermost(owner.levels++ == 0) {}
 
     ~Level() VELKOR_RELEASE() {
         if (--owner.levels == 0 && own.owns_lock()) released.swap(owner.retired);
@@ -76,6 +72,9 @@ public:
 
     Level(const Level&) = delete;
     Level& operator=(const Level&) = delete;
+
+    /// Whether this thread had no level before this one.
+    bool isOutermost() const noexcept { return outermost; }
 
     /// Runs `f` with this level of the mutex released, and takes it back, whatever `f` throws.
     /// Throws `std::system_error` when the caller's lock can't be released or taken.
@@ -114,6 +113,7 @@ private:
     StoreLock& owner;
     std::unique_lock<std::recursive_mutex> own;
     std::unique_lock<std::recursive_mutex>& lock;
+    const bool outermost;
 };
 
 }  // namespace velkor::configuration::detail

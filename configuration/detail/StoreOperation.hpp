@@ -16,8 +16,8 @@ Future<T> failed(const std::string& text) {
     return makeFailedFuture<T>(std::make_exception_ptr(Error(text)));
 }
 
-/// One operation: a level of the store's mutex, and a reference to the store where foreign code,
-/// which may give up all others, can run meanwhile.
+/// One operation: a level of the store's mutex. The outermost one holds a reference to the store
+/// where foreign code, which may give up all others, can run meanwhile.
 class VELKOR_SCOPED_CAPABILITY ConfigurationImpl::Operation {
 public:
     /// Begins an operation of `store`. `record`, if any, is logged before the mutex is taken.
@@ -25,7 +25,7 @@ public:
     explicit Operation(ConfigurationImpl& store, const Record&... record)
         VELKOR_ACQUIRE(store.storeLock)
         : keepAlive(announced(store, record...)), level(store.storeLock) {
-        if (keepAlive == nullptr && store.foreignCodeMayRun()) {
+        if (keepAlive == nullptr && level.isOutermost() && store.foreignCodeMayRun()) {
             keepAlive = store.weak_from_this().lock();
         }
     }

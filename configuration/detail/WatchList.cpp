@@ -59,7 +59,7 @@ void WatchList::update(StoreLock::Level& level, SourceRegistry& sources,
                        const std::string& key) const {
     storeLogger.write(common::debug, "updatePublishers: ", key);
     // Reading a value for nobody is left out where neither the log nor a source would show it.
-    const bool noticed = sources.hasForeignSources() || storeLogger.isEnabled(common::debug);
+    const bool noticed = sources.hasAskedSources() || storeLogger.isEnabled(common::debug);
     Publishers watchers;
     if (!noticed) {
         watchers = watching(key);

@@ -5,7 +5,7 @@
 namespace velkor::configuration {
 
 InMemorySource::InMemorySource(ValueMap&& initialValues)
-    : TableSource(typeid(InMemorySource), std::move(initialValues)) {}
+    : TableSource(typeid(InMemorySource), std::move(initialValues), Origin::thisLibrary) {}
 
 ConfigurationValue InMemorySource::set(const std::string& key, ConfigurationValue value) {
     if (ConfigurationValue* present = values.find(key)) {
@@ -20,11 +20,8 @@ ConfigurationValue InMemorySource::set(const std::string& key, ConfigurationValu
 }
 
 std::optional<ConfigurationValue> InMemorySource::unset(const std::string& key) {
-    ConfigurationValue* const present = values.find(key);
-    if (present == nullptr) return std::nullopt;
-    std::optional<ConfigurationValue> removed(std::move(*present));
-    values.erase(key);
-    notify(key);
+    auto removed = values.take(key);
+    if (removed) notify(key);
     return removed;
 }
 

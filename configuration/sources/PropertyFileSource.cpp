@@ -56,10 +56,10 @@ ValueMap readProperties(const std::u16string& path) {
 }  // namespace
 
 PropertyFileSource::PropertyFileSource(const std::u16string& path)
-    : TableSource(typeid(PropertyFileSource), readProperties(path)) {}
+    : TableSource(typeid(PropertyFileSource), readProperties(path), Origin::thisLibrary) {}
 
 PropertyFileSource::PropertyFileSource(PropertyText text)
-    : TableSource(typeid(PropertyFileSource), parseProperties(text.content)) {}
+    : TableSource(typeid(PropertyFileSource), parseProperties(text.content), Origin::thisLibrary) {}
 
 ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValue) {
     throw std::runtime_error(store_errors::writingNotSupported);

@@ -5,7 +5,13 @@
 namespace velkor::configuration {
 
 TableSource::TableSource(const std::type_info& answeringClass, ValueMap&& initialValues)
-    : values(std::move(initialValues)), answering(answeringClass) {}
+    : TableSource(answeringClass, std::move(initialValues), Origin::others) {}
+
+TableSource::TableSource(const std::type_info& answeringClass, ValueMap&& initialValues,
+                         Origin origin)
+    : values(std::move(initialValues)),
+      answering(answeringClass),
+      builtIn(origin == Origin::thisLibrary) {}
 
 TableSource::~TableSource() = default;
 

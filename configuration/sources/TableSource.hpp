@@ -32,6 +32,9 @@ public:
         return typeid(*this) == answering ? &values : nullptr;
     }
 
+    /// Whether this is exactly one of the classes of this library, which run no code of others.
+    bool isBuiltIn() const noexcept { return builtIn && table() != nullptr; }
+
 protected:
     /// Takes over `initialValues`, which is left empty. Starts without a listener. `answeringClass`
     /// is the `typeid` of the deriving class, whose `has` and `get` are those of this base.
@@ -45,7 +48,15 @@ protected:
     ValueTable values;
 
 private:
+    friend class InMemorySource;
+    friend class PropertyFileSource;
+
+    enum class Origin { thisLibrary, others };
+
+    TableSource(const std::type_info& answeringClass, ValueMap&& initialValues, Origin origin);
+
     const std::type_info& answering;
+    const bool builtIn;
     ChangeListener listener;
 };
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <optional>
 #include <set>
 #include <stdexcept>
 #include <string>
@@ -41,8 +42,12 @@ public:
         entries.emplace(key, std::move(value));
     }
 
-    /// Removes `key`; gives whether it was there.
-    bool erase(const std::string& key) { return entries.erase(key) != 0; }
+    /// Removes `key` and gives its value, if it was there.
+    std::optional<ConfigurationValue> take(const std::string& key) {
+        auto entry = entries.extract(key);
+        if (entry.empty()) return std::nullopt;
+        return std::move(entry.mapped());
+    }
 
     /// All keys, sorted byte by byte.
     std::set<std::string> keys() const {

@@ -177,6 +177,15 @@ TEST_F(Reentrancy, KeysMayRemoveItsOwnSourceDuringItsRemoval) {
     EXPECT_TRUE(isFree());
 }
 
+TEST_F(Reentrancy, KeysMayReplaceItsOwnSourceDuringItsRemoval) {
+    early->whenKeys = once([&] {
+        store->removeSource("early");
+        add("early", "", -7, {{"c", 1}});
+    });
+    EXPECT_TRUE(store->removeSource("early").get());
+    EXPECT_EQ(valueOf("c"), "int 1");
+}
+
 TEST_F(Reentrancy, KeysMayRemoveItsOwnSourceDuringItsRegistration) {
     const auto source = std::make_shared<HookedSource>(HookedSource::Table{{"c", 1}});
     source->whenKeys = once([&] { store->removeSource("new"); });

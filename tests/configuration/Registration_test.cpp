@@ -76,6 +76,32 @@ TEST_F(Registration, HiddenWriteToASourceWithoutAListenerTellsWhatIsEffective) {
     EXPECT_THAT(watched.values(), ElementsAre("int 7", "int 7"));
 }
 
+TEST_F(Registration, SourceThatKeptAListenerOfTheStoreIsToldOnce) {
+    store->addSource("old", "", 5, false, source);
+    store->removeSource("old");
+    const Watch watched = watchOnce("a", [&] { store->set("a", 2, "new"); });
+    store->addSource("new", "", 3, false, source);
+    EXPECT_THAT(watched.values(), ElementsAre("int 1", "int 2"));
+}
+
+TEST_F(Registration, SourceThatKeptItsListenerThroughAFailureIsToldOnce) {
+    store->addSource("old", "", 5, false, source);
+    store->removeSource("old");
+    source->whenKeys = [] { throw std::logic_error("no keys"); };
+    EXPECT_THROW(store->addSource("new", "", 3, false, source), std::logic_error);
+    const Watch watched = watch("b");
+    store->set("b", 2, "new");
+    EXPECT_THAT(watched.values(), ElementsAre("int 2"));
+}
+
+TEST_F(Registration, ListenerOfAnotherGroupDoesNotStandForTheNewOne) {
+    store->addSource("old", "net", 5, false, source);
+    store->removeSource("old");
+    const Watch watched = watchOnce("a", [&] { store->set("a", 2, "new"); });
+    store->addSource("new", "", 3, false, source);
+    EXPECT_THAT(watched.values(), ElementsAre("int 1", "int 2"));
+}
+
 /// A registration that ends early.
 struct EarlyEnd {
     const char* name;

@@ -3,7 +3,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <memory>
+#include <set>
 #include <stdexcept>
 #include <string>
 #include <utility>
@@ -31,7 +33,7 @@ public:
     }
 
     bool forget(const std::string& key) {
-        const bool known = values.erase(key);
+        const bool known = values.take(key).has_value();
         if (known) notify(key);
         return known;
     }
@@ -97,6 +99,58 @@ TEST(TableSource, StoreReadsTheTableAndAsksADerivedClass) {
     EXPECT_EQ(textOf(store->get("a").get()), "int 1");
     store->addSource("negated", "", 4, true, std::make_shared<NegatingSource>(ValueMap{{"a", 1}}));
     EXPECT_EQ(textOf(store->get("a").get()), "int -1");
+}
+
+/// One whose own code runs in `set` and `keys`.
+class HookedTable : public TableSource {
+public:
+    explicit HookedTable(ValueMap&& initialValues)
+        : TableSource(typeid(HookedTable), std::move(initialValues)) {}
+
+    ConfigurationValue set(const std::string&, ConfigurationValue value) override {
+        hook();
+        return value;
+    }
+
+    std::set<std::string> keys() override {
+        if (hook) hook();
+        return TableSource::keys();
+    }
+
+    std::function<void()> hook;
+};
+
+class HookedTableTest : public ::testing::Test {
+protected:
+    // Lets the source give up the last reference to the store.
+    ConfigurationImpl* dropStoreIn(std::shared_ptr<HookedTable>&& source) {
+        ConfigurationImpl* const plain = store.get();
+        source->hook = [this] {
+            store.reset();
+            aliveAfterwards = !alive.expired();
+        };
+        return plain;
+    }
+
+    std::shared_ptr<ConfigurationImpl> store = std::make_shared<ConfigurationImpl>();
+    const std::weak_ptr<ConfigurationImpl> alive = store;
+    bool aliveAfterwards = false;
+};
+
+TEST_F(HookedTableTest, MayDropTheStoreFromInsideSet) {
+    auto source = std::make_shared<HookedTable>(ValueMap{{"a", 1}});
+    store->addSource("table", "", -1, false, source);
+    dropStoreIn(std::move(source))->set("a", 2);
+    EXPECT_TRUE(aliveAfterwards);
+    EXPECT_TRUE(alive.expired());
+}
+
+TEST_F(HookedTableTest, MayDropTheStoreFromInsideKeys) {
+    auto source = std::make_shared<HookedTable>(ValueMap{{"a", 1}});
+    store->addSource("table", "", -1, false, source);
+    dropStoreIn(std::move(source))->keys();
+    EXPECT_TRUE(aliveAfterwards);
+    EXPECT_TRUE(alive.expired());
 }
 
 TEST(TableSource, StoreSeesThatAKeyIsForgotten) {
