@@ -1,6 +1,5 @@
 #include "configuration/ConfigurationImpl.hpp"
 
-#include <exception>
 #include <limits>
 #include <stdexcept>
 #include <typeinfo>
@@ -8,6 +7,7 @@
 
 #include "configuration/Loggers.hpp"
 #include "configuration/StoreErrors.hpp"
+#include "configuration/detail/ChangeList.hpp"
 #include "configuration/detail/Lookup.hpp"
 #include "configuration/detail/StoreOperation.hpp"
 #include "configuration/detail/WatchList.hpp"
@@ -18,20 +18,15 @@ namespace velkor::configuration {
 
 namespace {
 
-using detail::KeyBuffer;
+using detail::ChangeList;
 using detail::Lookup;
 using detail::StoreLock;
 using detail::WatchList;
-using detail::WatchPublisher;
-
-template <class T, class Error = std::runtime_error>
-Future<T> failed(const std::string& message) {
-    return makeFailedFuture<T>(std::make_exception_ptr(Error(message)));
-}
 
 }  // namespace
 
-ConfigurationImpl::ConfigurationImpl() : publishers(std::make_unique<WatchList>()) {
+ConfigurationImpl::ConfigurationImpl()
+    : publishers(std::make_unique<WatchList>()), changeStreams(std::make_unique<ChangeList>()) {
     ConfigurationImpl::addInMemorySource("default", "", std::numeric_limits<int>::max(), false, {});
     ConfigurationImpl::addInMemorySource("override", "", 0, false, {});
 }
@@ -46,6 +41,7 @@ ConfigurationImpl::~ConfigurationImpl() {
         for (const auto& entry : *layers) entry->source->setChangeListener({});
     }
     while (publishers->removeOldest() != nullptr) continue;
+    while (changeStreams->removeOldest() != nullptr) continue;
 }
 
 Future<ConfigurationValue> ConfigurationImpl::get(const std::string& key) {
@@ -93,17 +89,12 @@ Future<std::set<std::string>> ConfigurationImpl::keys() {
 
 std::shared_ptr<reactive_streams::PublisherAPI<ConfigurationValue>> ConfigurationImpl::watchOption(
     const std::string& key) {
-    std::shared_ptr<WatchPublisher> publisher;
+    std::shared_ptr<detail::WatchPublisher> publisher;
     ConfigurationValue current;
     {
         const Operation operation(*this, "watchOption: ", key);
         const std::uint64_t streamId = nextStreamId.fetch_add(1);
-        const std::weak_ptr<ConfigurationImpl> store =
-            std::static_pointer_cast<ConfigurationImpl>(shared_from_this());
-        const auto forget = [store, streamId] {
-            if (const auto alive = store.lock()) alive->removeStream(streamId);
-        };
-        publisher = std::make_shared<WatchPublisher>(1, forget);
+        publisher = std::make_shared<detail::WatchPublisher>(1, forgetting(streamId));
         publishers->add(publisher, key, streamId);
         updateHasForeignCode();
         const Lookup layer(sources, key);
@@ -145,16 +136,17 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
     storeLock.retire(sources.list());
     const auto entry =
         sources.insert(ConfigurationSourceMap(name, prefix, order, readOnly, source));
+    version.fetch_add(1, std::memory_order_release);
     updateHasForeignCode();
     const auto keys = source->keys();
     if (foreignCodeMayRun()) {
+        tellStreams(operation.mutexLevel(), prefix, keys);
         for (const auto& key : keys)
             publishers->update(operation.mutexLevel(), sources, prefix + key);
     }
     if (closing) return makeReadyFuture(true);
-    source->setChangeListener([this, prefix](const std::string& key) {
-        if (foreignCodeMayRun()) onSourceChanged(prefix, key);
-    });
+    source->setChangeListener(
+        [this, prefix](const std::string& key) { reportChange(prefix, key); });
     entry->reportsChanges = true;
     return makeReadyFuture(true);
 }
@@ -164,9 +156,12 @@ Future<bool> ConfigurationImpl::removeSource(const std::string& name) {
     const auto* entry = sources.find(name);
     if (entry == nullptr) return makeReadyFuture(false);
     const auto keys = entry->source->keys();
+    const std::string prefix = entry->group;
     storeLock.retire(sources.list());
     sources.erase(name);
+    version.fetch_add(1, std::memory_order_release);
     updateHasForeignCode();
+    tellStreams(operation.mutexLevel(), prefix, keys);
     // Watchers of prefixed keys are deliberately left alone: see Configuration::removeSource.
     for (const auto& key : keys) publishers->update(operation.mutexLevel(), sources, key);
     return makeReadyFuture(true);
@@ -218,6 +213,7 @@ void ConfigurationImpl::removeStream(std::uint64_t streamId) {
     const Operation operation(*this);
     // Whoever cancels the watch holds another reference to it: it can be dropped here.
     storeLock.retireOrDrop(publishers->remove(streamId));
+    storeLock.retireOrDrop(changeStreams->remove(streamId));
     updateHasForeignCode();
 }
 
@@ -225,18 +221,19 @@ Future<ConfigurationValue> ConfigurationImpl::write(const detail::RegisteredSour
                                                     const std::string& key,
                                                     ConfigurationValue&& value) {
     storeLogger.write(common::debug, "set: ", key, "@", target.name);
-    KeyBuffer buffer(sources.keyBuffers());
+    detail::KeyBuffer buffer(sources.keyBuffers());
     const bool tells = target.reportsChanges;
     auto answer =
         makeReadyFuture(target.source->set(buffer.within(target.group, key), std::move(value)));
-    if (!tells && foreignCodeMayRun()) onSourceChanged("", key);
+    if (!tells) reportChange("", key);
     return answer;
 }
 
-void ConfigurationImpl::onSourceChanged(const std::string& group, const std::string& key) {
-    Operation operation(*this);
-    KeyBuffer buffer(sources.keyBuffers());
-    publishers->update(operation.mutexLevel(), sources, buffer.joined(group, key));
+std::function<void()> ConfigurationImpl::forgetting(std::uint64_t streamId) {
+    return [store = std::weak_ptr(std::static_pointer_cast<ConfigurationImpl>(shared_from_this())),
+            streamId] {
+        if (const auto alive = store.lock()) alive->removeStream(streamId);
+    };
 }
 
 // Whether anything but this store can notice an operation, or end the store during it.
@@ -245,7 +242,7 @@ bool ConfigurationImpl::foreignCodeMayRun() const noexcept {
 }
 
 void ConfigurationImpl::updateHasForeignCode() {
-    hasForeignCode = sources.hasForeignSources() || !publishers->empty();
+    hasForeignCode = sources.hasForeignSources() || !publishers->empty() || !changeStreams->empty();
 }
 
 }  // namespace velkor::configuration

@@ -2,12 +2,14 @@
 
 #include <atomic>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "configuration/Changes.hpp"
 #include "configuration/Configuration.hpp"
 #include "configuration/detail/SourceRegistry.hpp"
 #include "configuration/detail/StoreLock.hpp"
@@ -20,8 +22,9 @@
 namespace velkor::configuration {
 
 namespace detail {
+class ChangeList;
 class WatchList;
-}
+}  // namespace detail
 
 /// The store. A fresh one holds two writable sources without a group: "override" (order 0), which
 /// takes ordinary writes, and "default" (order 2147483647), the layer of last resort.
@@ -90,6 +93,40 @@ public:
     /// the effective one. Empty when there is none.
     Future<std::vector<Option>> explain(const std::string& key);
 
+    /// The effective values of several keys at one moment, with the version of the store then.
+    Future<Reading> read(const std::vector<std::string>& keys);
+
+    /// Takes `key` out of the source that `set` would write it to; gives whether it was there.
+    /// Watchers are told what is effective then, if anything is, as by `set`. Fails with
+    /// `std::runtime_error` as `set` does, or with "Configuration source can't forget keys: ", the
+    /// key, ", " and the name of the source when it is no `ForgettingSource`.
+    Future<bool> unset(const std::string& key);
+    Future<bool> unset(const std::string& key, const std::string& sourceName);
+
+    /// Makes all `changes` or none, in their order: first the source of each is found, then all are
+    /// written, then all watchers are told, who find every key changed. With `dryRun` nothing is
+    /// written. Gives what was changed, or would be, and where.
+    ///
+    /// Fails with `std::runtime_error` "Changes refused: " and the texts of all refusals, as `set`
+    /// and `unset` give them, separated by "; "; nothing has changed then. When a source throws,
+    /// what was written is taken back, as far as the sources let it, nobody is told, and the
+    /// exception leaves the call.
+    Future<std::vector<AppliedChange>> apply(const std::vector<Change>& changes,
+                                             bool dryRun = false);
+
+    /// A stream for one subscriber of what changes among the keys that `prefix` begins: for each
+    /// change the key and what is effective for it now, or that nothing is. Begins with the next
+    /// change. Keys that go with their source are told as well, with its group.
+    ///
+    /// Holds one undelivered change for each key, the newest: a slow subscriber misses those in
+    /// between and ends on the truth for every key. Changes of one key arrive in the order of their
+    /// versions, one at a time, on the thread that changes the store or asks for more. They were
+    /// read with the store locked. What `watchOption` says of that thread, of errors ("Error in
+    /// configuration change subscriber: " and the prefix) and of the end of the stream holds here
+    /// too. When a change can't be read or kept, the stream fails with the reason.
+    std::shared_ptr<reactive_streams::PublisherAPI<OptionChange>> watchChanges(
+        const std::string& prefix);
+
 protected:
     // The first four take the caller's lock on the store's mutex, which is held: the caller's only
     // level, or one within an operation of the store. `removeStream` takes the mutex itself.
@@ -119,7 +156,18 @@ private:
 
     Future<ConfigurationValue> write(const detail::RegisteredSource& target, const std::string& key,
                                      ConfigurationValue&& value) VELKOR_REQUIRES(storeLock);
+    Future<bool> forget(const Change& change, const detail::RegisteredSource* target)
+        VELKOR_REQUIRES(storeLock);
+    void reportChange(const std::string& group, const std::string& key);
     void onSourceChanged(const std::string& group, const std::string& key);
+    void tellStreams(detail::StoreLock::Level& level, const std::string& group,
+                     const std::set<std::string>& keys) VELKOR_REQUIRES(storeLock);
+    void tellAll(detail::StoreLock::Level& level, const std::vector<std::string>& keys)
+        VELKOR_REQUIRES(storeLock);
+    std::function<void()> forgetting(std::uint64_t streamId);
+    std::uint64_t currentVersion() const noexcept {
+        return version.load(std::memory_order_acquire);
+    }
     bool foreignCodeMayRun() const noexcept;
     void updateHasForeignCode() VELKOR_REQUIRES(storeLock);
 
@@ -127,6 +175,11 @@ private:
     std::atomic<std::uint64_t> nextStreamId{0};
     detail::SourceRegistry sources VELKOR_GUARDED_BY(storeLock);
     std::unique_ptr<detail::WatchList> publishers VELKOR_GUARDED_BY(storeLock);
+    std::unique_ptr<detail::ChangeList> changeStreams VELKOR_GUARDED_BY(storeLock);
+    // Where changes are collected instead of being told while several are made together.
+    std::vector<std::string>* deferred VELKOR_GUARDED_BY(storeLock) = nullptr;
+    // Grows with every change. Counted by sources that change by themselves without the mutex.
+    std::atomic<std::uint64_t> version{0};
     // There are watchers or sources of other libraries. Read without the mutex by the listeners.
     std::atomic<bool> hasForeignCode{false};
     // The destructor has begun: no source is given a listener any more.

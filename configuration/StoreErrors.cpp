@@ -32,6 +32,8 @@ constexpr std::array patterns{
     pattern<runtime_error>(store_errors::noOption, Refusal::missingOption),
     pattern<runtime_error>(store_errors::noWritableSource, Refusal::notWritable),
     pattern<runtime_error>(store_errors::sourceNotWritable, Refusal::notWritable),
+    pattern<runtime_error>(store_errors::cannotForget, Refusal::notWritable),
+    pattern<runtime_error>(store_errors::changesRefused, Refusal::notWritable),
     pattern<runtime_error>(store_errors::writingNotSupported, Refusal::notWritable),
     pattern<invalid_argument>(store_errors::duplicateSource, Refusal::duplicateSource),
     pattern<runtime_error>(store_errors::fileNotOpened, Refusal::fileNotOpened),

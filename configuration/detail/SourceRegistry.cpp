@@ -28,7 +28,9 @@ std::string normalisedGroup(std::string group) {
 }
 
 RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
-    : ConfigurationSourceMap(std::move(entry)), table(tableOf(*source)) {}
+    : ConfigurationSourceMap(std::move(entry)),
+      table(tableOf(*source)),
+      forgetting(dynamic_cast<ForgettingSource*>(source.get())) {}
 
 SourceRegistry::SourceRegistry() : current(std::make_shared<SourceList>()) {}
 

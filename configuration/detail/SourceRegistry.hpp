@@ -9,6 +9,7 @@
 #include "configuration/Option.hpp"
 #include "configuration/detail/KeyBuffer.hpp"
 #include "configuration/sources/ConfigurationSourceMap.hpp"
+#include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/SourceDescription.hpp"
 #include "configuration/sources/ValueTable.hpp"
 
@@ -27,8 +28,9 @@ struct RegisteredSource : ConfigurationSourceMap {
                                  std::memcmp(key.data(), group.data(), group.size()) == 0);
     }
 
-    const ValueTable* table;      ///< What it answers from; null: the source itself is asked.
-    bool reportsChanges = false;  ///< The store's listener is installed.
+    const ValueTable* table;       ///< What it answers from; null: the source itself is asked.
+    ForgettingSource* forgetting;  ///< The source, if keys can be taken out of it; else null.
+    bool reportsChanges = false;   ///< The store's listener is installed.
 };
 
 /// The layer that decides a key, the key as its source knows it, and the value if it stands in the

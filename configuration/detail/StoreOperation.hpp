@@ -1,11 +1,20 @@
 #pragma once
 
+#include <exception>
 #include <memory>
+#include <stdexcept>
+#include <string>
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/Loggers.hpp"
 
 namespace velkor::configuration {
+
+/// The answer of an operation that is refused: a future that fails with `text`.
+template <class T, class Error = std::runtime_error>
+Future<T> failed(const std::string& text) {
+    return makeFailedFuture<T>(std::make_exception_ptr(Error(text)));
+}
 
 /// One operation: a level of the store's mutex, and a reference to the store where foreign code,
 /// which may give up all others, can run meanwhile.

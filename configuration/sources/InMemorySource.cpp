@@ -19,4 +19,13 @@ ConfigurationValue InMemorySource::set(const std::string& key, ConfigurationValu
     return answer;
 }
 
+std::optional<ConfigurationValue> InMemorySource::unset(const std::string& key) {
+    ConfigurationValue* const present = values.find(key);
+    if (present == nullptr) return std::nullopt;
+    std::optional<ConfigurationValue> removed(std::move(*present));
+    values.erase(key);
+    notify(key);
+    return removed;
+}
+
 }  // namespace velkor::configuration

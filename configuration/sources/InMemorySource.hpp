@@ -1,8 +1,10 @@
 #pragma once
 
 #include <memory>
+#include <optional>
 #include <string>
 
+#include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/TableSource.hpp"
 
 namespace velkor::configuration {
@@ -10,6 +12,7 @@ namespace velkor::configuration {
 /// A writable layer held in memory. Not thread-safe by itself: the store serialises all calls.
 /// Made by `std::make_shared`.
 class VELKOR_EXPORT InMemorySource : public TableSource,
+                                     public ForgettingSource,
                                      public std::enable_shared_from_this<InMemorySource> {
 public:
     /// Takes over `initialValues`, which is left empty. Starts without a listener.
@@ -19,6 +22,10 @@ public:
     /// Returns the replaced value, or `value` when the key is new. What the listener throws passes
     /// on; the value is stored by then.
     ConfigurationValue set(const std::string& key, ConfigurationValue value) override;
+
+    /// Removes `key`, then calls the listener, and gives the removed value; nothing happens when
+    /// there is none. What the listener throws passes on; the key is gone by then.
+    std::optional<ConfigurationValue> unset(const std::string& key) override;
 };
 
 }  // namespace velkor::configuration

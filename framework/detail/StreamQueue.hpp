@@ -32,6 +32,11 @@ public:
         while (values.size() > capacity) dropped.splice(dropped.end(), values, values.begin());
     }
 
+    /// Takes the one value in `first` unless there are some already.
+    void pushFirst(std::list<T>& first) noexcept {
+        if (values.empty()) values.swap(first);
+    }
+
     /// Takes the value that is due first; there is one.
     std::list<T> takeFirst() noexcept {
         std::list<T> first;
@@ -53,11 +58,9 @@ class NewestByKey {
 public:
     bool empty() const noexcept { return values.empty(); }
 
-    /// Adds `value`, in the place of the one with the same key, if any, which goes to `dropped`.
-    /// When memory is short, nothing has changed.
-    void push(T&& value, std::list<T>& dropped) {
-        std::list<T> added;
-        added.push_back(std::move(value));
+    /// Takes the one value in `added`, in the place of the one with the same key, if any, which
+    /// goes to `dropped`. When memory is short, nothing has changed.
+    void push(std::list<T>& added, std::list<T>& dropped) {
         const auto node = added.begin();
         const auto known = byKey.find(keyOf(*node));
         if (known == byKey.end()) {

@@ -128,17 +128,18 @@ public:
         return nullptr;
     }
 
-    /// Moves `value` into the queue unless the stream has ended; `dropped` takes what it replaces.
-    void keep(T& value, std::list<T>& dropped) VELKOR_EXCLUDES(mutex) {
+    /// Moves the one value in `added` into the queue unless the stream has ended; `dropped` takes
+    /// what it replaces.
+    void keep(std::list<T>& added, std::list<T>& dropped) VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        if (phase <= StreamPhase::completing) queue.push(std::move(value), dropped);
+        if (phase <= StreamPhase::completing) queue.push(added, dropped);
     }
 
-    /// Moves `value` into the queue unless the stream has ended or something is kept already.
-    void keepFirst(T& value) VELKOR_EXCLUDES(mutex) {
-        std::list<T> none;
+    /// Moves the one value in `first` into the queue unless the stream has ended or something is
+    /// kept already.
+    void keepFirst(std::list<T>& first) VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        if (phase <= StreamPhase::completing && queue.empty()) queue.push(std::move(value), none);
+        if (phase <= StreamPhase::completing) queue.pushFirst(first);
     }
 
     /// Adds `more` to the demand.

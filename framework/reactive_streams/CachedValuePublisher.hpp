@@ -36,8 +36,9 @@ public:
     /// Keeps a copy of `value` as the first one unless something is kept already, which is newer:
     /// for a value that was read before others could publish. Called before there is a subscriber.
     void publishFirst(const T& value) {
-        T copy(value);
-        this->stream.keepFirst(copy);
+        std::list<T> first;
+        first.push_back(value);
+        this->stream.keepFirst(first);
     }
 
 private:

@@ -25,8 +25,10 @@ public:
     /// it may be called with a lock held that gives the values their order. Does nothing once the
     /// stream has ended. Throws `std::bad_alloc`, and nothing has changed then.
     void keep(T value) {
+        std::list<T> added;
+        added.push_back(std::move(value));
         std::list<T> replaced;
-        this->stream.keep(value, replaced);
+        this->stream.keep(added, replaced);
     }
 
     /// Delivers what is kept as far as there is demand, unless another call is about to.

@@ -1,0 +1,168 @@
+// How the store tells of changes, and what it offers beyond `Configuration`: several keys at once,
+// forgetting, and the stream of changes.
+
+#include <algorithm>
+#include <iterator>
+#include <stdexcept>
+#include <string_view>
+#include <unordered_set>
+#include <utility>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "configuration/StoreErrors.hpp"
+#include "configuration/detail/ChangeList.hpp"
+#include "configuration/detail/Lookup.hpp"
+#include "configuration/detail/StoreOperation.hpp"
+#include "configuration/detail/Transaction.hpp"
+#include "configuration/detail/WatchList.hpp"
+
+namespace velkor::configuration {
+
+namespace {
+
+/// Collects the keys that sources report while it lives, in the place of telling of them.
+class Deferral {
+public:
+    Deferral(std::vector<std::string>*& collecting, std::vector<std::string>& keys)
+        : current(collecting), before(std::exchange(collecting, &keys)) {}
+    ~Deferral() { current = before; }
+
+    Deferral(const Deferral&) = delete;
+    Deferral& operator=(const Deferral&) = delete;
+
+private:
+    std::vector<std::string>*& current;
+    std::vector<std::string>* const before;
+};
+
+using detail::ChangeList;
+using detail::ChangePublisher;
+using detail::Transaction;
+
+void serve(detail::StoreLock::Level& level, ChangeList::Due& due) {
+    if (!due.empty()) level.releasedWhile([&] { due.serve(); });
+}
+
+// `keys` without those that stood before, in their order.
+std::vector<std::string> unique(const std::vector<std::string>& keys) {
+    std::unordered_set<std::string_view> seen;
+    std::vector<std::string> first;
+    std::copy_if(keys.begin(), keys.end(), std::back_inserter(first),
+                 [&](const std::string& key) { return seen.insert(key).second; });
+    return first;
+}
+
+}  // namespace
+
+Future<Reading> ConfigurationImpl::read(const std::vector<std::string>& keys) {
+    const Operation operation(*this);
+    Reading reading;
+    // Before the values: a source that changes meanwhile makes the version grow afterwards.
+    reading.version = currentVersion();
+    reading.options.reserve(keys.size());
+    for (const auto& key : keys) {
+        const detail::Lookup layer(sources, key);
+        reading.options.push_back(layer ? std::optional<Option>(layer.option()) : std::nullopt);
+    }
+    return makeReadyFuture(std::move(reading));
+}
+
+Future<bool> ConfigurationImpl::unset(const std::string& key) {
+    const Operation operation(*this, "unset: ", key);
+    return forget({key}, sources.firstWritable(key, nullptr));
+}
+
+Future<bool> ConfigurationImpl::unset(const std::string& key, const std::string& sourceName) {
+    const Operation operation(*this, "unset: ", key, ", ", sourceName);
+    return forget({key, std::nullopt, sourceName}, sources.firstWritable(key, &sourceName));
+}
+
+Future<bool> ConfigurationImpl::forget(const Change& change,
+                                       const detail::RegisteredSource* target) {
+    const std::string refusal = detail::refusalOf(change, target);
+    if (!refusal.empty()) return failed<bool>(refusal);
+    storeLogger.write(common::debug, "unset: ", change.key, "@", target->name);
+    detail::KeyBuffer buffer(sources.keyBuffers());
+    const bool tells = target->reportsChanges;
+    const bool known =
+        target->forgetting->unset(buffer.within(target->group, change.key)).has_value();
+    if (known && !tells) reportChange("", change.key);
+    return makeReadyFuture(known);
+}
+
+Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Change>& changes,
+                                                            bool dryRun) {
+    Operation operation(*this, dryRun ? "apply, dry run: " : "apply: ", changes.size());
+    Transaction transaction(sources, changes);
+    const std::string refusals = transaction.refusals();
+    if (!refusals.empty()) {
+        return failed<std::vector<AppliedChange>>(store_errors::changesRefused + refusals);
+    }
+    const auto& outcome = transaction.outcome();
+    if (dryRun) return makeReadyFuture(outcome);
+    std::vector<std::string> changed;
+    {
+        const Deferral deferral(deferred, changed);
+        transaction.write(sources);
+    }
+    // Sources that report nothing to the store, or not yet, have changed all the same.
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        if (changes[i].value || outcome[i].before) changed.push_back(changes[i].key);
+    }
+    tellAll(operation.mutexLevel(), unique(changed));
+    return makeReadyFuture(outcome);
+}
+
+// Called for each change of a source: by the listener in it, or by the store where there is none.
+void ConfigurationImpl::reportChange(const std::string& group, const std::string& key) {
+    version.fetch_add(1, std::memory_order_release);
+    if (foreignCodeMayRun()) onSourceChanged(group, key);
+}
+
+void ConfigurationImpl::onSourceChanged(const std::string& group, const std::string& key) {
+    Operation operation(*this);
+    detail::KeyBuffer buffer(sources.keyBuffers());
+    const std::string& fullKey = buffer.joined(group, key);
+    if (deferred != nullptr) return deferred->push_back(fullKey);
+    if (!changeStreams->empty()) {
+        ChangeList::Due due;
+        changeStreams->keep(sources, fullKey, currentVersion(), due);
+        serve(operation.mutexLevel(), due);
+    }
+    publishers->update(operation.mutexLevel(), sources, fullKey);
+}
+
+// Tells the streams of changes of `keys`, each with `group` in front.
+void ConfigurationImpl::tellStreams(detail::StoreLock::Level& level, const std::string& group,
+                                    const std::set<std::string>& keys) {
+    if (changeStreams->empty()) return;
+    ChangeList::Due due;
+    for (const auto& key : keys) changeStreams->keep(sources, group + key, currentVersion(), due);
+    serve(level, due);
+}
+
+// Tells of `keys` together: each watcher finds all of them changed.
+void ConfigurationImpl::tellAll(detail::StoreLock::Level& level,
+                                const std::vector<std::string>& keys) {
+    if (deferred != nullptr) {
+        deferred->insert(deferred->end(), keys.begin(), keys.end());
+        return;
+    }
+    if (!foreignCodeMayRun()) return;
+    ChangeList::Due due;
+    for (const auto& key : keys) changeStreams->keep(sources, key, currentVersion(), due);
+    serve(level, due);
+    for (const auto& key : keys) publishers->update(level, sources, key);
+}
+
+std::shared_ptr<reactive_streams::PublisherAPI<OptionChange>> ConfigurationImpl::watchChanges(
+    const std::string& prefix) {
+    const Operation operation(*this, "watchChanges: ", prefix);
+    const std::uint64_t streamId = nextStreamId.fetch_add(1);
+    auto publisher = std::make_shared<ChangePublisher>(forgetting(streamId));
+    changeStreams->add(publisher, prefix, streamId);
+    updateHasForeignCode();
+    return publisher;
+}
+
+}  // namespace velkor::configuration

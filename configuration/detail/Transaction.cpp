@@ -1,0 +1,90 @@
+#include "configuration/detail/Transaction.hpp"
+
+#include "configuration/Loggers.hpp"
+#include "configuration/StoreErrors.hpp"
+
+namespace velkor::configuration::detail {
+
+namespace {
+
+std::optional<ConfigurationValue> heldBy(const RegisteredSource& target, const std::string& key,
+                                         KeyBufferPool& buffers) {
+    KeyBuffer buffer(buffers);
+    const std::string& relativeKey = buffer.within(target.group, key);
+    if (!target.source->has(relativeKey)) return std::nullopt;
+    return target.source->get(relativeKey);
+}
+
+}  // namespace
+
+std::string refusalOf(const Change& change, const RegisteredSource* target) {
+    if (target == nullptr) {
+        return change.source ? store_errors::sourceNotWritable + change.key + ", " + *change.source
+                             : store_errors::noWritableSource + change.key;
+    }
+    if (change.value || target->forgetting != nullptr) return "";
+    return store_errors::cannotForget + change.key + ", " + target->name;
+}
+
+Transaction::Transaction(SourceRegistry& sources, const std::vector<Change>& wanted)
+    : changes(wanted) {
+    targets.reserve(changes.size());
+    for (const Change& change : changes) {
+        targets.push_back(
+            sources.firstWritable(change.key, change.source ? &*change.source : nullptr));
+    }
+    if (!refusals().empty()) return;
+    applied.reserve(changes.size());
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        const RegisteredSource& target = *targets[i];
+        applied.push_back(
+            {changes[i].key, target.name, heldBy(target, changes[i].key, sources.keyBuffers())});
+    }
+}
+
+std::string Transaction::refusals() const {
+    std::string all;
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        const std::string refusal = refusalOf(changes[i], targets[i]);
+        if (!refusal.empty()) all += (all.empty() ? "" : "; ") + refusal;
+    }
+    return all;
+}
+
+void Transaction::write(SourceRegistry& sources) {
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        try {
+            writeOne(sources, i, changes[i].value);
+        } catch (...) {
+            takeBack(sources, i + 1);
+            throw;
+        }
+    }
+}
+
+void Transaction::writeOne(SourceRegistry& sources, std::size_t index,
+                           const std::optional<ConfigurationValue>& value) {
+    const std::string& key = changes[index].key;
+    const RegisteredSource& target = *targets[index];
+    storeLogger.write(common::debug, value ? "set: " : "unset: ", key, "@", target.name);
+    KeyBuffer buffer(sources.keyBuffers());
+    const std::string& relativeKey = buffer.within(target.group, key);
+    if (value) {
+        target.source->set(relativeKey, *value);
+    } else if (target.forgetting != nullptr) {
+        target.forgetting->unset(relativeKey);
+    }
+}
+
+void Transaction::takeBack(SourceRegistry& sources, std::size_t count) noexcept {
+    while (count-- > 0) {
+        try {
+            writeOne(sources, count, applied[count].before);
+        } catch (...) {
+            // The source refuses: the others are restored all the same.
+            continue;
+        }
+    }
+}
+
+}  // namespace velkor::configuration::detail
