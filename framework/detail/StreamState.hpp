@@ -27,7 +27,7 @@ constexpr std::uint64_t addDemand(std::uint64_t demand, std::uint64_t more) noex
 
 namespace velkor::detail {
 
-/// How far a stream has come; `CachedValuePublisher` has the picture. Above `completing` it has
+/// How far a stream has come; `QueuedPublisher` has the picture. Above `completing` it has
 /// ended.
 enum class StreamPhase : std::uint32_t { active, completing, completed, cancelled, failed };
 
