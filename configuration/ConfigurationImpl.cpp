@@ -19,15 +19,13 @@ namespace velkor::configuration {
 
 namespace {
 
-using detail::ChangeList;
-using detail::Lookup;
-using detail::StoreLock;
-using detail::WatchList;
+using detail::Lookup, detail::StoreLock, detail::WatchList;
 
 }  // namespace
 
 ConfigurationImpl::ConfigurationImpl()
-    : publishers(std::make_unique<WatchList>()), changeStreams(std::make_unique<ChangeList>()) {
+    : publishers(std::make_unique<WatchList>()),
+      changeStreams(std::make_unique<detail::ChangeList>()) {
     ConfigurationImpl::addInMemorySource("default", "", std::numeric_limits<int>::max(), false, {});
     ConfigurationImpl::addInMemorySource("override", "", 0, false, {});
 }
@@ -233,11 +231,10 @@ Future<ConfigurationValue> ConfigurationImpl::write(const detail::RegisteredSour
     return makeReadyFuture(std::move(answer));
 }
 
-std::function<void()> ConfigurationImpl::forgetting(std::uint64_t streamId) {
-    return [store = std::weak_ptr(std::static_pointer_cast<ConfigurationImpl>(shared_from_this())),
-            streamId] {
-        if (const auto alive = store.lock()) alive->removeStream(streamId);
-    };
+// Called for each change of a source: by the listener in it, or by the store where there is none.
+void ConfigurationImpl::reportChange(const std::string& group, const std::string& key) {
+    version.fetch_add(1, std::memory_order_release);
+    if (foreignCodeMayRun()) onSourceChanged(group, key);
 }
 
 // Whether anything but this store can notice an operation, or end the store during it.

@@ -114,12 +114,6 @@ Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Ch
     return makeReadyFuture(outcome);
 }
 
-// Called for each change of a source: by the listener in it, or by the store where there is none.
-void ConfigurationImpl::reportChange(const std::string& group, const std::string& key) {
-    version.fetch_add(1, std::memory_order_release);
-    if (foreignCodeMayRun()) onSourceChanged(group, key);
-}
-
 void ConfigurationImpl::onSourceChanged(const std::string& group, const std::string& key) {
     Operation operation(*this);
     detail::KeyBuffer buffer(sources.keyBuffers());
@@ -132,6 +126,13 @@ void ConfigurationImpl::onSourceChanged(const std::string& group, const std::str
         serve(operation.mutexLevel(), due);
     }
     publishers->update(operation.mutexLevel(), sources, fullKey);
+}
+
+std::function<void()> ConfigurationImpl::forgetting(std::uint64_t streamId) {
+    return [store = std::weak_ptr(std::static_pointer_cast<ConfigurationImpl>(shared_from_this())),
+            streamId] {
+        if (const auto alive = store.lock()) alive->removeStream(streamId);
+    };
 }
 
 // Tells the streams of changes of `keys`, each with `group` in front.

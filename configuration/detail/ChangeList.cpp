@@ -16,7 +16,7 @@ std::optional<Option> currentOf(SourceRegistry& sources, const std::string& key)
     KeyBuffer buffer(sources.keyBuffers());
     const Layer layer = sources.firstHolder(key, buffer);
     if (!layer) return std::nullopt;
-    return Option(key, layer.entry->name, layer.value());
+    return Option(key, layer.entry().name, layer.value());
 }
 
 // Null when the change was kept.

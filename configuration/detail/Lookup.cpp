@@ -6,12 +6,12 @@ namespace velkor::configuration::detail {
 
 ConfigurationValue Lookup::value() const {
     if (!storeLogger.isEnabled(common::debug)) return layer.value();
-    storeLogger.write(common::debug, "get: ", key, " from ", layer.entry->name);
+    storeLogger.write(common::debug, "get: ", key, " from ", layer.entry().name);
     return valueAfterRecord();
 }
 
 Option Lookup::option() const {
-    const std::string& source = layer.entry->name;
+    const std::string& source = layer.entry().name;
     if (!storeLogger.isEnabled(common::debug)) return Option(key, source, layer.value());
     storeLogger.write(common::debug, "get option: ", key, " from ", source);
     return Option(key, source, valueAfterRecord());
@@ -19,7 +19,7 @@ Option Lookup::option() const {
 
 // What stood in the table may be gone: a log sink can change the store.
 ConfigurationValue Lookup::valueAfterRecord() const {
-    return layer.entry->source->get(*layer.relativeKey);
+    return layer.entry().source->get(*layer.relativeKey);
 }
 
 }  // namespace velkor::configuration::detail

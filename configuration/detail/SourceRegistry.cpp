@@ -79,8 +79,8 @@ std::vector<Option> SourceRegistry::holders(const std::string& key) {
     const SourcePtr* from = layers->data();
     std::vector<Option> all;
     while (const Layer layer = nextHolder(from, end, key, buffer)) {
-        all.emplace_back(key, layer.entry->name, layer.value());
-        from = layer.next;
+        all.emplace_back(key, layer.entry().name, layer.value());
+        from = layer.position + 1;
     }
     return all;
 }
@@ -94,9 +94,9 @@ Layer SourceRegistry::nextHolder(const SourcePtr* from, const SourcePtr* end,
         const std::string& relativeKey = buffer.within(entry.group, key);
         if (entry.table != nullptr) {
             const ConfigurationValue* held = entry.table->find(relativeKey);
-            if (held != nullptr) return {&entry, &relativeKey, held, from + 1};
+            if (held != nullptr) return {from, &relativeKey, held};
         } else if (entry.source->has(relativeKey)) {
-            return {&entry, &relativeKey, nullptr, from + 1};
+            return {from, &relativeKey, nullptr};
         }
     }
     return {};

@@ -37,13 +37,13 @@ struct RegisteredSource : ConfigurationSourceMap {
 /// The layer that decides a key, the key as its source knows it, and the value if it stands in the
 /// source's table.
 struct Layer {
-    const RegisteredSource* entry = nullptr;
+    const std::shared_ptr<RegisteredSource>* position = nullptr;  ///< In the list; null: none.
     const std::string* relativeKey = nullptr;
     const ConfigurationValue* held = nullptr;
-    const std::shared_ptr<RegisteredSource>* next = nullptr;  ///< Where the walk goes on.
 
-    ConfigurationValue value() const { return held ? *held : entry->source->get(*relativeKey); }
-    explicit operator bool() const { return entry != nullptr; }
+    const RegisteredSource& entry() const { return **position; }
+    ConfigurationValue value() const { return held ? *held : entry().source->get(*relativeKey); }
+    explicit operator bool() const { return position != nullptr; }
 };
 
 /// The sources of a store in order of precedence. Not thread-safe: used with the store's mutex
