@@ -5,10 +5,10 @@
 #include <memory>
 #include <mutex>
 #include <string>
-#include <thread>
 #include <utility>
 
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/FreeMutex.hpp"
 #include "tests/support/RecordingSubscriber.hpp"
 
 namespace velkor::configuration {
@@ -43,14 +43,7 @@ public:
     }
 
     // Whether another thread would get the mutex now, without waiting.
-    bool isFree() {
-        bool free = false;
-        std::thread([&] {
-            const std::unique_lock<std::recursive_mutex> attempt(mutex, std::try_to_lock);
-            free = attempt.owns_lock();
-        }).join();
-        return free;
-    }
+    bool isFree() { return testing::isFreeForOthers(mutex); }
 };
 
 // What a source changes in the registry while the derived store's own lock is the only level, or

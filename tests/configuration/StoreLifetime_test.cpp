@@ -5,14 +5,13 @@
 #include <cstddef>
 #include <functional>
 #include <memory>
-#include <mutex>
 #include <ostream>
 #include <stdexcept>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/FreeMutex.hpp"
 #include "tests/support/LogCapture.hpp"
 #include "tests/support/RecordingSubscriber.hpp"
 
@@ -215,10 +214,7 @@ TEST_F(StoreLifetime, SourceRemovedWhileTheStoreIsDestroyedGoesWithTheStoreUnloc
     open->addSource("second", "", -8, false, second);
     bool free = false;
     second->whenDestroyed = [&free, dying = open.get()] {
-        std::thread([&] {
-            const std::unique_lock<std::recursive_mutex> attempt(dying->mutex, std::try_to_lock);
-            free = attempt.owns_lock();
-        }).join();
+        free = testing::isFreeForOthers(dying->mutex);
     };
     second.reset();
     first->whenDetached = [dying = open.get()] { dying->removeSource("second"); };

@@ -9,20 +9,15 @@
 #include <system_error>
 #include <thread>
 
+#include "tests/support/FreeMutex.hpp"
+
 namespace velkor::configuration::detail {
 namespace {
 
 class StoreLockTest : public ::testing::Test {
 protected:
     // Whether another thread would get the mutex now, without waiting.
-    bool isFree() {
-        bool free = false;
-        std::thread([&] {
-            const std::unique_lock<std::recursive_mutex> attempt(mutex, std::try_to_lock);
-            free = attempt.owns_lock();
-        }).join();
-        return free;
-    }
+    bool isFree() { return testing::isFreeForOthers(mutex); }
 
     // An object whose end is noted, with whether the mutex was free then.
     std::shared_ptr<const void> object() {

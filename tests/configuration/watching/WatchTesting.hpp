@@ -2,13 +2,12 @@
 
 #include <cstdint>
 #include <memory>
-#include <mutex>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "framework/reactive_streams/CachedValuePublisher.hpp"
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/FreeMutex.hpp"
 #include "tests/support/RecordingSubscriber.hpp"
 
 namespace velkor::configuration {
@@ -21,14 +20,7 @@ public:
     using ConfigurationImpl::updatePublishers;
 
     /// Whether another thread would get the mutex now, without waiting.
-    bool isFreeForOthers() {
-        bool free = false;
-        std::thread([&] {
-            const std::unique_lock<std::recursive_mutex> attempt(mutex, std::try_to_lock);
-            free = attempt.owns_lock();
-        }).join();
-        return free;
-    }
+    bool isFreeForOthers() { return velkor::testing::isFreeForOthers(mutex); }
 };
 
 /// One watch: its stream and a subscriber that keeps what it delivers.
