@@ -119,6 +119,16 @@ TEST_F(SettingTest, MayEndBeforeItsReader) {
     EXPECT_EQ(reader.get(), "default");
 }
 
+#ifdef VELKOR_SETTINGS_CHECK_REFERENCES
+TEST_F(SettingTest, ShowsAReferenceThatIsKeptWithAddressSanitizer) {
+    const Setting<std::string> name(store, "server.name", "default");
+    auto reader = name.reader();
+    const std::string& kept = reader.get();
+    reader.get();
+    EXPECT_DEATH(static_cast<void>(kept == "default"), "heap-use-after-free");
+}
+#endif
+
 TEST_F(SettingTest, NeedsAValueOrADefault) {
     EXPECT_EQ(refusalOf<std::string>("server.name"), "server.name: no value, and no default");
 }
