@@ -1,7 +1,9 @@
 #pragma once
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <memory>
 #include <optional>
 #include <type_traits>
@@ -12,26 +14,41 @@
 namespace velkor::settings::detail {
 
 /// Whether a value fits into one atomic, which is all of a setting that is read.
-template <class T, class = void>
-inline constexpr bool fitsAtomic = false;
 template <class T>
-inline constexpr bool
-    fitsAtomic<T, std::enable_if_t<std::is_trivially_copyable_v<T> && sizeof(T) <= 8 &&
-                                   std::is_default_constructible_v<T>>> =
-        std::atomic<T>::is_always_lock_free;
+inline constexpr bool fitsAtomic = std::is_trivially_copyable_v<T> &&
+                                   sizeof(T) <= 8 && std::is_default_constructible_v<T>;
 
-/// The published value of a small type. Thread-safe: reading it is one load.
+/// The unsigned integer that has room for `size` bytes.
+template <std::size_t size>
+using Bits = std::conditional_t<
+    size == 1, std::uint8_t,
+    std::conditional_t<size == 2, std::uint16_t,
+                       std::conditional_t<size <= 4, std::uint32_t, std::uint64_t>>>;
+
+/// The published value of a small type. Thread-safe: reading it is one load. An atomic of `T`
+/// itself would not be: of a type with a smaller alignment than its size, compilers call a library
+/// for it.
 template <class T>
 class AtomicCell {
 public:
-    void store(T next) noexcept { value.store(next, std::memory_order_release); }
-    T load() const noexcept { return value.load(std::memory_order_acquire); }
+    void store(const T& next) noexcept {
+        Bits<sizeof(T)> copied = 0;
+        std::memcpy(&copied, static_cast<const void*>(&next), sizeof(T));
+        bits.store(copied, std::memory_order_release);
+    }
+
+    T load() const noexcept {
+        const Bits<sizeof(T)> copied = bits.load(std::memory_order_acquire);
+        T value;
+        std::memcpy(static_cast<void*>(&value), &copied, sizeof(T));
+        return value;
+    }
 
     /// Something that holds the value there is now.
     std::optional<T> held() const noexcept { return load(); }
 
 private:
-    std::atomic<T> value{T{}};
+    std::atomic<Bits<sizeof(T)>> bits{0};
 };
 
 /// The published value of any other type, as an immutable snapshot with a version. Thread-safe.

@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <cstdint>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -87,6 +88,16 @@ TEST_F(SettingTest, OfAnOptionalTypeIsNothingWithoutAValue) {
     EXPECT_EQ(limit.get(), std::nullopt);
     store->set("limit", 5);
     EXPECT_THAT(limit.get(), Optional(5));
+}
+
+enum class Level : std::uint8_t { low, high };
+
+TEST_F(SettingTest, OfASmallTypeIsOneAtomic) {
+    EXPECT_TRUE(detail::fitsAtomic<Level>);
+    EXPECT_TRUE(detail::fitsAtomic<std::optional<int>>);
+    EXPECT_TRUE(detail::fitsAtomic<std::chrono::nanoseconds>);
+    EXPECT_FALSE(detail::fitsAtomic<std::string>);
+    EXPECT_FALSE(detail::fitsAtomic<std::optional<double>>);
 }
 
 TEST_F(SettingTest, TakesABracedListAsDefault) {
