@@ -1,0 +1,45 @@
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "framework/common/Export.hpp"
+
+namespace velkor::settings {
+
+/// A key that the process has declared, by a `Setting` or a field of a `Bound`, and how it stands.
+struct Description {
+    std::string key;
+    std::string type;                          ///< "int", "duration in milliseconds"
+    std::optional<std::string> defaultText{};  ///< ••• if the setting is secret.
+    std::optional<std::string> value{};  ///< ••• if it is secret; nothing if there is none.
+    std::string source;                  ///< Empty: the default.
+    std::string constraint;              ///< "between 1 and 65535"; empty if there is none.
+    std::string description;
+    bool secret = false;
+    bool needsRestart = false;
+    std::optional<std::string> error{};  ///< As in `Status`, of a struct that of the whole.
+};
+
+/// All settings of `store` that there are now, by key; those of the same key in no order. Calls no
+/// store. Thread-safe.
+VELKOR_EXPORT std::vector<Description> describe(
+    const std::shared_ptr<configuration::ConfigurationImpl>& store);
+
+/// A key of a store that no setting has.
+struct UndeclaredKey {
+    std::string key;
+    std::optional<std::string> meant{};  ///< The declared key that it is a near miss of, if any.
+};
+
+/// The keys of `store` that nobody has declared, sorted. A near miss is the nearest declared key
+/// that differs in the case of letters, "-", "_" or ".", or otherwise in at most two characters, in
+/// keys of less than eight in one: inserted, left out, replaced, or two neighbours exchanged.
+/// Compares each with all declared keys. Throws what sources throw. Thread-safe.
+VELKOR_EXPORT std::vector<UndeclaredKey> undeclaredKeys(
+    const std::shared_ptr<configuration::ConfigurationImpl>& store);
+
+}  // namespace velkor::settings

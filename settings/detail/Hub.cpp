@@ -1,0 +1,151 @@
+#include "settings/detail/Hub.hpp"
+
+#include <algorithm>
+#include <map>
+#include <set>
+#include <utility>
+
+#include "framework/reactive_streams/CallbackSubscriber.hpp"
+#include "settings/Loggers.hpp"
+#include "settings/detail/SettingState.hpp"
+
+namespace velkor::settings::detail {
+
+namespace {
+
+using configuration::ConfigurationImpl;
+using configuration::OptionChange;
+
+/// The hubs of all stores. A store is known by its ownership, not by its address.
+class Hubs {
+public:
+    std::shared_ptr<Hub> find(const std::weak_ptr<ConfigurationImpl>& store) {
+        const common::MutexLock lock(mutex);
+        const auto found = hubs.find(store);
+        return found == hubs.end() ? nullptr : found->second.lock();
+    }
+
+    /// `made`, or the hub that another thread has entered meanwhile.
+    std::shared_ptr<Hub> enter(const std::weak_ptr<ConfigurationImpl>& store,
+                               const std::shared_ptr<Hub>& made) {
+        const common::MutexLock lock(mutex);
+        std::weak_ptr<Hub>& entry = hubs[store];
+        auto known = entry.lock();
+        if (known != nullptr) return known;
+        entry = made;
+        return made;
+    }
+
+    void forget(const std::weak_ptr<ConfigurationImpl>& store) {
+        const common::MutexLock lock(mutex);
+        const auto found = hubs.find(store);
+        if (found != hubs.end() && found->second.expired()) hubs.erase(found);
+    }
+
+private:
+    common::Mutex mutex;
+    std::map<std::weak_ptr<ConfigurationImpl>, std::weak_ptr<Hub>, std::owner_less<>> hubs
+        VELKOR_GUARDED_BY(mutex);
+};
+
+// Made on first use, since settings may be static objects of other libraries.
+Hubs& hubs() {
+    static Hubs instance;
+    return instance;
+}
+
+}  // namespace
+
+std::shared_ptr<Hub> Hub::find(const std::shared_ptr<ConfigurationImpl>& store) {
+    return hubs().find(store);
+}
+
+std::shared_ptr<Hub> Hub::of(const std::shared_ptr<ConfigurationImpl>& store) {
+    auto known = find(store);
+    if (known != nullptr) return known;
+    // It watches before others can find it. The store is not called under the mutex of `Hubs`, so
+    // two threads may make one each; one of them goes again.
+    const auto made = std::make_shared<Hub>(store);
+    made->watch(false);
+    return hubs().enter(store, made);
+}
+
+Hub::Hub(const std::shared_ptr<ConfigurationImpl>& followed) : store(followed) {}
+
+Hub::~Hub() {
+    hubs().forget(store);
+}
+
+void Hub::watch(bool again) {
+    const auto alive = store.lock();
+    if (alive == nullptr) return;
+    const auto stream = alive->watchChanges("");
+    // What changes meanwhile is kept in the stream, so that nobody else delivers.
+    if (again) {
+        for (const auto& state : states()) state->refresh();
+    }
+    const auto self = weak_from_this();
+    reactive_streams::Callbacks<OptionChange> callbacks;
+    callbacks.onValue = [self](OptionChange&& change) {
+        if (const auto hub = self.lock()) hub->pass(change);
+    };
+    // A source has thrown instead of giving its value: whatever can be read is read again.
+    callbacks.onError = [self](const std::exception_ptr&) {
+        if (const auto hub = self.lock()) hub->watch(true);
+    };
+    handle = reactive_streams::subscribe(*stream, std::move(callbacks));
+}
+
+void Hub::pass(const OptionChange& change) const {
+    for (const auto& state : statesOf(change.key)) {
+        try {
+            state->onChange(change);
+        } catch (const std::exception& error) {
+            state->fail(error.what());
+        }
+    }
+}
+
+Hub::States Hub::statesOf(const std::string& key) const {
+    States found;
+    const common::MutexLock lock(mutex);
+    const auto entries = byKey.find(key);
+    if (entries == byKey.end()) return found;
+    for (const Entry& entry : entries->second) {
+        if (auto state = entry.state.lock()) found.push_back(std::move(state));
+    }
+    return found;
+}
+
+std::vector<std::shared_ptr<SettingState>> Hub::states() const {
+    std::set<std::shared_ptr<SettingState>> found;
+    {
+        const common::MutexLock lock(mutex);
+        for (const auto& [key, entries] : byKey) {
+            for (const Entry& entry : entries) {
+                if (auto state = entry.state.lock()) found.insert(std::move(state));
+            }
+        }
+    }
+    return {found.begin(), found.end()};
+}
+
+void Hub::add(const std::shared_ptr<SettingState>& state) {
+    const common::MutexLock lock(mutex);
+    for (const Declared& key : state->keys()) byKey[key.key].push_back({state.get(), state});
+}
+
+void Hub::remove(const SettingState& state) {
+    const common::MutexLock lock(mutex);
+    for (const Declared& key : state.keys()) {
+        const auto found = byKey.find(key.key);
+        if (found == byKey.end()) continue;
+        auto& entries = found->second;
+        entries.erase(std::remove_if(entries.begin(), entries.end(),
+                                     [&](const Entry& entry) { return entry.identity == &state; }),
+                      entries.end());
+        if (entries.empty()) byKey.erase(found);
+    }
+}
+
+}  // namespace velkor::settings::detail

@@ -1,0 +1,133 @@
+#include "settings/Describe.hpp"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "settings/Bound.hpp"
+#include "settings/Setting.hpp"
+#include "tests/configuration/StoreTesting.hpp"
+
+namespace velkor::settings::testing {
+namespace {
+
+using ::testing::ElementsAre;
+using ::testing::Optional;
+
+struct Server {
+    int port = 0;
+    std::string host{};
+};
+
+class DescribeTest : public velkor::testing::StoreTest {
+protected:
+    std::vector<std::string> keys() const {
+        std::vector<std::string> all;
+        for (const Description& setting : describe(store)) all.push_back(setting.key);
+        return all;
+    }
+
+    std::optional<std::string> meantBy(const std::string& key) const {
+        store->set(key, 1);
+        for (const UndeclaredKey& undeclared : undeclaredKeys(store)) {
+            if (undeclared.key == key) return undeclared.meant;
+        }
+        return "declared";
+    }
+};
+
+TEST_F(DescribeTest, ListsNothingWhereNothingIsDeclared) {
+    EXPECT_TRUE(describe(store).empty());
+}
+
+TEST_F(DescribeTest, ListsSettingsAndFieldsByKey) {
+    const Setting<int> limit(store, "limit", 1);
+    const Bound<Server> server(store, "server",
+                               fields(&Server::port, "port", 1, &Server::host, "host", "h"));
+    const Setting<bool> debug(store, "debug", false);
+    EXPECT_THAT(keys(), ElementsAre("debug", "limit", "server.host", "server.port"));
+}
+
+TEST_F(DescribeTest, ListsNoSettingThatIsGone) {
+    const Setting<int> limit(store, "limit", 1);
+    { const Setting<bool> debug(store, "debug", false); }
+    EXPECT_THAT(keys(), ElementsAre("limit"));
+}
+
+TEST_F(DescribeTest, ListsNoSettingOfAnotherStore) {
+    const auto other = std::make_shared<configuration::ConfigurationImpl>();
+    const Setting<int> limit(other, "limit", 1);
+    EXPECT_TRUE(describe(store).empty());
+}
+
+TEST_F(DescribeTest, TellsAllThatIsDeclared) {
+    store->set("limit", 7);
+    const Setting<int> limit(store, "limit", 1, needsRestart(), atLeast(1),
+                             description("how many"));
+    const Description setting = describe(store).front();
+    EXPECT_EQ(setting.type, "int");
+    EXPECT_THAT(setting.defaultText, Optional(std::string("1")));
+    EXPECT_THAT(setting.value, Optional(std::string("7")));
+    EXPECT_EQ(setting.source, "override");
+    EXPECT_EQ(setting.constraint, "at least 1");
+    EXPECT_EQ(setting.description, "how many");
+    EXPECT_TRUE(setting.needsRestart);
+    EXPECT_FALSE(setting.secret);
+    EXPECT_EQ(setting.error, std::nullopt);
+}
+
+TEST_F(DescribeTest, HidesSecrets) {
+    const Setting<std::string> password(store, "password", "verysecret", secret());
+    const Description setting = describe(store).front();
+    EXPECT_TRUE(setting.secret);
+    EXPECT_THAT(setting.defaultText, Optional(std::string("•••")));
+    EXPECT_THAT(setting.value, Optional(std::string("•••")));
+}
+
+TEST_F(DescribeTest, TellsOfErrors) {
+    const Setting<int> limit(store, "limit", 1);
+    store->set("limit", "many");
+    EXPECT_EQ(describe(store).front().error, limit.status().error);
+}
+
+TEST_F(DescribeTest, ListsKeysThatNobodyDeclared) {
+    const Setting<int> port(store, "server.port", 1);
+    store->set("server.port", 1);
+    store->set("colour", 1);
+    const auto undeclared = undeclaredKeys(store);
+    ASSERT_EQ(undeclared.size(), 1U);
+    EXPECT_EQ(undeclared[0].key, "colour");
+    EXPECT_EQ(undeclared[0].meant, std::nullopt);
+}
+
+TEST_F(DescribeTest, RecognisesNearMisses) {
+    const Setting<int> timeout(store, "server.idleTimeout", 1);
+    const Setting<int> port(store, "port", 1);
+    const std::optional<std::string> wanted("server.idleTimeout");
+    for (const std::string key :
+         {"server.idle-timeout", "SERVER_IDLE_TIMEOUT", "server.idelTimeout", "server.idleTimeuot",
+          "sever.idleTimeout", "server.idleTimeouts", "srver.idleTimeoutt"}) {
+        EXPECT_EQ(meantBy(key), wanted) << key;
+    }
+    EXPECT_EQ(meantBy("prt"), std::optional<std::string>("port"));
+}
+
+TEST_F(DescribeTest, TakesNothingElseForANearMiss) {
+    const Setting<int> timeout(store, "server.idleTimeout", 1);
+    const Setting<int> port(store, "port", 1);
+    for (const std::string key : {"server.timeout", "server.idleTime", "pot2", "host"}) {
+        EXPECT_EQ(meantBy(key), std::nullopt) << key;
+    }
+}
+
+TEST_F(DescribeTest, PrefersTheNearest) {
+    const Setting<int> first(store, "worker.count", 1);
+    const Setting<int> second(store, "worker.count22", 1);
+    EXPECT_EQ(meantBy("worker.count222"), std::optional<std::string>("worker.count22"));
+}
+
+}  // namespace
+}  // namespace velkor::settings::testing
