@@ -81,7 +81,7 @@ public:
         {
             const common::MutexLock lock(mutex);
             if (status != FutureStatus::pending) return;
-            result = std::exception_ptr();
+            result.template emplace<std::exception_ptr>();
             status = FutureStatus::exception;
             if (continuation != nullptr) next = claim(std::move(continuation), self);
         }
