@@ -122,9 +122,11 @@ class Bound {
 public:
     using Reader = settings::Reader<Struct>;
 
-    /// `parts` are what `fields` gives, and validators: callables that take a `const Struct&` and
-    /// give a text, empty if all is well, or a `std::optional<Reason>`. They may be called by
-    /// several threads. Throws as the constructor of `Setting`, `SettingError` with all errors.
+    /// Each key is `prefix`, a point and the name of the field; with an empty prefix the name
+    /// alone. `parts` are what `fields` gives, and validators: callables that take a `const
+    /// Struct&` and give a text, empty if all is well, or a `std::optional<Reason>`. They may be
+    /// called by several threads. Throws as the constructor of `Setting`, `SettingError` with all
+    /// errors.
     template <class... Parts>
     Bound(const std::shared_ptr<configuration::ConfigurationImpl>& store, std::string prefix,
           const Fields<Struct>& first, Parts&&... parts)

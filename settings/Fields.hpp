@@ -52,7 +52,7 @@ private:
     template <class Member>
     void addTo(Draft<Member> draft) {
         makers.push_back([draft = std::move(draft)](const std::string& prefix) {
-            detail::KeyRule<Member> rule(prefix + "." + draft.name);
+            detail::KeyRule<Member> rule(prefix.empty() ? draft.name : prefix + "." + draft.name);
             if (draft.fallback) rule.setDefault(*draft.fallback);
             for (const auto& modify : draft.modifiers) modify(rule);
             rule.requireRightDefault();

@@ -66,7 +66,7 @@ std::shared_ptr<Hub> Hub::of(const std::shared_ptr<ConfigurationImpl>& store) {
     // It watches before others can find it. The store is not called under the mutex of `Hubs`, so
     // two threads may make one each; one of them goes again.
     const auto made = std::make_shared<Hub>(store);
-    made->watch(false);
+    made->watch(0);
     return hubs().enter(store, made);
 }
 
@@ -76,12 +76,12 @@ Hub::~Hub() {
     hubs().forget(store);
 }
 
-void Hub::watch(bool again) {
+void Hub::watch(std::uint64_t attempt) {
     const auto alive = store.lock();
     if (alive == nullptr) return;
     const auto stream = alive->watchChanges("");
     // What changes meanwhile is kept in the stream, so that nobody else delivers.
-    if (again) {
+    if (attempt > 0) {
         for (const auto& state : states()) state->refresh();
     }
     const auto self = weak_from_this();
@@ -90,10 +90,14 @@ void Hub::watch(bool again) {
         if (const auto hub = self.lock()) hub->pass(change);
     };
     // A source has thrown instead of giving its value: whatever can be read is read again.
-    callbacks.onError = [self](const std::exception_ptr&) {
-        if (const auto hub = self.lock()) hub->watch(true);
+    callbacks.onError = [self, attempt](const std::exception_ptr&) {
+        if (const auto hub = self.lock()) hub->watch(attempt + 1);
     };
-    handle = reactive_streams::subscribe(*stream, std::move(callbacks));
+    auto opened = reactive_streams::subscribe(*stream, std::move(callbacks));
+    const common::MutexLock lock(mutex);  // given back before the handle that is replaced ends
+    if (attempt < newest) return;
+    newest = attempt;
+    std::swap(handle, opened);
 }
 
 void Hub::pass(const OptionChange& change) const {

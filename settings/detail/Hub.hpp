@@ -1,6 +1,7 @@
 #pragma once
 
 #include <boost/container/small_vector.hpp>
+#include <cstdint>
 #include <exception>
 #include <memory>
 #include <string>
@@ -51,15 +52,16 @@ private:
         std::weak_ptr<SettingState> state;
     };
 
-    void watch(bool again);
+    void watch(std::uint64_t attempt) VELKOR_EXCLUDES(mutex);
     void pass(const configuration::OptionChange& change) const VELKOR_EXCLUDES(mutex);
     States statesOf(const std::string& key) const VELKOR_EXCLUDES(mutex);
 
     const std::weak_ptr<configuration::ConfigurationImpl> store;
     mutable common::Mutex mutex;
     std::unordered_map<std::string, std::vector<Entry>> byKey VELKOR_GUARDED_BY(mutex);
-    // Written by the thread that makes the hub, then only by the end of the watch itself.
-    reactive_streams::SubscriptionHandle handle;
+    // The newest watch and its number: one may have failed before its handle is kept here.
+    reactive_streams::SubscriptionHandle handle VELKOR_GUARDED_BY(mutex);
+    std::uint64_t newest VELKOR_GUARDED_BY(mutex) = 0;
 };
 
 }  // namespace velkor::settings::detail

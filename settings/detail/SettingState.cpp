@@ -105,7 +105,6 @@ void SettingState::deliver(std::uint64_t newVersion,
 
 // Whether the values of the keys are other ones than before.
 bool SettingState::stand(Verdict& verdict) {
-    const auto now = std::chrono::system_clock::now();
     bool changes = false;
     const common::MutexLock lock(mutex);
     for (std::size_t i = 0; i < verdict.standings.size(); ++i) {
@@ -113,7 +112,7 @@ bool SettingState::stand(Verdict& verdict) {
         const bool isNew = i >= standing.size();
         const bool differs = isNew || next.value != standing[i].value;
         const bool moved = isNew || next.source != standing[i].source;
-        next.since = differs || moved ? now : standing[i].since;
+        next.since = differs || moved ? std::chrono::system_clock::now() : standing[i].since;
         changes = changes || differs;
     }
     standing.swap(verdict.standings);

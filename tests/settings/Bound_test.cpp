@@ -62,6 +62,12 @@ TEST_F(BoundTest, TakesFieldsFromSeveralParts) {
     EXPECT_EQ(server.snapshot()->host, "h");
 }
 
+TEST_F(BoundTest, NeedsNoPrefix) {
+    store->set("port", 1);
+    const Bound<Server> server(store, "", fields(&Server::port, "port"));
+    EXPECT_EQ(server.snapshot()->port, 1);
+}
+
 TEST_F(BoundTest, FollowsEachKey) {
     const Bound<Server> server(store, "server", all());
     store->set("server.port", 1);
