@@ -16,7 +16,6 @@
 namespace velkor::settings::testing {
 namespace {
 
-using configuration::Change;
 using configuration::ConfigurationValue;
 using ::testing::ElementsAre;
 using ::testing::Optional;
