@@ -110,6 +110,7 @@ Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Ch
     for (std::size_t i = 0; i < changes.size(); ++i) {
         if (changes[i].value || outcome[i].before) changed.push_back(changes[i].key);
     }
+    if (!changed.empty()) version.fetch_add(1, std::memory_order_release);
     tellAll(operation.mutexLevel(), unique(changed));
     return makeReadyFuture(outcome);
 }

@@ -146,8 +146,10 @@ TEST_F(Apply, TellsWhatASourceWithoutAListenerTakes) {
     source->whenKeys = [] { throw std::logic_error("no keys"); };
     EXPECT_THROW(store->addSource("new", "", -1, false, source), std::logic_error);
     const Watch watched = watch("a");
+    const auto before = version();
     store->apply({setting("a", 1)}).get();
     EXPECT_THAT(watched.values(), ElementsAre("int 1"));
+    EXPECT_GT(version(), before);
 }
 
 TEST_F(Apply, ReleasesTheStoreWhileWatchersAreTold) {
