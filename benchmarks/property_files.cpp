@@ -1,7 +1,8 @@
-// Reading a property file.
+// Reading a property file, and what is read of it.
 
 #include <Poco/AutoPtr.h>
 #include <Poco/Util/PropertyFileConfiguration.h>
+#include <glib.h>
 
 #include <filesystem>
 #include <fstream>
@@ -11,6 +12,7 @@
 #include <utility>
 
 #include "benchmarks/support/FloorParser.hpp"
+#include "benchmarks/support/FloorStore.hpp"
 #include "benchmarks/support/Harness.hpp"
 #include "benchmarks/support/PropertyText.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
@@ -40,6 +42,14 @@ void requireSameProperties(const TemporaryFile& file) {
     if (!same) throw std::logic_error("the floor parser reads something else");
 }
 
+void readKeyFile(const TemporaryFile& file) {
+    const std::unique_ptr<GKeyFile, decltype(&g_key_file_unref)> keys(g_key_file_new(),
+                                                                      g_key_file_unref);
+    if (!g_key_file_load_from_file(keys.get(), file.path().c_str(), G_KEY_FILE_NONE, nullptr)) {
+        throw std::runtime_error("GLib refuses its file");
+    }
+}
+
 // Reads a file of `entries` with the function `read`.
 template <class Read>
 void measureRead(const std::string& name, std::size_t entries, Read read) {
@@ -63,6 +73,54 @@ void measureFile(const std::string& size, std::size_t entries) {
         keep(Poco::AutoPtr<Poco::Util::PropertyFileConfiguration>(
             new Poco::Util::PropertyFileConfiguration(file.path().string())));
     });
+    measure(name + "key-file",
+            [entries] {
+                return [file = std::make_shared<TemporaryFile>(keyFileText(entries))] {
+                    readKeyFile(*file);
+                };
+            })
+        .perItemOf(entries)
+        .counted(0);
+}
+
+Store storeOf(const std::string& text) {
+    Store store = emptyStore();
+    store->addSource("only", "", 0, true,
+                     std::make_shared<PropertyFileSource>(configuration::PropertyText{text}));
+    return store;
+}
+
+// Looks `count` keys up in turn in what `hold` makes of their text; of a million so many different
+// ones that they don't stay in the caches.
+template <class Hold>
+void measureGet(const std::string& contender, std::size_t count, Hold hold) {
+    const bool large = count > 100'000;
+    measure("property-file/get/keys:" + std::to_string(count) + "/" + contender, [count, large,
+                                                                                  hold] {
+        return [held = hold(propertyText(count)),
+                keys = KeyCycle(count, large ? 16'384 : 256)]() mutable {
+            keep(held->get(keys.next()).get());
+        };
+    }).counted(large ? 0 : 1024);
+}
+
+std::shared_ptr<FloorStore> floorOf(const std::string& text) {
+    return std::make_shared<FloorStore>(floorParse(text));
+}
+
+// Weighs what `hold` makes of a text, for each key.
+template <class Hold>
+void weigh(const std::string& contender, Hold hold) {
+    constexpr std::size_t count = 100'000;
+    measure("property-file/memory/" + contender,
+            [hold] {
+                using Held = decltype(hold(std::string()));
+                return [text = propertyText(count), hold, held = Held()]() mutable {
+                    held = hold(text);
+                };
+            })
+        .perItemOf(count)
+        .weighsHeap();
 }
 
 }  // namespace
@@ -70,6 +128,12 @@ void measureFile(const std::string& size, std::size_t entries) {
 void addOperations() {
     measureFile("100KB", 2'270);
     measureFile("10MB", 221'000);
+    for (const std::size_t count : {std::size_t{10}, std::size_t{10'000}, std::size_t{1'000'000}}) {
+        measureGet("floor", count, floorOf);
+        measureGet("velkor", count, storeOf);
+    }
+    weigh("floor", floorOf);
+    weigh("velkor", storeOf);
 }
 
 }  // namespace velkor::benchmarks

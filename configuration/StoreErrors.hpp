@@ -18,6 +18,8 @@ inline constexpr const char* changesRefused = "Changes refused: ";
 inline constexpr const char* writingNotSupported = "PropertyFileSource does not support writing";
 inline constexpr const char* duplicateSource = "Source with the requested name already exists: ";
 inline constexpr const char* nullSource = "A configuration source must not be null.";
+// As the standard library says it of its own tables, in some of its versions.
+inline constexpr const char* notInTable = "_Map_base::at";
 inline constexpr const char* nullText = "A text must not be null.";
 inline constexpr const char* fileNotOpened = "Property file could not be opened: ";
 

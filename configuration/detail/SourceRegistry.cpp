@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "configuration/sources/PropertyFileSource.hpp"
 #include "configuration/sources/TableSource.hpp"
 
 namespace velkor::configuration::detail {
@@ -25,12 +26,16 @@ std::string normalisedGroup(std::string group) {
 RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
     : ConfigurationSourceMap(std::move(entry)),
       table(nullptr),
+      texts(nullptr),
       forgetting(dynamic_cast<ForgettingSource*>(source.get())),
       attached(dynamic_cast<AttachedSource*>(source.get())),
       foreign(true) {
     if (const auto* const answering = dynamic_cast<const TableSource*>(source.get())) {
         table = answering->table();
         foreign = !answering->isBuiltIn();
+    } else if (const auto* const file = dynamic_cast<const PropertyFileSource*>(source.get())) {
+        texts = file->table();
+        foreign = texts == nullptr;
     }
 }
 
@@ -96,8 +101,11 @@ Layer SourceRegistry::nextHolder(const SourcePtr* from, const SourcePtr* end,
         if (entry.table != nullptr) {
             const ConfigurationValue* held = entry.table->find(relativeKey);
             if (held != nullptr) return {from, &relativeKey, held};
+        } else if (entry.texts != nullptr) {
+            const TextTable::Property* text = entry.texts->find(relativeKey);
+            if (text != nullptr) return {from, &relativeKey, nullptr, text};
         } else if (entry.source->has(relativeKey)) {
-            return {from, &relativeKey, nullptr};
+            return {from, &relativeKey};
         }
     }
     return {};
@@ -137,7 +145,7 @@ void SourceRegistry::replace(SourceList changed) {
     foreign =
         std::any_of(next->begin(), next->end(), [](const auto& entry) { return entry->foreign; });
     asked = std::any_of(next->begin(), next->end(),
-                        [](const auto& entry) { return entry->table == nullptr; });
+                        [](const auto& entry) { return !entry->hasTable(); });
 }
 
 }  // namespace velkor::configuration::detail

@@ -12,6 +12,7 @@
 #include "configuration/sources/ConfigurationSourceMap.hpp"
 #include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/SourceDescription.hpp"
+#include "configuration/sources/TextTable.hpp"
 #include "configuration/sources/ValueTable.hpp"
 
 namespace velkor::configuration::detail {
@@ -23,28 +24,37 @@ std::string normalisedGroup(std::string group);
 struct RegisteredSource : ConfigurationSourceMap {
     explicit RegisteredSource(ConfigurationSourceMap entry);
 
+    /// Whether it answers from a table, which is looked up without it.
+    bool hasTable() const { return table != nullptr || texts != nullptr; }
+
     /// Whether the keys of the source may be asked for `key`.
     bool appliesTo(const std::string& key) const {
         return group.empty() || (key.size() >= group.size() &&
                                  std::memcmp(key.data(), group.data(), group.size()) == 0);
     }
 
-    const ValueTable* table;       ///< What it answers from; null: the source itself is asked.
+    const ValueTable* table;       ///< What it answers from; null: not from such a table.
+    const TextTable* texts;        ///< The same for texts. Neither: the source itself is asked.
     ForgettingSource* forgetting;  ///< The source, if keys can be taken out of it; else null.
     AttachedSource* attached;      ///< The source, if it is told of its registration; else null.
     bool foreign;                  ///< It is not of one of this library's own classes.
     bool reportsChanges = false;   ///< The store's listener is installed.
 };
 
-/// The layer that decides a key, the key as its source knows it, and the value if it stands in the
-/// source's table.
+/// The layer that decides a key, the key as its source knows it, and the value if it stands in a
+/// table of the source.
 struct Layer {
     const std::shared_ptr<RegisteredSource>* position = nullptr;  ///< In the list; null: none.
     const std::string* relativeKey = nullptr;
     const ConfigurationValue* held = nullptr;
+    const TextTable::Property* text = nullptr;
 
     const RegisteredSource& entry() const { return **position; }
-    ConfigurationValue value() const { return held ? *held : entry().source->get(*relativeKey); }
+    ConfigurationValue value() const {
+        if (held != nullptr) return *held;
+        if (text != nullptr) return std::string(entry().texts->valueOf(*text));
+        return entry().source->get(*relativeKey);
+    }
     explicit operator bool() const { return position != nullptr; }
 };
 

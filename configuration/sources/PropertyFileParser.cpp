@@ -4,7 +4,8 @@
 #include <boost/locale/utf.hpp>
 #include <charconv>
 #include <cstdint>
-#include <iterator>
+#include <cstring>
+#include <utility>
 
 #include "configuration/Loggers.hpp"
 
@@ -57,14 +58,17 @@ std::uint32_t hexadecimalPrefix(std::string_view digits) {
 
 }  // namespace
 
-PropertyFileParser::PropertyFileParser(std::string_view fileText, ValueMap& table)
-    : text(fileText), properties(table) {}
+PropertyFileParser::PropertyFileParser(std::string content) : text(std::move(content)) {}
 
-void PropertyFileParser::parse() {
+TextTable PropertyFileParser::parse() {
     State state = State::lineStart;
     while (!atEnd()) state = step(state);
     // A last line needs no line break, but it does need a key and a separator.
-    if (state == State::value && !key.empty()) storeProperty("Parsed final property: ");
+    const bool hasKey = current.key != current.value;
+    if (state == State::value && hasKey) storeProperty("Parsed final property: ");
+    text.resize(current.key);
+    properties.push_back({text.size(), text.size()});
+    return {std::move(text), std::move(properties)};
 }
 
 PropertyFileParser::State PropertyFileParser::step(State state) {
@@ -88,11 +92,11 @@ PropertyFileParser::State PropertyFileParser::step(State state) {
 }
 
 PropertyFileParser::State PropertyFileParser::onLineStart() {
-    if (lineBreaks.contains(current())) {
+    if (lineBreaks.contains(next())) {
         ++position;
         return State::lineStart;
     }
-    if (commentMarks.contains(current())) {
+    if (commentMarks.contains(next())) {
         position = lineBreaks.findIn(text, position);
         return State::lineStart;
     }
@@ -101,38 +105,38 @@ PropertyFileParser::State PropertyFileParser::onLineStart() {
 
 PropertyFileParser::State PropertyFileParser::onKey() {
     const std::size_t end = keyEnds.findIn(text, position);
-    key.append(text, position, end - position);
-    position = end;
+    takeUntil(end);
     if (atEnd()) return State::key;
-    const bool escape = current() == '\\';
+    const bool escape = next() == '\\';
     ++position;
-    return escape ? State::keyEscape : State::separator;
+    if (escape) return State::keyEscape;
+    current.value = taken;
+    return State::separator;
 }
 
 PropertyFileParser::State PropertyFileParser::onKeyEscape() {
-    appendEscaped(key);
+    takeEscaped();
     return State::key;
 }
 
 // Any blanks, then at most one assignment sign; behind the sign one more blank belongs to it.
 PropertyFileParser::State PropertyFileParser::onSeparator() {
-    if (blanks.contains(current())) {
+    if (blanks.contains(next())) {
         ++position;
         return State::separator;
     }
-    if (assignments.contains(current())) {
+    if (assignments.contains(next())) {
         ++position;
-        if (!atEnd() && blanks.contains(current())) ++position;
+        if (!atEnd() && blanks.contains(next())) ++position;
     }
     return State::value;
 }
 
 PropertyFileParser::State PropertyFileParser::onValue() {
     const std::size_t end = valueEnds.findIn(text, position);
-    value.append(text, position, end - position);
-    position = end;
+    takeUntil(end);
     if (atEnd()) return State::value;
-    const bool escape = current() == '\\';
+    const bool escape = next() == '\\';
     ++position;
     if (escape) return State::valueEscape;
     storeProperty("Parsed property: ");
@@ -140,46 +144,56 @@ PropertyFileParser::State PropertyFileParser::onValue() {
 }
 
 PropertyFileParser::State PropertyFileParser::onValueEscape() {
-    if (lineBreaks.contains(current())) {
+    if (lineBreaks.contains(next())) {
         ++position;
         return State::continuationIndent;
     }
-    appendEscaped(value);
+    takeEscaped();
     return State::value;
 }
 
 PropertyFileParser::State PropertyFileParser::onContinuationIndent() {
-    if (!continuationIndents.contains(current())) return State::value;
+    if (!continuationIndents.contains(next())) return State::value;
     ++position;
     return State::continuationIndent;
 }
 
-void PropertyFileParser::appendEscaped(std::string& target) {
-    const char escaped = current();
+void PropertyFileParser::takeUntil(std::size_t end) {
+    const std::size_t size = end - position;
+    std::memmove(text.data() + taken, text.data() + position, size);
+    taken += size;
+    position = end;
+}
+
+void PropertyFileParser::takeEscaped() {
+    const char escaped = next();
     ++position;
     if (escaped == 'u') {
-        appendUnicodeEscape(target);
+        takeUnicodeEscape();
     } else {
-        target += escaped;
+        text[taken++] = escaped;
     }
 }
 
-void PropertyFileParser::appendUnicodeEscape(std::string& target) {
+void PropertyFileParser::takeUnicodeEscape() {
     constexpr std::uint32_t lastCodePoint = 0x10FFFF;
-    const std::string_view digits = text.substr(position, unicodeEscapeLength);
+    const std::string_view digits = std::string_view(text).substr(position, unicodeEscapeLength);
     position += digits.size();
     const std::uint32_t codePoint = hexadecimalPrefix(digits);
+    if (codePoint > lastCodePoint) return;
     // Surrogates are encoded one by one, as any other code point.
-    if (codePoint <= lastCodePoint) {
-        boost::locale::utf::utf_traits<char>::encode(codePoint, std::back_inserter(target));
-    }
+    char* const target = text.data() + taken;
+    char* const end = boost::locale::utf::utf_traits<char>::encode(codePoint, target);
+    taken += static_cast<std::size_t>(end - target);
 }
 
 void PropertyFileParser::storeProperty(std::string_view logPrefix) {
-    properties.insert_or_assign(key, ConfigurationValue(value));
-    propertyFileLogger.write(common::trace, logPrefix, key, " = ", value);
-    key.clear();
-    value.clear();
+    const std::string_view all = text;
+    properties.push_back(current);
+    propertyFileLogger.write(common::trace, logPrefix,
+                             all.substr(current.key, current.value - current.key), " = ",
+                             all.substr(current.value, taken - current.value));
+    current = {taken, taken};
 }
 
 }  // namespace velkor::configuration

@@ -3,12 +3,13 @@
 #include <cstddef>
 #include <string>
 #include <string_view>
+#include <vector>
 
-#include "configuration/ConfigurationValue.hpp"
+#include "configuration/sources/TextTable.hpp"
 
 namespace velkor::configuration {
 
-/// Reads the text of one property file into a table. Every byte sequence parses to something.
+/// Makes a table of the text of one property file. Every byte sequence parses to something.
 ///
 ///     # comment            ! comment             (first byte of a line only)
 ///     key = value          key: value            key value
@@ -19,10 +20,11 @@ namespace velkor::configuration {
 /// more. A key ends at a separator and not at a line break. A later line with the same key wins.
 class PropertyFileParser {
 public:
-    /// Parses `text`, which is read during `parse` only, into `properties`.
-    PropertyFileParser(std::string_view text, ValueMap& properties);
+    /// Takes over `content`, the whole file.
+    explicit PropertyFileParser(std::string content);
 
-    void parse();
+    /// To be called once.
+    TextTable parse();
 
 private:
     enum class State {
@@ -47,16 +49,19 @@ private:
     State step(State state);
 
     bool atEnd() const { return position == text.size(); }
-    char current() const { return text[position]; }
-    void appendEscaped(std::string& target);
-    void appendUnicodeEscape(std::string& target);
+    char next() const { return text[position]; }
+    void takeUntil(std::size_t end);
+    void takeEscaped();
+    void takeUnicodeEscape();
     void storeProperty(std::string_view logPrefix);
 
-    std::string_view text;
+    // What is taken of it moves up to its beginning, keys and values without a gap: nothing that
+    // stands for something else in a file is shorter than that.
+    std::string text;
     std::size_t position = 0;
-    ValueMap& properties;
-    std::string key;
-    std::string value;
+    std::size_t taken = 0;
+    TextTable::Property current = {0, 0};
+    std::vector<TextTable::Property> properties;
 };
 
 }  // namespace velkor::configuration

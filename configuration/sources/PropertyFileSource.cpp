@@ -1,12 +1,11 @@
 #include "configuration/sources/PropertyFileSource.hpp"
 
-#include <algorithm>
 #include <array>
 #include <cstddef>
 #include <istream>
 #include <locale>
 #include <stdexcept>
-#include <string_view>
+#include <utility>
 
 #include "configuration/StoreErrors.hpp"
 #include "configuration/sources/PropertyFileParser.hpp"
@@ -30,19 +29,7 @@ std::string readAll(std::istream& file) {
     return text;
 }
 
-ValueMap parseProperties(std::string_view text) {
-    ValueMap properties;
-    // A table that need not grow is filled half again as fast. Most lines hold one property; the
-    // limit keeps a file of nothing but line breaks from taking more memory than its own size.
-    constexpr std::ptrdiff_t usualProperty = 16;
-    const auto lines = std::count(text.begin(), text.end(), '\n');
-    const auto most = static_cast<std::ptrdiff_t>(text.size()) / usualProperty;
-    properties.reserve(static_cast<std::size_t>(std::min(lines, most)));
-    PropertyFileParser(text, properties).parse();
-    return properties;
-}
-
-ValueMap readProperties(const std::u16string& path) {
+TextTable readProperties(const std::u16string& path) {
     common::WidePathInputFileStream file(path);
     if (!file) {
         throw std::runtime_error(store_errors::fileNotOpened +
@@ -50,19 +37,37 @@ ValueMap readProperties(const std::u16string& path) {
     }
     // A stream begins with the host's locale, which may convert what is read.
     file.imbue(std::locale::classic());
-    return parseProperties(readAll(file));
+    return PropertyFileParser(readAll(file)).parse();
 }
 
 }  // namespace
 
 PropertyFileSource::PropertyFileSource(const std::u16string& path)
-    : TableSource(typeid(PropertyFileSource), readProperties(path), Origin::thisLibrary) {}
+    : properties(readProperties(path)) {}
 
 PropertyFileSource::PropertyFileSource(PropertyText text)
-    : TableSource(typeid(PropertyFileSource), parseProperties(text.content), Origin::thisLibrary) {}
+    : properties(PropertyFileParser(std::string(text.content)).parse()) {}
+
+PropertyFileSource::~PropertyFileSource() = default;
+
+ConfigurationValue PropertyFileSource::get(const std::string& key) {
+    return std::string(properties.at(key));
+}
 
 ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValue) {
     throw std::runtime_error(store_errors::writingNotSupported);
+}
+
+bool PropertyFileSource::has(const std::string& key) {
+    return properties.find(key) != nullptr;
+}
+
+void PropertyFileSource::setChangeListener(ChangeListener newListener) {
+    listener.swap(newListener);
+}
+
+std::set<std::string> PropertyFileSource::keys() {
+    return properties.keys();
 }
 
 }  // namespace velkor::configuration

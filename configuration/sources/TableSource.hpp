@@ -49,7 +49,6 @@ protected:
 
 private:
     friend class InMemorySource;
-    friend class PropertyFileSource;
 
     enum class Origin { thisLibrary, others };
 

@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "configuration/ConfigurationValue.hpp"
+#include "configuration/StoreErrors.hpp"
 
 namespace velkor::configuration {
 
@@ -32,8 +33,7 @@ public:
     /// A copy of the value of `key`; `std::out_of_range` "_Map_base::at" when there is none.
     ConfigurationValue at(const std::string& key) const {
         const ConfigurationValue* value = find(key);
-        // The text of the standard library's own look-up depends on its version.
-        if (value == nullptr) throw std::out_of_range("_Map_base::at");
+        if (value == nullptr) throw std::out_of_range(store_errors::notInTable);
         return *value;
     }
 
