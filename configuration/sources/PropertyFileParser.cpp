@@ -104,8 +104,7 @@ PropertyFileParser::State PropertyFileParser::onLineStart() {
 }
 
 PropertyFileParser::State PropertyFileParser::onKey() {
-    const std::size_t end = keyEnds.findIn(text, position);
-    takeUntil(end);
+    takeUpTo(keyEnds.findIn(text, position));
     if (atEnd()) return State::key;
     const bool escape = next() == '\\';
     ++position;
@@ -133,8 +132,7 @@ PropertyFileParser::State PropertyFileParser::onSeparator() {
 }
 
 PropertyFileParser::State PropertyFileParser::onValue() {
-    const std::size_t end = valueEnds.findIn(text, position);
-    takeUntil(end);
+    takeUpTo(valueEnds.findIn(text, position));
     if (atEnd()) return State::value;
     const bool escape = next() == '\\';
     ++position;
@@ -158,7 +156,7 @@ PropertyFileParser::State PropertyFileParser::onContinuationIndent() {
     return State::continuationIndent;
 }
 
-void PropertyFileParser::takeUntil(std::size_t end) {
+void PropertyFileParser::takeUpTo(std::size_t end) {
     const std::size_t size = end - position;
     std::memmove(text.data() + taken, text.data() + position, size);
     taken += size;

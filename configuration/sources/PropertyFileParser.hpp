@@ -50,17 +50,17 @@ private:
 
     bool atEnd() const { return position == text.size(); }
     char next() const { return text[position]; }
-    void takeUntil(std::size_t end);
+    void takeUpTo(std::size_t end);
     void takeEscaped();
     void takeUnicodeEscape();
     void storeProperty(std::string_view logPrefix);
 
-    // What is taken of it moves up to its beginning, keys and values without a gap: nothing that
-    // stands for something else in a file is shorter than that.
+    // Keys and values are gathered at its beginning, over what has been read: they never take more
+    // room than in the file.
     std::string text;
-    std::size_t position = 0;
-    std::size_t taken = 0;
-    TextTable::Property current = {0, 0};
+    std::size_t position = 0;              // of the next byte to be read
+    std::size_t taken = 0;                 // the size of what is gathered
+    TextTable::Property current = {0, 0};  // where that of this line begins
     std::vector<TextTable::Property> properties;
 };
 

@@ -3,8 +3,10 @@
 #include <memory>
 #include <string>
 
+#include "configuration/sources/PropertyFileSource.hpp"
 #include "tests/configuration/StoreTesting.hpp"
 #include "tests/support/AllocationCounter.hpp"
+#include "tests/support/ScarceMemory.hpp"
 
 #include <malloc.h>
 
@@ -142,6 +144,44 @@ TEST_F(StoreAllocations, MillionKeysCostHardlyMoreThanABareTable) {
     const std::size_t held = allocatedBytes() - before;
     EXPECT_GT(bare, static_cast<std::size_t>(keyCount) * sizeof(ConfigurationValue));
     EXPECT_LT(static_cast<double>(held), 1.3 * static_cast<double>(bare));
+}
+
+std::string manyProperties(int count) {
+    std::string text;
+    for (int number = 0; number < count; ++number) {
+        text += "# a comment\nsome.group.key" + std::to_string(number) + " = 4711\n";
+    }
+    return text;
+}
+
+TEST_F(StoreAllocations, KeyOfAPropertyFileCostsAtMost100BytesWithItsText) {
+    // One more than fit into the index at half its size.
+    constexpr int keyCount = (1 << 17) + 1;
+    const std::string text = manyProperties(keyCount);
+    const std::size_t before = allocatedBytes();
+    const PropertyFileSource source(PropertyText{text});
+    EXPECT_LT(allocatedBytes() - before, std::size_t{100} * keyCount);
+}
+
+TEST_F(StoreAllocations, KeyOfAPropertyFileTakesNoBlockOfItsOwn) {
+    const std::string text = manyProperties(10'000);
+    EXPECT_LT(countAllocations([&] { const PropertyFileSource source(PropertyText{text}); }), 100U);
+}
+
+TEST_F(StoreAllocations, GetOfAShortTextOfAPropertyFileMakesItsFutureOnly) {
+    store->addSource("file", "", -1, true,
+                     std::make_shared<PropertyFileSource>(PropertyText{"text = short\n"}));
+    EXPECT_EQ(countAllocations([&] { store->get("text"); }), oneFuture);
+}
+
+TEST_F(StoreAllocations, FailedAllocationWhileAPropertyFileIsParsedLosesNoBlock) {
+    const std::string text = manyProperties(100);
+    testing::failEachAllocation([&](testing::ScarceMemory& memory) {
+        memory.allows([&] {
+            PropertyFileSource source(PropertyText{text});
+            EXPECT_TRUE(source.has("some.group.key99"));
+        });
+    });
 }
 
 }  // namespace

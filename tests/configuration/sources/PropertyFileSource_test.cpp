@@ -14,8 +14,10 @@
 #include <string_view>
 #include <thread>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
+#include "configuration/ConfigurationImpl.hpp"
 #include "tests/configuration/sources/PropertyReading.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/LogCapture.hpp"
@@ -377,6 +379,68 @@ TEST(PropertyFileSourceText, NeedNotLiveOn) {
     PropertyFileSource source{PropertyText{text}};
     text.assign(text.size(), 'x');
     EXPECT_EQ(textOf(source.get("a")), "string 1");
+}
+
+/// One that derives from it and answers differently.
+class ShoutingSource : public PropertyFileSource {
+public:
+    using PropertyFileSource::PropertyFileSource;
+
+    bool has(const std::string& key) override {
+        return key == "loud" || PropertyFileSource::has(key);
+    }
+
+    ConfigurationValue get(const std::string& key) override {
+        return PropertyFileSource::has(key) ? textOf(PropertyFileSource::get(key)) + "!"
+                                            : std::string("!");
+    }
+};
+
+class PropertyFileInAStore : public ::testing::Test {
+protected:
+    template <class Source>
+    void add(const std::string& name, const std::string& group, int order, const char* text) {
+        store->addSource(name, group, order, true, std::make_shared<Source>(PropertyText{text}));
+    }
+
+    std::shared_ptr<ConfigurationImpl> store = std::make_shared<ConfigurationImpl>();
+};
+
+TEST_F(PropertyFileInAStore, IsReadFromItsTable) {
+    add<PropertyFileSource>("file", "app", 5, "a=1\n=2\n");
+    EXPECT_EQ(textOf(store->get("app.a").get()), "string 1");
+    EXPECT_EQ(textOf(store->get("app.").get()), "string 2");
+    EXPECT_EQ(store->getOption("app.a").get().source, "file");
+    EXPECT_FALSE(store->has("app.b").get());
+    EXPECT_FALSE(store->has("a").get());
+}
+
+TEST_F(PropertyFileInAStore, IsHiddenByAHigherFileAndShowsWhatThatHasNot) {
+    add<PropertyFileSource>("low", "", 5, "a=1\nb=2\n");
+    add<PropertyFileSource>("high", "", 4, "a=3\n");
+    EXPECT_EQ(textOf(store->get("a").get()), "string 3");
+    EXPECT_EQ(textOf(store->get("b").get()), "string 2");
+    const auto all = store->explain("a").get();
+    ASSERT_EQ(all.size(), 2U);
+    EXPECT_EQ(textOf(all[1].value), "string 1");
+}
+
+TEST_F(PropertyFileInAStore, DerivedClassIsAsked) {
+    add<ShoutingSource>("file", "", 5, "a=1\n");
+    EXPECT_EQ(textOf(store->get("a").get()), "string string 1!");
+    EXPECT_EQ(textOf(store->get("loud").get()), "string !");
+}
+
+TEST_F(PropertyFileInAStore, MayBeRemovedByTheRecordOfARead) {
+    add<PropertyFileSource>("file", "", 5, "a=1\n");
+    testing::LogCapture log("velkor::configuration", common::debug);
+    bool removed = false;
+    log.whenRecorded([&](const testing::LogRecord&) {
+        if (std::exchange(removed, true)) return;
+        store->removeSource("file");
+    });
+    EXPECT_EQ(textOf(store->get("a").get()), "string 1");
+    EXPECT_FALSE(store->has("a").get());
 }
 
 }  // namespace
