@@ -32,7 +32,7 @@ class ConflatingPublisherTest : public ::testing::Test {
 protected:
     using Stream = ConflatingPublisher<Entry, KeyOfEntry, std::function<void()>>;
 
-    void keep(const std::string& key, int value) const { publisher->keep({key, value}); }
+    void keep(const std::string& key, int value) const { publisher->keep({{key, value}}); }
 
     std::vector<std::string> delivered() const {
         std::vector<std::string> texts;
@@ -107,7 +107,7 @@ TEST_F(ConflatingPublisherTest, DeliverOfAnotherThreadLeavesTheValueToTheRunning
     subscriber->whenNext = [&](const Entry& entry) {
         if (entry.key != "a") return;
         EXPECT_TRUE(testing::completes([publisher = publisher] {
-            publisher->keep({"b", 2});
+            publisher->keep({{"b", 2}});
             publisher->deliver();
         }));
         EXPECT_THAT(delivered(), ElementsAre("a1"));
