@@ -140,6 +140,15 @@ public:
         : Setting(store, ruleOf(withDefault(std::move(key), std::move(defaultValue)),
                                 std::forward<Modifiers>(modifiers)...)) {}
 
+    /// Does not compile: as the default of a `bool` a text would be `true`, whatever it says.
+    template <class Character, class... Modifiers,
+              class = std::enable_if_t<detail::isAlwaysTrue<T, const Character*>>>
+    Setting(const std::shared_ptr<configuration::ConfigurationImpl>& store, std::string key,
+            const Character* defaultText, Modifiers&&...)
+        : Setting(store, std::move(key)) {
+        detail::requireNoTextAsTruth<T, decltype(defaultText)>();
+    }
+
     /// Calls `callback` with the value before and the value now when it has become another one, on
     /// the thread that makes the change, never nested and never twice at once. It may call the
     /// store and end the setting. What it throws is logged. Lasts as long as the handle.

@@ -66,6 +66,15 @@ TEST_F(ConflatingPublisherTest, KeyWaitsInThePlaceOfItsFirstValue) {
     EXPECT_THAT(delivered(), ElementsAre("long key that is no short string2", "b2"));
 }
 
+TEST_F(ConflatingPublisherTest, KeysBehindADeliveredOneAreStillReplaced) {
+    for (const std::string key : {"a", "b", "c"}) keep(key, 1);
+    publisher->subscribe(subscriber);
+    subscriber->request(1);
+    for (const std::string key : {"c", "b", "a"}) keep(key, 2);
+    subscriber->request(testing::allValues);
+    EXPECT_THAT(delivered(), ElementsAre("a1", "b2", "c2", "a2"));
+}
+
 TEST_F(ConflatingPublisherTest, DeliveredKeyIsKeptAfresh) {
     publisher->subscribe(subscriber);
     subscriber->request(1);
@@ -84,6 +93,22 @@ TEST_F(ConflatingPublisherTest, KeepDeliversNothing) {
     EXPECT_THAT(delivered(), IsEmpty());
     publisher->deliver();
     EXPECT_THAT(delivered(), ElementsAre("a1"));
+}
+
+TEST_F(ConflatingPublisherTest, SubscriberThatCancelsDuringADeliveryLivesUntilItsEnd) {
+    publisher->subscribe(subscriber);
+    subscriber->request(testing::allValues);
+    const std::weak_ptr<testing::RecordingSubscriber<Entry>> alive = subscriber;
+    bool livesAfterwards = false;
+    subscriber->whenNext = [&](const Entry&) {
+        alive.lock()->cancel();
+        livesAfterwards = !alive.expired();
+    };
+    subscriber.reset();
+    keep("a", 1);
+    publisher->deliver();
+    EXPECT_TRUE(livesAfterwards);
+    EXPECT_TRUE(alive.expired());
 }
 
 TEST_F(ConflatingPublisherTest, DeliverDoesNotNest) {
