@@ -131,9 +131,9 @@ TEST_F(ConflatingPublisherTest, DeliverOfAnotherThreadLeavesTheValueToTheRunning
     publisher->subscribe(subscriber);
     subscriber->whenNext = [&](const Entry& entry) {
         if (entry.key != "a") return;
-        EXPECT_TRUE(testing::completes([publisher = publisher] {
-            publisher->keep({{"b", 2}});
-            publisher->deliver();
+        EXPECT_TRUE(testing::completes([&stream = *publisher] {
+            stream.keep({{"b", 2}});
+            stream.deliver();
         }));
         EXPECT_THAT(delivered(), ElementsAre("a1"));
     };
