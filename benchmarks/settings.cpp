@@ -5,6 +5,7 @@
 #include <atomic>
 #include <chrono>
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <shared_mutex>
 #include <string>
@@ -65,6 +66,30 @@ struct Locked {
     T value;
 };
 
+// Does something again and again on a thread of its own while it lives.
+class Background {
+public:
+    explicit Background(std::function<void()> work)
+        : again(std::move(work)), thread([this] { run(); }) {}
+
+    ~Background() {
+        done = true;
+        thread.join();
+    }
+
+    Background(const Background&) = delete;
+    Background& operator=(const Background&) = delete;
+
+private:
+    void run() {
+        while (!done) again();
+    }
+
+    const std::function<void()> again;
+    std::atomic<bool> done{false};
+    std::thread thread;  // the last member: it uses the others
+};
+
 void measureNumbers() {
     measureReads("setting/int/variable",
                  [] { return [value = std::make_shared<int>(5)] { return *value; }; });
@@ -74,6 +99,13 @@ void measureNumbers() {
             return setting->get();
         };
     });
+    measureReads("setting/int-beside-reader/velkor", [] {
+        const auto store = storeWith(5);
+        const auto setting = std::make_shared<Setting<int>>(store, key);
+        return [store, setting, other = std::make_shared<Background>([setting] {
+                                    for (std::size_t i = 0; i < batch; ++i) keep(setting->get());
+                                })] { return setting->get(); };
+    }).counted(0);
     measureReads("setting/int/store", [] {
         return [store = storeWith(5)] { return boost::get<int>(store->get(key).get()); };
     });
@@ -94,32 +126,6 @@ void measureNumbers() {
     });
 }
 
-// Changes a key of a store every millisecond while it lives.
-class Writer {
-public:
-    explicit Writer(Store changed) : store(std::move(changed)), thread([this] { write(); }) {}
-
-    ~Writer() {
-        done = true;
-        thread.join();
-    }
-
-    Writer(const Writer&) = delete;
-    Writer& operator=(const Writer&) = delete;
-
-private:
-    void write() {
-        while (!done) {
-            store->set(key, text40());
-            std::this_thread::sleep_for(std::chrono::milliseconds(1));
-        }
-    }
-
-    const Store store;
-    std::atomic<bool> done{false};
-    std::thread thread;
-};
-
 auto readText(const Store& store) {
     const auto setting = std::make_shared<Setting<std::string>>(store, key);
     return [setting, reader = setting->reader()]() mutable { return reader.get().size(); };
@@ -132,9 +138,11 @@ void measureTexts() {
     measureReads("setting/text40/velkor", [] { return readText(storeWith(text40())); });
     measureReads("setting/text40/beside-writer", [] {
         const auto store = storeWith(text40());
-        return [read = readText(store), writer = std::make_shared<Writer>(store)]() mutable {
-            return read();
-        };
+        const auto writer = std::make_shared<Background>([store] {
+            store->set(key, text40());
+            std::this_thread::sleep_for(std::chrono::milliseconds(1));
+        });
+        return [read = readText(store), writer]() mutable { return read(); };
     }).counted(0);
     measureReads("setting/text40/store", [] {
         return [store = storeWith(text40())] {

@@ -71,6 +71,7 @@ private:
                 [given = Plain(std::forward<Given>(given))](auto& rule) { rule.add(given); });
             addTo(std::move(draft), std::forward<Rest>(rest)...);
         } else {
+            detail::requireNoTextAsTruth<Member, Given>();
             static_assert(std::is_convertible_v<Given, Member>,
                           "a field's default converts to the field's type");
             draft.fallback.emplace(static_cast<Member>(std::forward<Given>(given)));

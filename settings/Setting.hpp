@@ -22,15 +22,20 @@ namespace velkor::settings {
 
 namespace detail {
 
+/// Where a setting publishes its value: a small one in itself, so that it is read without a look
+/// into its state; any other in the state, which readers share.
+template <class T>
+using CellOf = std::conditional_t<fitsAtomic<T>, AtomicCell<T>&, SnapshotCell<T>>;
+
 /// The state of a setting of one key.
 template <class T>
-class KeyState final
-    : public ValueState<T, std::conditional_t<fitsAtomic<T>, AtomicCell<T>, SnapshotCell<T>>> {
-    using Base = ValueState<T, std::conditional_t<fitsAtomic<T>, AtomicCell<T>, SnapshotCell<T>>>;
-
+class KeyState final : public ValueState<T, CellOf<T>> {
 public:
-    explicit KeyState(KeyRule<T> declaredRule)
-        : Base(declaredRule.declaration().key, {declaredRule.declaration()}),
+    /// `published`: the cell of a small value.
+    template <class... Published>
+    explicit KeyState(KeyRule<T> declaredRule, Published&... published)
+        : ValueState<T, CellOf<T>>(declaredRule.declaration().key, {declaredRule.declaration()},
+                                   published...),
           rule(std::move(declaredRule)) {}
 
 private:
@@ -52,12 +57,17 @@ template <class T, bool = fitsAtomic<T>>
 class SettingAccess {
 public:
     /// The value: one load.
-    operator T() const noexcept { return state->cell.load(); }
-    T get() const noexcept { return state->cell.load(); }
+    operator T() const noexcept { return cell.load(); }
+    T get() const noexcept { return cell.load(); }
 
 protected:
-    explicit SettingAccess(std::shared_ptr<KeyState<T>> shared) : state(std::move(shared)) {}
+    explicit SettingAccess(KeyRule<T>&& rule)
+        : state(std::make_shared<KeyState<T>>(std::move(rule), cell)) {}
 
+private:
+    AtomicCell<T> cell;
+
+protected:
     const std::shared_ptr<KeyState<T>> state;
 };
 
@@ -80,7 +90,8 @@ public:
     }
 
 protected:
-    explicit SettingAccess(std::shared_ptr<KeyState<T>> shared) : state(std::move(shared)) {}
+    explicit SettingAccess(KeyRule<T>&& rule)
+        : state(std::make_shared<KeyState<T>>(std::move(rule))) {}
 
     const std::shared_ptr<KeyState<T>> state;
 };
@@ -129,6 +140,15 @@ public:
         : Setting(store, ruleOf(withDefault(std::move(key), std::move(defaultValue)),
                                 std::forward<Modifiers>(modifiers)...)) {}
 
+    /// Does not compile: as the default of a `bool` a text would be `true`, whatever it says.
+    template <class Character, class... Modifiers,
+              class = std::enable_if_t<detail::isAlwaysTrue<T, const Character*>>>
+    Setting(const std::shared_ptr<configuration::ConfigurationImpl>& store, std::string key,
+            const Character* defaultText, Modifiers&&...)
+        : Setting(store, std::move(key)) {
+        detail::requireNoTextAsTruth<T, decltype(defaultText)>();
+    }
+
     /// Calls `callback` with the value before and the value now when it has become another one, on
     /// the thread that makes the change, never nested and never twice at once. It may call the
     /// store and end the setting. What it throws is logged. Lasts as long as the handle.
@@ -145,8 +165,7 @@ public:
 private:
     Setting(const std::shared_ptr<configuration::ConfigurationImpl>& store,
             detail::KeyRule<T>&& rule)
-        : detail::SettingAccess<T>(std::make_shared<detail::KeyState<T>>(std::move(rule))),
-          following(this->state, store) {}
+        : detail::SettingAccess<T>(std::move(rule)), following(this->state, store) {}
 
     static detail::KeyRule<T> withDefault(std::string key, T value) {
         detail::KeyRule<T> rule(std::move(key));

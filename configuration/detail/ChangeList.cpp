@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <iostream>
+#include <list>
+#include <string_view>
 #include <utility>
 
 namespace velkor::configuration::detail {
@@ -9,20 +11,20 @@ namespace velkor::configuration::detail {
 namespace {
 
 bool begins(const std::string& prefix, const std::string& key) {
-    return key.compare(0, prefix.size(), prefix) == 0;
+    return std::string_view(key).substr(0, prefix.size()) == prefix;
 }
 
-std::optional<Option> currentOf(SourceRegistry& sources, const std::string& key) {
+void readInto(OptionChange& change, SourceRegistry& sources) {
     KeyBuffer buffer(sources.keyBuffers());
-    const Layer layer = sources.firstHolder(key, buffer);
-    if (!layer) return std::nullopt;
-    return Option(key, layer.entry().name, layer.value());
+    const Layer layer = sources.firstHolder(change.key, buffer);
+    if (layer) change.option.emplace(change.key, layer.entry().name, layer.value());
 }
 
-// Null when the change was kept.
-std::exception_ptr keepIn(ChangePublisher& publisher, const OptionChange& change) noexcept {
+// Null when the change was kept. It is moved from for the last one.
+std::exception_ptr keepIn(ChangePublisher& publisher, std::list<OptionChange>& change,
+                          bool isLast) noexcept {
     try {
-        publisher.keep(change);
+        publisher.keep(isLast ? std::move(change) : change);
         return nullptr;
     } catch (...) {
         return std::current_exception();
@@ -72,18 +74,23 @@ void ChangeList::keep(SourceRegistry& sources, const std::string& key, std::uint
                       Due& due) const {
     const auto isTold = [&](const Entry& entry) { return begins(entry.prefix, key); };
     if (std::none_of(entries.begin(), entries.end(), isTold)) return;
-    OptionChange change{key, std::nullopt, version};
+    std::list<OptionChange> change;
     std::exception_ptr failure;
     try {
-        change.option = currentOf(sources, key);
+        change.emplace_back();
+        change.back().key = key;
+        change.back().version = version;
+        readInto(change.back(), sources);
     } catch (...) {
         failure = std::current_exception();
     }
     // A source may have added or cancelled streams meanwhile. From here on no foreign code runs.
+    const auto last = std::find_if(entries.rbegin(), entries.rend(), isTold);
     for (const Entry& entry : entries) {
         if (!isTold(entry)) continue;
         Due::Stream& stream = due.of(entry.publisher, entry.prefix);
-        if (!stream.failure) stream.failure = failure ? failure : keepIn(*entry.publisher, change);
+        if (stream.failure) continue;
+        stream.failure = failure ? failure : keepIn(*entry.publisher, change, &entry == &*last);
     }
 }
 

@@ -62,39 +62,48 @@ public:
     /// goes to `dropped`. When memory is short, nothing has changed.
     void push(std::list<T>& added, std::list<T>& dropped) {
         const auto node = added.begin();
-        const auto known = byKey.find(keyOf(*node));
-        if (known == byKey.end()) {
-            byKey.emplace(keyOf(*node), node);
+        if (values.empty()) return values.swap(added);
+        if (keyOf(values.front()) == keyOf(*node)) return replace(values.begin(), added, dropped);
+        const auto known = others.find(keyOf(*node));
+        if (known == others.end()) {
+            others.emplace(keyOf(*node), node);
             values.splice(values.end(), added);
             return;
         }
         const auto replaced = known->second;
-        auto entry = byKey.extract(known);
+        auto entry = others.extract(known);
         entry.key() = keyOf(*node);
         entry.mapped() = node;
-        byKey.insert(std::move(entry));
-        values.splice(replaced, added);
-        dropped.splice(dropped.end(), values, replaced);
+        others.insert(std::move(entry));
+        replace(replaced, added, dropped);
     }
 
     /// Takes the value that is due first; there is one.
     std::list<T> takeFirst() noexcept {
-        byKey.erase(keyOf(values.front()));
         std::list<T> first;
         first.splice(first.end(), values, values.begin());
+        if (!values.empty()) others.erase(keyOf(values.front()));
         return first;
     }
 
     std::list<T> takeAll() noexcept {
-        byKey.clear();
+        others.clear();
         return std::exchange(values, {});
     }
 
 private:
+    using Position = typename std::list<T>::iterator;
+
     static std::string_view keyOf(const T& value) noexcept { return KeyOf()(value); }
 
+    void replace(Position replaced, std::list<T>& added, std::list<T>& dropped) noexcept {
+        values.splice(replaced, added);
+        dropped.splice(dropped.end(), values, replaced);
+    }
+
     std::list<T> values;
-    std::unordered_map<std::string_view, typename std::list<T>::iterator> byKey;  // into `values`
+    // Where the values behind the first are: a stream that keeps up has one at most.
+    std::unordered_map<std::string_view, Position> others;
 };
 
 }  // namespace velkor::detail

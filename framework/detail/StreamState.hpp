@@ -76,10 +76,12 @@ public:
         std::list<T> dropped;
     };
 
-    /// Values with the subscriber that they are for, or that is let go of together with them.
-    struct Delivery {
-        Receiver subscriber;
-        std::list<T> values;
+    /// What the one that drains the stream does next.
+    struct Turn {
+        reactive_streams::Subscriber<T>* subscriber = nullptr;  ///< Null: nothing is due.
+        std::list<T> values{};  ///< The one that is due, or those that nobody will get any more.
+        Receiver released{};    ///< The subscriber of a stream that has been cancelled.
+        std::optional<Ending> ending{};  ///< Nothing is due, and that was the last of the stream.
     };
 
     /// What a new subscriber finds.
@@ -148,33 +150,28 @@ public:
         demand = reactive_streams::addDemand(demand, more);
     }
 
-    /// Whether the caller is to deliver what is queued, until `takeNext` has nothing more or it
-    /// calls `abortDraining`. Not while another one does so, nor after the end.
-    bool startDraining() VELKOR_EXCLUDES(mutex) {
+    /// The first turn of who is to deliver what is queued, until a turn has no subscriber or it
+    /// calls `abortDraining`; the subscriber lives until then. An empty one while another drains
+    /// the stream, and after the end. Looks at the demand only: a stream that is cancelled
+    /// meanwhile still delivers what had been asked for.
+    Turn startDraining() VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        if (draining || phase > StreamPhase::completing) return false;
+        if (draining || phase > StreamPhase::completing) return {};
         draining = true;
-        return true;
+        return nextTurn();
     }
 
-    /// The next delivery, or nothing, and then the draining is over. Looks at the demand only: a
-    /// stream that is cancelled meanwhile still delivers what had been asked for.
-    std::optional<Delivery> takeNext() VELKOR_EXCLUDES(mutex) {
-        Delivery released;
+    /// The next turn of the one that drains the stream.
+    Turn takeTurn() VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        if (demand == 0 || queue.empty()) {
-            released = stopDraining();
-            return std::nullopt;
-        }
-        --demand;
-        return Delivery{subscriber, queue.takeFirst()};
+        return nextTurn();
     }
 
     /// Ends the draining before everything was delivered.
     void abortDraining() VELKOR_EXCLUDES(mutex) {
-        Delivery released;
+        Turn last;
         const common::MutexLock lock(mutex);
-        released = stopDraining();
+        last = stopDraining();
     }
 
     /// Lets the stream end once it is drained. False when it is ending or has ended.
@@ -188,8 +185,7 @@ public:
     /// Ends a stream that is completing and has nothing left to deliver.
     std::optional<Ending> completeIfDrained() VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        if (phase != StreamPhase::completing || !queue.empty()) return std::nullopt;
-        return end(StreamPhase::completed);
+        return endIfDrained();
     }
 
     /// Ends the stream as `terminal`, with `reason` if that is failed; nothing if it has ended.
@@ -206,17 +202,34 @@ private:
         phase = terminal;
         Ending ending{terminal, completion ? &*completion : nullptr, subscriber, error, {}};
         if (terminal == StreamPhase::failed) ending.dropped = queue.takeAll();
-        if (terminal == StreamPhase::cancelled && !draining) ending.dropped = release().values;
+        if (terminal == StreamPhase::cancelled && !draining) {
+            ending.dropped = queue.takeAll();
+            subscriber.reset();  // not the last reference
+        }
         return ending;
     }
 
-    /// Gives back what a stream that was cancelled meanwhile no longer needs.
-    Delivery stopDraining() VELKOR_REQUIRES(mutex) {
-        draining = false;
-        return phase == StreamPhase::cancelled ? release() : Delivery{};
+    std::optional<Ending> endIfDrained() VELKOR_REQUIRES(mutex) {
+        if (phase != StreamPhase::completing || !queue.empty()) return std::nullopt;
+        return end(StreamPhase::completed);
     }
 
-    Delivery release() VELKOR_REQUIRES(mutex) { return {std::move(subscriber), queue.takeAll()}; }
+    Turn nextTurn() VELKOR_REQUIRES(mutex) {
+        if (demand > 0 && !queue.empty()) {
+            --demand;
+            return {subscriber.get(), queue.takeFirst()};
+        }
+        Turn last = stopDraining();
+        last.ending = endIfDrained();
+        return last;
+    }
+
+    /// Gives back what a stream that was cancelled meanwhile no longer needs.
+    Turn stopDraining() VELKOR_REQUIRES(mutex) {
+        draining = false;
+        if (phase != StreamPhase::cancelled) return {};
+        return {nullptr, queue.takeAll(), std::move(subscriber)};
+    }
 
     common::Mutex mutex;
     Queue queue VELKOR_GUARDED_BY(mutex);

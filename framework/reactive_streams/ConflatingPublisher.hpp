@@ -21,21 +21,18 @@ public:
     /// A stream without a subscriber.
     explicit ConflatingPublisher(F hook) : Base(detail::NewestByKey<T, KeyOf>(), std::move(hook)) {}
 
-    /// Keeps `value` in the place of the one with its key. Runs no code of the subscriber, so that
-    /// it may be called with a lock held that gives the values their order. Does nothing once the
-    /// stream has ended. Throws `std::bad_alloc`, and nothing has changed then.
-    void keep(T value) {
-        std::list<T> added;
-        added.push_back(std::move(value));
+    /// Keeps the one value in `added` in the place of the one with its key. Runs no code of the
+    /// subscriber, so that it may be called with a lock held that gives the values their order.
+    /// Does nothing once the stream has ended. Throws `std::bad_alloc`, and nothing has changed
+    /// then.
+    void keep(std::list<T> added) {
         std::list<T> replaced;
         this->stream.keep(added, replaced);
     }
 
-    /// Delivers what is kept as far as there is demand, unless another call is about to.
-    void deliver() {
-        const auto keepAlive = this->weak_from_this().lock();
-        this->drain();
-    }
+    /// Delivers what is kept as far as there is demand, unless another call is about to. The caller
+    /// holds a reference to the stream.
+    void deliver() { this->drain(); }
 
 private:
     using Base = QueuedPublisher<T, F, detail::NewestByKey<T, KeyOf>>;

@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <exception>
+#include <list>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -97,16 +98,17 @@ protected:
     /// Delivers what is queued as far as there is demand. A call from inside `onNext` leaves that
     /// to the running one, so that deliveries of queued values never nest.
     void drain() {
-        if (!stream.startDraining()) return;
+        auto turn = stream.startDraining();
         try {
-            while (auto next = stream.takeNext()) {
-                next->subscriber->onNext(std::move(next->values.front()));
+            while (turn.subscriber != nullptr) {
+                handOut(*turn.subscriber, std::move(turn.values));
+                turn = stream.takeTurn();
             }
         } catch (...) {
             stream.abortDraining();
             throw;
         }
-        completeIfDrained();
+        if (turn.ending) announce(*turn.ending);
     }
 
     detail::StreamState<T, Queue> stream;
@@ -140,6 +142,11 @@ private:
 
     void cancel() {
         if (const auto ending = stream.endNow(Phase::cancelled)) announce(*ending);
+    }
+
+    // A value is destroyed before the next one is taken.
+    static void handOut(Subscriber<T>& subscriber, std::list<T> value) {
+        subscriber.onNext(std::move(value.front()));
     }
 
     void completeIfDrained() {

@@ -1,9 +1,9 @@
 #pragma once
 
+#include <boost/container/small_vector.hpp>
 #include <chrono>
 #include <optional>
 #include <string>
-#include <vector>
 
 #include "configuration/Option.hpp"
 #include "framework/common/DiagnosticLogger.hpp"
@@ -34,9 +34,12 @@ struct Standing {
     std::chrono::system_clock::time_point since{};
 };
 
+/// Those of all keys of a setting, in their order; most have one key.
+using Standings = boost::container::small_vector<Standing, 1>;
+
 /// What became of the values of all keys of a setting.
 struct Verdict {
-    std::vector<Standing> standings{};
+    Standings standings{};
     std::string complaints{};  ///< Separated by "; ".
     common::Severity severity = common::warning;
     bool holds = true;  ///< There is a new value.

@@ -1,12 +1,9 @@
 #include "settings/detail/Hub.hpp"
 
-#include <algorithm>
 #include <map>
-#include <set>
 #include <utility>
 
 #include "framework/reactive_streams/CallbackSubscriber.hpp"
-#include "settings/Loggers.hpp"
 #include "settings/detail/SettingState.hpp"
 
 namespace velkor::settings::detail {
@@ -82,15 +79,12 @@ void Hub::watch(std::uint64_t attempt) {
     const auto stream = alive->watchChanges("");
     // What changes meanwhile is kept in the stream, so that nobody else delivers.
     if (attempt > 0) {
-        for (const auto& state : states()) state->refresh();
+        for (const auto& state : index->all()) state->refresh();
     }
-    const auto self = weak_from_this();
     reactive_streams::Callbacks<OptionChange> callbacks;
-    callbacks.onValue = [self](OptionChange&& change) {
-        if (const auto hub = self.lock()) hub->pass(change);
-    };
+    callbacks.onValue = [index = index](OptionChange&& change) { index->pass(change); };
     // A source has thrown instead of giving its value: whatever can be read is read again.
-    callbacks.onError = [self, attempt](const std::exception_ptr&) {
+    callbacks.onError = [self = weak_from_this(), attempt](const std::exception_ptr&) {
         if (const auto hub = self.lock()) hub->watch(attempt + 1);
     };
     auto opened = reactive_streams::subscribe(*stream, std::move(callbacks));
@@ -98,58 +92,6 @@ void Hub::watch(std::uint64_t attempt) {
     if (attempt < newest) return;
     newest = attempt;
     std::swap(handle, opened);
-}
-
-void Hub::pass(const OptionChange& change) const {
-    for (const auto& state : statesOf(change.key)) {
-        try {
-            state->onChange(change);
-        } catch (const std::exception& error) {
-            state->fail(error.what());
-        }
-    }
-}
-
-Hub::States Hub::statesOf(const std::string& key) const {
-    States found;
-    const common::MutexLock lock(mutex);
-    const auto entries = byKey.find(key);
-    if (entries == byKey.end()) return found;
-    for (const Entry& entry : entries->second) {
-        if (auto state = entry.state.lock()) found.push_back(std::move(state));
-    }
-    return found;
-}
-
-std::vector<std::shared_ptr<SettingState>> Hub::states() const {
-    std::set<std::shared_ptr<SettingState>> found;
-    {
-        const common::MutexLock lock(mutex);
-        for (const auto& [key, entries] : byKey) {
-            for (const Entry& entry : entries) {
-                if (auto state = entry.state.lock()) found.insert(std::move(state));
-            }
-        }
-    }
-    return {found.begin(), found.end()};
-}
-
-void Hub::add(const std::shared_ptr<SettingState>& state) {
-    const common::MutexLock lock(mutex);
-    for (const Declared& key : state->keys()) byKey[key.key].push_back({state.get(), state});
-}
-
-void Hub::remove(const SettingState& state) {
-    const common::MutexLock lock(mutex);
-    for (const Declared& key : state.keys()) {
-        const auto found = byKey.find(key.key);
-        if (found == byKey.end()) continue;
-        auto& entries = found->second;
-        entries.erase(std::remove_if(entries.begin(), entries.end(),
-                                     [&](const Entry& entry) { return entry.identity == &state; }),
-                      entries.end());
-        if (entries.empty()) byKey.erase(found);
-    }
 }
 
 }  // namespace velkor::settings::detail

@@ -1,28 +1,21 @@
 #pragma once
 
-#include <boost/container/small_vector.hpp>
 #include <cstdint>
-#include <exception>
 #include <memory>
-#include <string>
-#include <unordered_map>
 #include <vector>
 
-#include "configuration/Changes.hpp"
 #include "configuration/ConfigurationImpl.hpp"
 #include "framework/common/Mutex.hpp"
 #include "framework/reactive_streams/SubscriptionHandle.hpp"
+#include "settings/detail/StateIndex.hpp"
 
 namespace velkor::settings::detail {
 
-class SettingState;
-
-/// All settings of one store: passes each change on to those of its key. Owned by the settings, so
-/// that the store is watched as long as there are any. Thread-safe; calls nobody under its mutex.
+/// What keeps all settings of one store up to date: the watch of its changes, and the settings that
+/// they are passed on to. Owned by the settings, so that the store is watched as long as there are
+/// any. Thread-safe; calls nobody under its mutex.
 class Hub : public std::enable_shared_from_this<Hub> {
 public:
-    using States = boost::container::small_vector<std::shared_ptr<SettingState>, 4>;
-
     /// The hub of `store`, made when there is none.
     static std::shared_ptr<Hub> of(const std::shared_ptr<configuration::ConfigurationImpl>& store);
 
@@ -40,25 +33,19 @@ public:
     Hub& operator=(const Hub&) = delete;
 
     /// Passes the changes of its keys on to `state` from now on.
-    void add(const std::shared_ptr<SettingState>& state) VELKOR_EXCLUDES(mutex);
-    void remove(const SettingState& state) VELKOR_EXCLUDES(mutex);
+    void add(const std::shared_ptr<SettingState>& state) { index->add(state); }
+    void remove(const SettingState& state) { index->remove(state); }
 
     /// All settings that are alive.
-    std::vector<std::shared_ptr<SettingState>> states() const VELKOR_EXCLUDES(mutex);
+    std::vector<std::shared_ptr<SettingState>> states() const { return index->all(); }
 
 private:
-    struct Entry {
-        const SettingState* identity;
-        std::weak_ptr<SettingState> state;
-    };
-
     void watch(std::uint64_t attempt) VELKOR_EXCLUDES(mutex);
-    void pass(const configuration::OptionChange& change) const VELKOR_EXCLUDES(mutex);
-    States statesOf(const std::string& key) const VELKOR_EXCLUDES(mutex);
 
     const std::weak_ptr<configuration::ConfigurationImpl> store;
-    mutable common::Mutex mutex;
-    std::unordered_map<std::string, std::vector<Entry>> byKey VELKOR_GUARDED_BY(mutex);
+    // Shared with the watch, which passes changes on without a look at the hub.
+    const std::shared_ptr<StateIndex> index = std::make_shared<StateIndex>();
+    common::Mutex mutex;
     // The newest watch and its number: one may have failed before its handle is kept here.
     reactive_streams::SubscriptionHandle handle VELKOR_GUARDED_BY(mutex);
     std::uint64_t newest VELKOR_GUARDED_BY(mutex) = 0;

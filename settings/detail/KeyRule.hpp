@@ -20,6 +20,18 @@ template <class T, class Given>
 inline constexpr bool isModifier =
     isRule<Given> || std::is_same_v<Given, Constraint<T>> || std::is_same_v<Given, Attribute>;
 
+/// Whether a default of type `Given` would become a truth value whatever it says, as a text does.
+template <class T, class Given>
+inline constexpr bool isAlwaysTrue =
+    std::is_pointer_v<std::decay_t<Given>>&& isOneOf<T, bool, std::optional<bool>>;
+
+/// Does not compile where the default is one that is always true.
+template <class T, class Given>
+constexpr void requireNoTextAsTruth() {
+    static_assert(!isAlwaysTrue<T, Given>,
+                  "a text is no default of a bool: it would always be true");
+}
+
 /// What a program has declared of one key, with its type. Immutable once it is complete.
 template <class T>
 class KeyRule {
@@ -62,7 +74,9 @@ public:
         }
         Converted<T> read = convert(*option);
         if (read) {
-            verdict.standings.push_back({Conversion<T>::show(read.value()), option->source, {}});
+            Standing& standing = verdict.standings.emplace_back();
+            standing.value = Conversion<T>::show(read.value());
+            standing.source = option->source;
             return std::optional<T>(std::move(read).value());
         }
         const std::string complaint = refusalOf(declared, *option, read.reason());

@@ -27,6 +27,11 @@ Converted<bool> truthIn(std::string_view text) {
     return Reason{"not one of: true, false, on, off, yes, no, 1, 0"};
 }
 
+Converted<Whole> within(WholeRange range, Whole whole) {
+    if (!range.has(whole)) return range.missed();
+    return whole;
+}
+
 Converted<Whole> wholeIn(std::string_view text, WholeRange range) {
     Whole whole;
     whole.negative = !text.empty() && text.front() == '-';
@@ -36,8 +41,8 @@ Converted<Whole> wholeIn(std::string_view text, WholeRange range) {
     if (read.ec == std::errc::invalid_argument || read.ptr != end) {
         return Reason{"not a whole number in plain digits"};
     }
-    if (read.ec != std::errc() || !range.has(whole)) return range.missed();
-    return whole;
+    if (read.ec != std::errc()) return range.missed();
+    return within(range, whole);
 }
 
 template <class T>
@@ -75,6 +80,9 @@ Converted<bool> readBool(const configuration::ConfigurationValue& value) {
 }
 
 Converted<Whole> readWhole(const configuration::ConfigurationValue& value, WholeRange range) {
+    // As their digits are read, without the way there and back.
+    if (const int* number = boost::get<int>(&value)) return within(range, Whole::of(*number));
+    if (const auto* number = boost::get<unsigned>(&value)) return within(range, Whole::of(*number));
     return textOf(value).then(
         [range](const std::string& text) { return wholeIn(trimmed(text), range); });
 }

@@ -1,5 +1,6 @@
 #include "settings/detail/SettingState.hpp"
 
+#include <algorithm>
 #include <chrono>
 #include <exception>
 #include <stdexcept>
@@ -47,11 +48,13 @@ void SettingState::begin(const std::shared_ptr<configuration::ConfigurationImpl>
 
 void SettingState::close() {
     std::shared_ptr<Hub> left;
+    Listeners removed;  // destroyed without the locks
     {
         const Passage passage(gate);
         closed = true;
-        removeCallbacks();
         left.swap(hub);
+        const common::MutexLock lock(mutex);
+        removed.swap(listeners);
     }
     if (left != nullptr) left->remove(*this);
 }
@@ -93,7 +96,7 @@ void SettingState::deliver(std::uint64_t newVersion,
     Verdict verdict = judge(options, first);
     if (verdict.holds) {
         hasValue = true;
-        publish(stand(verdict) && !first);
+        publish(stand(verdict));
         if (verdict.complaints.empty() || closed) return;
         settingsLogger.write(verdict.severity, verdict.complaints, "; the default is taken");
         return;
@@ -103,22 +106,23 @@ void SettingState::deliver(std::uint64_t newVersion,
     settingsLogger.write(verdict.severity, verdict.complaints, "; the last good value stays");
 }
 
-// Whether the values of the keys are other ones than before.
-bool SettingState::stand(Verdict& verdict) {
+// Gives those who are to be told that the values are other ones than before.
+SettingState::Listeners SettingState::stand(Verdict& verdict) {
     bool changes = false;
     const common::MutexLock lock(mutex);
-    for (std::size_t i = 0; i < verdict.standings.size(); ++i) {
+    const bool isFirst = standing.empty();
+    standing.resize(verdict.standings.size());
+    for (std::size_t i = 0; i < standing.size(); ++i) {
         Standing& next = verdict.standings[i];
-        const bool isNew = i >= standing.size();
-        const bool differs = isNew || next.value != standing[i].value;
-        const bool moved = isNew || next.source != standing[i].source;
-        next.since = differs || moved ? std::chrono::system_clock::now() : standing[i].since;
+        const bool differs = isFirst || next.value != standing[i].value;
+        if (!differs && next.source == standing[i].source) continue;
         changes = changes || differs;
+        standing[i] = std::move(next);
+        standing[i].since = std::chrono::system_clock::now();
     }
-    standing.swap(verdict.standings);
     complaint.reset();
     if (!verdict.complaints.empty()) complaint = verdict.complaints;
-    return changes;
+    return changes && !isFirst ? listeners : Listeners();
 }
 
 void SettingState::note(const std::string& text) {
@@ -126,12 +130,30 @@ void SettingState::note(const std::string& text) {
     complaint = text;
 }
 
-void SettingState::endCallback(std::uint64_t id) {
-    const Passage passage(gate);
-    removeCallback(id);
+std::uint64_t SettingState::addListener(std::shared_ptr<const void> callback) {
+    const common::MutexLock lock(mutex);
+    listeners.push_back({++lastListener, std::move(callback)});
+    return lastListener;
 }
 
-std::vector<Standing> SettingState::standings() const {
+bool SettingState::isListening(const Listener& listener) const {
+    const common::MutexLock lock(mutex);
+    return std::any_of(listeners.begin(), listeners.end(),
+                       [&](const Listener& each) { return each.id == listener.id; });
+}
+
+void SettingState::endCallback(std::uint64_t id) {
+    std::shared_ptr<const void> removed;  // destroyed without the locks
+    const Passage passage(gate);
+    const common::MutexLock lock(mutex);
+    const auto ended = std::find_if(listeners.begin(), listeners.end(),
+                                    [id](const Listener& each) { return each.id == id; });
+    if (ended == listeners.end()) return;
+    removed.swap(ended->callback);
+    listeners.erase(ended);
+}
+
+Standings SettingState::standings() const {
     const common::MutexLock lock(mutex);
     return standing;
 }

@@ -51,7 +51,7 @@ public:
     void fail(const std::string& reason) VELKOR_EXCLUDES(mutex);
 
     /// Ends one callback: waits for it if it runs on another thread.
-    void endCallback(std::uint64_t id) VELKOR_EXCLUDES(gate);
+    void endCallback(std::uint64_t id) VELKOR_EXCLUDES(gate, mutex);
 
     /// The key, or the prefix of a struct.
     const std::string& name() const noexcept { return title; }
@@ -59,22 +59,30 @@ public:
     const std::vector<Declared>& keys() const noexcept { return declared; }
 
     /// How the keys stand, in their order; none as long as there is no value.
-    std::vector<Standing> standings() const VELKOR_EXCLUDES(mutex);
+    Standings standings() const VELKOR_EXCLUDES(mutex);
 
     std::optional<std::string> lastError() const VELKOR_EXCLUDES(mutex);
     bool isStoreGone() const VELKOR_EXCLUDES(mutex);
 
 protected:
+    struct Listener {
+        std::uint64_t id;
+        std::shared_ptr<const void> callback;
+    };
+    using Listeners = std::vector<Listener>;
+
     /// What the values of all keys, in their order, amount to. A value is kept for `publish`.
     /// `first`: there was none yet.
     virtual Verdict judge(const std::optional<configuration::Option>* options, bool first)
         VELKOR_REQUIRES(gate) = 0;
 
-    /// Publishes the value that was judged last. `tell`: calls the callbacks.
-    virtual void publish(bool tell) VELKOR_REQUIRES(gate) = 0;
+    /// Publishes the value that was judged last, and calls those of `told` that are still there.
+    virtual void publish(const Listeners& told) VELKOR_REQUIRES(gate) = 0;
 
-    virtual void removeCallback(std::uint64_t id) VELKOR_REQUIRES(gate) = 0;
-    virtual void removeCallbacks() VELKOR_REQUIRES(gate) = 0;
+    /// Adds a callback, which the class that calls it knows the type of; gives its number.
+    std::uint64_t addListener(std::shared_ptr<const void> callback) VELKOR_EXCLUDES(mutex);
+
+    bool isListening(const Listener& listener) const VELKOR_EXCLUDES(mutex);
 
     Gate gate;
 
@@ -82,7 +90,7 @@ private:
     void deliver(std::uint64_t newVersion, const std::optional<configuration::Option>* options)
         VELKOR_EXCLUDES(gate, mutex);
     bool isKnown(std::uint64_t changeVersion) VELKOR_EXCLUDES(gate);
-    bool stand(Verdict& verdict) VELKOR_EXCLUDES(mutex);
+    Listeners stand(Verdict& verdict) VELKOR_EXCLUDES(mutex);
     void note(const std::string& text) VELKOR_EXCLUDES(mutex);
     std::shared_ptr<configuration::ConfigurationImpl> storeIfAlive() const VELKOR_EXCLUDES(mutex);
 
@@ -95,8 +103,10 @@ private:
 
     mutable common::Mutex mutex;
     std::weak_ptr<configuration::ConfigurationImpl> followed VELKOR_GUARDED_BY(mutex);
-    std::vector<Standing> standing VELKOR_GUARDED_BY(mutex);
+    Standings standing VELKOR_GUARDED_BY(mutex);
     std::optional<std::string> complaint VELKOR_GUARDED_BY(mutex);
+    Listeners listeners VELKOR_GUARDED_BY(mutex);
+    std::uint64_t lastListener VELKOR_GUARDED_BY(mutex) = 0;
 };
 
 /// The one reference that a setting has to its state: begins to follow the store, and closes.

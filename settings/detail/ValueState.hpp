@@ -1,6 +1,5 @@
 #pragma once
 
-#include <algorithm>
 #include <cstdint>
 #include <exception>
 #include <functional>
@@ -19,19 +18,21 @@ namespace velkor::settings::detail {
 /// Logs what a callback of the setting called `name` has thrown.
 VELKOR_EXPORT void reportCallback(const std::string& name, const char* text);
 
-/// A state with its value, published in a `Cell`, and the callbacks that are told of it.
+/// A state with its value, published in a `Cell`, and the callbacks that are told of it. A `Cell`
+/// that is a reference is not written to any more once `close` has returned.
 template <class T, class Cell>
 class ValueState : public SettingState {
 public:
     using Callback = std::function<void(const T& before, const T& now)>;
-    using SettingState::SettingState;
+
+    /// A state that publishes in what `published`, if anything, makes.
+    template <class... Published>
+    ValueState(std::string name, std::vector<Declared> keys, Published&... published)
+        : SettingState(std::move(name), std::move(keys)), cell(published...) {}
 
     /// Tells `callback` of each change from now on; gives its number.
-    std::uint64_t addCallback(Callback callback) VELKOR_EXCLUDES(listMutex) {
-        const auto added = std::make_shared<const Callback>(std::move(callback));
-        const common::MutexLock lock(listMutex);
-        callbacks.push_back({++lastId, added});
-        return lastId;
+    std::uint64_t addCallback(Callback callback) {
+        return addListener(std::make_shared<const Callback>(std::move(callback)));
     }
 
     Cell cell;
@@ -41,21 +42,21 @@ protected:
     void propose(std::optional<T> value) VELKOR_REQUIRES(gate) { candidate = std::move(value); }
 
 private:
-    struct Entry {
-        std::uint64_t id;
-        std::shared_ptr<const Callback> callback;
-    };
-
-    void publish(bool tell) override VELKOR_REQUIRES(gate) {
-        const auto told = tell ? listed() : std::vector<Entry>();
+    void publish(const Listeners& told) override VELKOR_REQUIRES(gate) {
+        if (told.empty()) return store();
         const auto before = cell.held();
+        store();
+        const auto now = cell.held();
+        for (const Listener& each : told) {
+            if (isListening(each)) {
+                call(*static_cast<const Callback*>(each.callback.get()), *before, *now);
+            }
+        }
+    }
+
+    void store() VELKOR_REQUIRES(gate) {
         cell.store(std::move(*candidate));
         candidate.reset();
-        if (told.empty()) return;
-        const auto now = cell.held();
-        for (const Entry& entry : told) {
-            if (isListed(entry.id)) call(*entry.callback, *before, *now);
-        }
     }
 
     void call(const Callback& callback, const T& before, const T& now) const {
@@ -68,38 +69,7 @@ private:
         }
     }
 
-    std::vector<Entry> listed() const VELKOR_EXCLUDES(listMutex) {
-        const common::MutexLock lock(listMutex);
-        return callbacks;
-    }
-
-    bool isListed(std::uint64_t id) const VELKOR_EXCLUDES(listMutex) {
-        const common::MutexLock lock(listMutex);
-        return std::any_of(callbacks.begin(), callbacks.end(),
-                           [id](const Entry& entry) { return entry.id == id; });
-    }
-
-    void removeCallback(std::uint64_t id) override VELKOR_REQUIRES(gate) {
-        std::shared_ptr<const Callback> removed;  // destroyed without the mutex
-        const common::MutexLock lock(listMutex);
-        for (auto entry = callbacks.begin(); entry != callbacks.end(); ++entry) {
-            if (entry->id != id) continue;
-            removed.swap(entry->callback);
-            callbacks.erase(entry);
-            return;
-        }
-    }
-
-    void removeCallbacks() override VELKOR_REQUIRES(gate) {
-        std::vector<Entry> removed;  // destroyed without the mutex
-        const common::MutexLock lock(listMutex);
-        removed.swap(callbacks);
-    }
-
     std::optional<T> candidate VELKOR_GUARDED_BY(gate);
-    mutable common::Mutex listMutex;
-    std::vector<Entry> callbacks VELKOR_GUARDED_BY(listMutex);
-    std::uint64_t lastId VELKOR_GUARDED_BY(listMutex) = 0;
 };
 
 }  // namespace velkor::settings::detail

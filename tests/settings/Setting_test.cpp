@@ -14,6 +14,7 @@
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/HookedSource.hpp"
 #include "tests/support/LogCapture.hpp"
 
 namespace velkor::settings::testing {
@@ -23,6 +24,7 @@ using namespace std::chrono_literals;
 using configuration::ConfigurationImpl;
 using ::testing::ElementsAre;
 using ::testing::Optional;
+using velkor::testing::HookedSource;
 using velkor::testing::LogCapture;
 
 class SettingTest : public velkor::testing::StoreTest {
@@ -67,6 +69,14 @@ TEST_F(SettingTest, HasItsDefaultAgainWhenTheSourceIsRemovedWithItsGroup) {
     const Setting<int> port(store, "server.port", 8080);
     store->removeSource("site");
     EXPECT_EQ(port, 8080);
+}
+
+TEST_F(SettingTest, IsNotSetBackByAReadingThatAChangeHasOvertaken) {
+    const auto source = std::make_shared<HookedSource>(HookedSource::Table{{"server.port", 1}});
+    store->addSource("site", "", 10, true, source);
+    source->whenGet = [this] { store->set("server.port", 2); };
+    const Setting<int> port(store, "server.port");
+    EXPECT_EQ(port, 2);
 }
 
 TEST_F(SettingTest, FollowsASourceThatIsAdded) {

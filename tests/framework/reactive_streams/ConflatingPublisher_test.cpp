@@ -32,7 +32,7 @@ class ConflatingPublisherTest : public ::testing::Test {
 protected:
     using Stream = ConflatingPublisher<Entry, KeyOfEntry, std::function<void()>>;
 
-    void keep(const std::string& key, int value) const { publisher->keep({key, value}); }
+    void keep(const std::string& key, int value) const { publisher->keep({{key, value}}); }
 
     std::vector<std::string> delivered() const {
         std::vector<std::string> texts;
@@ -66,6 +66,15 @@ TEST_F(ConflatingPublisherTest, KeyWaitsInThePlaceOfItsFirstValue) {
     EXPECT_THAT(delivered(), ElementsAre("long key that is no short string2", "b2"));
 }
 
+TEST_F(ConflatingPublisherTest, KeysBehindADeliveredOneAreStillReplaced) {
+    for (const std::string key : {"a", "b", "c"}) keep(key, 1);
+    publisher->subscribe(subscriber);
+    subscriber->request(1);
+    for (const std::string key : {"c", "b", "a"}) keep(key, 2);
+    subscriber->request(testing::allValues);
+    EXPECT_THAT(delivered(), ElementsAre("a1", "b2", "c2", "a2"));
+}
+
 TEST_F(ConflatingPublisherTest, DeliveredKeyIsKeptAfresh) {
     publisher->subscribe(subscriber);
     subscriber->request(1);
@@ -84,6 +93,22 @@ TEST_F(ConflatingPublisherTest, KeepDeliversNothing) {
     EXPECT_THAT(delivered(), IsEmpty());
     publisher->deliver();
     EXPECT_THAT(delivered(), ElementsAre("a1"));
+}
+
+TEST_F(ConflatingPublisherTest, SubscriberThatCancelsDuringADeliveryLivesUntilItsEnd) {
+    publisher->subscribe(subscriber);
+    subscriber->request(testing::allValues);
+    const std::weak_ptr<testing::RecordingSubscriber<Entry>> alive = subscriber;
+    bool livesAfterwards = false;
+    subscriber->whenNext = [&](const Entry&) {
+        alive.lock()->cancel();
+        livesAfterwards = !alive.expired();
+    };
+    subscriber.reset();
+    keep("a", 1);
+    publisher->deliver();
+    EXPECT_TRUE(livesAfterwards);
+    EXPECT_TRUE(alive.expired());
 }
 
 TEST_F(ConflatingPublisherTest, DeliverDoesNotNest) {
@@ -106,9 +131,9 @@ TEST_F(ConflatingPublisherTest, DeliverOfAnotherThreadLeavesTheValueToTheRunning
     publisher->subscribe(subscriber);
     subscriber->whenNext = [&](const Entry& entry) {
         if (entry.key != "a") return;
-        EXPECT_TRUE(testing::completes([publisher = publisher] {
-            publisher->keep({"b", 2});
-            publisher->deliver();
+        EXPECT_TRUE(testing::completes([&stream = *publisher] {
+            stream.keep({{"b", 2}});
+            stream.deliver();
         }));
         EXPECT_THAT(delivered(), ElementsAre("a1"));
     };

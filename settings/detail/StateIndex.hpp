@@ -1,0 +1,44 @@
+#pragma once
+
+#include <boost/container/small_vector.hpp>
+#include <memory>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "configuration/Changes.hpp"
+#include "framework/common/Mutex.hpp"
+
+namespace velkor::settings::detail {
+
+class SettingState;
+
+/// The settings of one store by their keys. Holds them weakly. Thread-safe; calls nobody under its
+/// mutex.
+class StateIndex {
+public:
+    /// Passes the changes of its keys on to `state` from now on.
+    void add(const std::shared_ptr<SettingState>& state) VELKOR_EXCLUDES(mutex);
+    void remove(const SettingState& state) VELKOR_EXCLUDES(mutex);
+
+    /// All settings that are alive.
+    std::vector<std::shared_ptr<SettingState>> all() const VELKOR_EXCLUDES(mutex);
+
+    /// Passes `change` on to the settings of its key.
+    void pass(const configuration::OptionChange& change) const VELKOR_EXCLUDES(mutex);
+
+private:
+    using States = boost::container::small_vector<std::shared_ptr<SettingState>, 4>;
+
+    struct Entry {
+        const SettingState* identity;
+        std::weak_ptr<SettingState> state;
+    };
+
+    States statesOf(const std::string& key) const VELKOR_EXCLUDES(mutex);
+
+    mutable common::Mutex mutex;
+    std::unordered_map<std::string, std::vector<Entry>> byKey VELKOR_GUARDED_BY(mutex);
+};
+
+}  // namespace velkor::settings::detail
