@@ -16,6 +16,7 @@ namespace {
 
 using ::testing::ElementsAre;
 using ::testing::Optional;
+using ::testing::UnorderedElementsAre;
 
 struct Server {
     int port = 0;
@@ -85,6 +86,33 @@ TEST_F(DescribeTest, HidesSecrets) {
     EXPECT_TRUE(setting.secret);
     EXPECT_THAT(setting.defaultText, Optional(std::string("•••")));
     EXPECT_THAT(setting.value, Optional(std::string("•••")));
+}
+
+TEST_F(DescribeTest, HidesWhatAnyOfItsSettingsDeclaresSecret) {
+    const Setting<std::string> open(store, "password", "verysecret");
+    const Setting<std::string> hidden(store, "password", "verysecret", secret());
+    for (const Description& setting : describe(store)) {
+        EXPECT_TRUE(setting.secret);
+        EXPECT_THAT(setting.defaultText, Optional(std::string("•••")));
+        EXPECT_THAT(setting.value, Optional(std::string("•••")));
+    }
+}
+
+TEST_F(DescribeTest, HidesErrorsThatRepeatWhatAnotherSettingDeclaresSecret) {
+    const Setting<int> open(store, "pin", 1);
+    const Setting<std::string> hidden(store, "pin", "1", secret());
+    store->set("pin", "verysecret");
+    std::vector<std::optional<std::string>> errors;
+    for (const Description& setting : describe(store)) errors.push_back(setting.error);
+    EXPECT_THAT(errors, UnorderedElementsAre(Optional(std::string("•••")), std::nullopt));
+}
+
+TEST_F(DescribeTest, ShowsErrorsOfASecretThatSaysSoItself) {
+    const Setting<int> pin(store, "pin", 1, secret());
+    store->set("pin", "verysecret");
+    EXPECT_THAT(describe(store).front().error,
+                Optional(std::string("pin: ••• from source \"override\" is no int: not a whole "
+                                     "number in plain digits")));
 }
 
 TEST_F(DescribeTest, TellsOfErrors) {
