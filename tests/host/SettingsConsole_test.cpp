@@ -19,20 +19,6 @@ protected:
     const TemporaryFile file{"server.port=8443\nserver.password=verysecret\nserver.prot=1\n"};
 };
 
-TEST_F(SettingsConsoleTest, ListsTheSettingsOfTheProgram) {
-    EXPECT_EQ(run("settings\n").out,
-              "KEY              VALUE  SOURCE  DEFAULT  TYPE  CONSTRAINT           NOTES   "
-              "DESCRIPTION\n"
-              "server.password  •••    site    -        text  -                    secret\n"
-              "server.port      8443   site    8080     int   between 1 and 65535  -\n");
-}
-
-TEST_F(SettingsConsoleTest, FindsTyposInFiles) {
-    EXPECT_EQ(run("settings --undeclared\n").out,
-              "KEY          NEAR MISS OF\n"
-              "server.prot  server.port\n");
-}
-
 TEST_F(SettingsConsoleTest, ShowsASecretByNoCommand) {
     const auto result = run(
         "get server.password\n"
