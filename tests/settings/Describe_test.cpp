@@ -3,13 +3,18 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <memory>
 #include <optional>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "settings/Bound.hpp"
+#include "settings/Secrets.hpp"
 #include "settings/Setting.hpp"
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/BoundedWait.hpp"
 
 namespace velkor::settings::testing {
 namespace {
@@ -119,6 +124,38 @@ TEST_F(DescribeTest, TellsOfErrors) {
     const Setting<int> limit(store, "limit", 1);
     store->set("limit", "many");
     EXPECT_EQ(describe(store).front().error, limit.status().error);
+}
+
+TEST_F(DescribeTest, WaitsForNoCallback) {
+    Setting<int> limit(store, "limit", 1, secret());
+    bool listed = false;
+    const auto handle = limit.onChange([&](int, int) {
+        listed = velkor::testing::completes([this] {
+            describe(store);
+            secretKeys(store);
+        });
+    });
+    store->set("limit", 2);
+    EXPECT_TRUE(listed);
+}
+
+TEST_F(DescribeTest, ListsWhileSettingsComeAndGo) {
+    const Setting<int> limit(store, "limit", 1);
+    std::atomic<bool> ended{false};
+    std::thread other([&] {
+        for (int i = 0; i < 300; ++i) {
+            const Setting<std::string> password(store, "password", "verysecret", secret());
+        }
+        ended = true;
+    });
+    while (!ended) {
+        for (const Description& setting : describe(store)) {
+            EXPECT_NE(setting.value, std::optional<std::string>("verysecret"));
+        }
+        EXPECT_EQ(secretKeys(store).count("limit"), 0U);
+    }
+    other.join();
+    EXPECT_THAT(keys(), ElementsAre("limit"));
 }
 
 TEST_F(DescribeTest, ListsKeysThatNobodyDeclared) {
