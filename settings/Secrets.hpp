@@ -14,9 +14,13 @@ namespace velkor::settings {
 VELKOR_EXPORT std::set<std::string> secretKeys(
     const std::shared_ptr<configuration::ConfigurationImpl>& store);
 
-/// `text`, or ••• in the place of a secret.
+/// What is shown in the place of a secret value.
+inline constexpr const char* secretMark = "•••";
+
+/// `text`, or `secretMark` in the place of a secret.
 inline std::string masked(bool isSecret, std::string text) {
-    return isSecret ? "•••" : text;
+    if (isSecret) return secretMark;
+    return text;
 }
 
 }  // namespace velkor::settings

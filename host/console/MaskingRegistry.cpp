@@ -19,7 +19,7 @@ CommandHandler maskingGet(const StorePtr& store, CommandHandler get) {
         const std::string key = arguments.at(0);
         // The command looks for the key itself, and may find none.
         const bool isSecret = settings::secretKeys(store).count(key) != 0 && store->has(key).get();
-        return isSecret ? valueText({}, isSecret) : get(std::move(arguments));
+        return isSecret ? settings::secretMark : get(std::move(arguments));
     };
 }
 

@@ -24,7 +24,7 @@ std::string shownContent(const JsonMessage& reply, const std::set<std::string>& 
     if (secret.empty() || !hasValue) return reply.json;
     const auto content = parseJsonObject(reply.json);
     if (secret.count(content->optValue<std::string>("key", "")) == 0) return reply.json;
-    content->getObject("value")->set("value", settings::masked(true, ""));
+    content->getObject("value")->set("value", std::string(settings::secretMark));
     return renderJson(*content);
 }
 
