@@ -22,11 +22,15 @@
 #include "host/console/HostCommands.hpp"
 #include "host/console/LineEditor.hpp"
 #include "host/console/LineReader.hpp"
+#include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
+#include "host/console/SettingsCommand.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
 #include "host/messages/MessageService.hpp"
 #include "host/sources/SourceLoader.hpp"
+#include "settings/Describe.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -48,7 +52,7 @@ public:
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output),
           service(store),
-          storeCommands(store, registry),
+          storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
           hostCommands({store, std::make_shared<Watches>(store, showValue()),
                         service.dispatcherFor(allRequestTypes()), [this] { console.quit(); }},
                        registry) {}
@@ -58,6 +62,12 @@ public:
         const auto failures = loadSources(*store, requests, limits);
         for (const auto& failure : failures) output.message(failure);
         return failures.empty();
+    }
+
+    /// Declares settings, and lists them by a command if there are any.
+    void declareSettings(const DeclareSettings& declare) {
+        if (declare) declared = declare(store);
+        if (!settings::describe(store).empty()) settingsCommand.emplace(store, registry);
     }
 
     /// Carries out the given lines or, when there are none, those that are typed or read.
@@ -70,8 +80,10 @@ private:
     // Only commands change the store, so that a value is shown between two lines, never while one
     // is being edited.
     Watches::Show showValue() {
-        return
-            [this](const auto& key, const auto& value) { output.answer(optionText(key, value)); };
+        return [this](const auto& key, const auto& value) {
+            const bool isSecret = settings::secretKeys(store).count(key) != 0;
+            output.answer(optionText(key, value, isSecret));
+        };
     }
 
     std::unique_ptr<LineSource> makeLineSource(const std::vector<std::string>& lines) {
@@ -95,6 +107,8 @@ private:
     MessageService service;
     configuration::ConfigurationCommandProvider storeCommands;
     HostCommands hostCommands;
+    std::shared_ptr<const void> declared;
+    std::optional<SettingsCommand> settingsCommand;
 };
 
 /// A reader that has gone away is no failure; a full disk is.
@@ -105,7 +119,7 @@ bool answersArrived(Output& output) {
     return false;
 }
 
-ExitCode runSession(const Options& options, Output& output) {
+ExitCode runSession(const Options& options, const DeclareSettings& declare, Output& output) {
     std::optional<LogSink> logSink;
     if (!options.logs.empty()) logSink.emplace(std::cerr);
     for (const auto& log : options.logs) {
@@ -113,6 +127,7 @@ ExitCode runSession(const Options& options, Output& output) {
     }
     Session session(output, options.limits);
     const bool allLoaded = session.load(options.sources);
+    session.declareSettings(declare);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
@@ -120,7 +135,7 @@ ExitCode runSession(const Options& options, Output& output) {
 
 }  // namespace
 
-ExitCode runProgram(const std::vector<std::string>& arguments) {
+ExitCode runProgram(const std::vector<std::string>& arguments, const DeclareSettings& declare) {
     DescriptorBuffer standardOutput(STDOUT_FILENO);
     std::ostream answers(&standardOutput);
     Output output(answers,
@@ -130,7 +145,7 @@ ExitCode runProgram(const std::vector<std::string>& arguments) {
     try {
         const Options options = parseOptions(arguments);
         output.answer(options.information);
-        if (options.information.empty()) exitCode = runSession(options, output);
+        if (options.information.empty()) exitCode = runSession(options, declare, output);
     } catch (const UsageError& error) {
         output.message(error.what());
         return ExitCode::badUsage;

@@ -53,6 +53,11 @@ TEST(Program, ListsItsSources) {
               "default   -      2147483647  writable\n");
 }
 
+TEST(Program, HasNoCommandForSettingsWhereThereAreNone) {
+    EXPECT_EQ(runProgram({"-c", "settings"}).err, "velkor-config: Unknown command: settings\n");
+    EXPECT_EQ(runProgram({"-c", "help"}).out.find("settings"), std::string::npos);
+}
+
 TEST(Program, TakesMessagesAsJson) {
     const auto result = runProgram(
         {"-c", R"(send ConfigurationSet {"key":"server.port","value":{"type":"int","value":9090}})",
