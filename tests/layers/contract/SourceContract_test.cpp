@@ -1,0 +1,128 @@
+// Every source of this repository keeps to the contract.
+
+#include "layers/testing/SourceContract.hpp"
+
+#include <future>
+#include <memory>
+#include <optional>
+#include <string>
+#include <utility>
+
+#include "configuration/sources/ForgettingSource.hpp"
+#include "configuration/sources/InMemorySource.hpp"
+#include "configuration/sources/PropertyFileSource.hpp"
+#include "layers/LiveSource.hpp"
+#include "tests/layers/contract/PropertyText.hpp"
+#include "tests/layers/contract/RightSource.hpp"
+#include "tests/support/TemporaryFile.hpp"
+
+namespace velkor::layers {
+namespace {
+
+using configuration::ConfigurationSource;
+using configuration::ConfigurationValue;
+using configuration::ValueMap;
+using configuration::ValueTable;
+using namespace layers::testing;
+
+class InMemory : public SourceSubject {
+public:
+    std::shared_ptr<ConfigurationSource> make(const ValueMap& values) override {
+        return std::make_shared<configuration::InMemorySource>(ValueMap(values));
+    }
+};
+INSTANTIATE_TYPED_TEST_SUITE_P(InMemorySource, SourceContract, InMemory);
+
+class PropertyFile : public SourceSubject {
+public:
+    std::shared_ptr<ConfigurationSource> make(const ValueMap& values) override {
+        file.rewrite(propertyText(values));
+        return std::make_shared<configuration::PropertyFileSource>(file.widePath());
+    }
+    bool isWritable() const override { return false; }
+    bool canHold(const ConfigurationValue& value) const override {
+        return boost::get<std::string>(&value) != nullptr;
+    }
+
+private:
+    velkor::testing::TemporaryFile file{""};
+};
+INSTANTIATE_TYPED_TEST_SUITE_P(PropertyFileSource, SourceContract, PropertyFile);
+
+// The base of sources that change by themselves, and as little as makes a source of it.
+class LiveTable final : public LiveSource, public configuration::ForgettingSource {
+public:
+    explicit LiveTable(ValueMap initial) : LiveSource(typeid(LiveTable), std::move(initial)) {}
+
+    ConfigurationValue set(const std::string& key, ConfigurationValue value) override {
+        return put(key, value).value_or(value);
+    }
+
+    std::optional<ConfigurationValue> unset(const std::string& key) override {
+        return put(key, {});
+    }
+
+    // Gives what was there before.
+    std::optional<ConfigurationValue> put(const std::string& key,
+                                          const std::optional<ConfigurationValue>& value) {
+        std::optional<ConfigurationValue> former;
+        change([&](ValueTable& table) {
+            former = table.take(key);
+            if (value) table.insert(key, ConfigurationValue(*value));
+            return former || value ? Keys{key} : Keys{};
+        });
+        return former;
+    }
+};
+
+class Live : public ChangingSubject {
+public:
+    std::shared_ptr<ConfigurationSource> make(const ValueMap& values) override {
+        source = std::make_shared<LiveTable>(values);
+        return source;
+    }
+    void change(const std::string& key, const std::optional<ConfigurationValue>& value) override {
+        source->put(key, value);
+    }
+
+protected:
+    std::shared_ptr<LiveTable> source;
+};
+INSTANTIATE_TYPED_TEST_SUITE_P(LiveSource, SourceContract, Live);
+
+// The changes come later, on another thread.
+class LiveLater : public Live {
+public:
+    void change(const std::string& key, const std::optional<ConfigurationValue>& value) override {
+        latest = std::async(std::launch::async, [former = latest, changed = source, key, value] {
+                     if (former.valid()) former.wait();
+                     changed->put(key, value);
+                 }).share();
+    }
+
+private:
+    std::shared_future<void> latest;
+};
+INSTANTIATE_TYPED_TEST_SUITE_P(LiveSourceOnAnotherThread, SourceContract, LiveLater);
+
+class Right : public ChangingSubject {
+public:
+    std::shared_ptr<ConfigurationSource> make(const ValueMap& values) override {
+        source = std::make_shared<RightSource>(values);
+        return source;
+    }
+    void change(const std::string& key, const std::optional<ConfigurationValue>& value) override {
+        if (value) {
+            source->set(key, *value);
+        } else {
+            source->unset(key);
+        }
+    }
+
+private:
+    std::shared_ptr<RightSource> source;
+};
+INSTANTIATE_TYPED_TEST_SUITE_P(WhatTheWrongSourcesDeriveFrom, SourceContract, Right);
+
+}  // namespace
+}  // namespace velkor::layers
