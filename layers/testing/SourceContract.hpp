@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <memory>
+#include <string>
 #include <type_traits>
 
 #include "layers/testing/SourceSubject.hpp"
@@ -18,17 +19,13 @@ namespace velkor::layers::testing {
 /// the source, which are written with Google Test. `Subject` derives from `SourceSubject` and says
 /// how the source is made and what it can do.
 ///
-///     using namespace velkor::layers::testing;
-///     INSTANTIATE_TYPED_TEST_SUITE_P(MySource, SourceContract, MySubject);
+///     VELKOR_SOURCE_CONTRACT(MySource, MySubject);
 ///
 /// Each rule is a test. One that asks for what the source can't do is skipped. No source makes a
 /// test hang: what doesn't come within the subject's patience has failed, and threads that a source
 /// blocks are left behind with what they use.
 template <class Subject>
 class SourceContract : public ::testing::Test {
-    static_assert(std::is_base_of_v<SourceSubject, Subject>,
-                  "a subject derives from velkor::layers::testing::SourceSubject");
-
 protected:
     static void expect(void (*rule)(const detail::MakeSubject&)) {
         // Rules wait for one thing that doesn't come, and end.
@@ -130,4 +127,27 @@ REGISTER_TYPED_TEST_SUITE_P(SourceContract, HasGetAndKeysAgree, EveryKindIsKeptE
                             ListenerMayDetachItself, WatcherEndsOnTheLastValue,
                             RemovedSourceCanBeAddedAgain, SourceOutlivesItsStore);
 
+namespace detail {
+
+/// The name of a contract among the tests.
+struct ContractName {
+    template <class>
+    static std::string GetName(int) {
+        return "Rule";
+    }
+};
+
+}  // namespace detail
+
 }  // namespace velkor::layers::testing
+
+/// Makes the tests `name`/SourceContract/Rule.* for the source that `Subject` stands for. For the
+/// scope of a namespace; `name` is an identifier, and of its own in the program.
+#define VELKOR_SOURCE_CONTRACT(name, Subject)                                            \
+    namespace velkor_source_contract_of_##name {                                         \
+        using namespace ::velkor::layers::testing;                                       \
+        INSTANTIATE_TYPED_TEST_SUITE_P(name, SourceContract, Subject,                    \
+                                       ::velkor::layers::testing::detail::ContractName); \
+    }                                                                                    \
+    static_assert(std::is_base_of_v<::velkor::layers::testing::SourceSubject, Subject>,  \
+                  "a subject derives from velkor::layers::testing::SourceSubject")

@@ -31,7 +31,7 @@ public:
         return std::make_shared<configuration::InMemorySource>(ValueMap(values));
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(InMemorySource, SourceContract, InMemory);
+VELKOR_SOURCE_CONTRACT(InMemorySource, InMemory);
 
 class PropertyFile : public SourceSubject {
 public:
@@ -47,7 +47,7 @@ public:
 private:
     velkor::testing::TemporaryFile file{""};
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(PropertyFileSource, SourceContract, PropertyFile);
+VELKOR_SOURCE_CONTRACT(PropertyFileSource, PropertyFile);
 
 // The base of sources that change by themselves, and as little as makes a source of it.
 class LiveTable final : public LiveSource, public configuration::ForgettingSource {
@@ -88,7 +88,7 @@ public:
 protected:
     std::shared_ptr<LiveTable> source;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(LiveSource, SourceContract, Live);
+VELKOR_SOURCE_CONTRACT(LiveSource, Live);
 
 // The changes come later, on another thread.
 class LiveLater : public Live {
@@ -103,7 +103,7 @@ public:
 private:
     std::shared_future<void> latest;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(LiveSourceOnAnotherThread, SourceContract, LiveLater);
+VELKOR_SOURCE_CONTRACT(LiveSourceOnAnotherThread, LiveLater);
 
 class Right : public ChangingSubject {
 public:
@@ -122,7 +122,7 @@ public:
 private:
     std::shared_ptr<RightSource> source;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(WhatTheWrongSourcesDeriveFrom, SourceContract, Right);
+VELKOR_SOURCE_CONTRACT(WhatTheWrongSourcesDeriveFrom, Right);
 
 }  // namespace
 }  // namespace velkor::layers

@@ -70,7 +70,7 @@ public:
 private:
     const std::set<std::string> known;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(HidesNewKeys, SourceContract, Wrong<HidesNewKeys>);
+VELKOR_SOURCE_CONTRACT(HidesNewKeys, Wrong<HidesNewKeys>);
 
 class KeepsIntegersAsTexts : public RightSource {
 public:
@@ -80,7 +80,7 @@ public:
         return RightSource::set(key, value);
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(KeepsIntegersAsTexts, SourceContract, Wrong<KeepsIntegersAsTexts>);
+VELKOR_SOURCE_CONTRACT(KeepsIntegersAsTexts, Wrong<KeepsIntegersAsTexts>);
 
 class GivesTheNewValue : public RightSource {
 public:
@@ -90,7 +90,7 @@ public:
         return value;
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(GivesTheNewValue, SourceContract, Wrong<GivesTheNewValue>);
+VELKOR_SOURCE_CONTRACT(GivesTheNewValue, Wrong<GivesTheNewValue>);
 
 class GivesNoValueForNewKeys : public RightSource {
 public:
@@ -101,8 +101,7 @@ public:
         return isNew ? ConfigurationValue() : answer;
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(GivesNoValueForNewKeys, SourceContract,
-                               Wrong<GivesNoValueForNewKeys>);
+VELKOR_SOURCE_CONTRACT(GivesNoValueForNewKeys, Wrong<GivesNoValueForNewKeys>);
 
 class IgnoresWrites : public RightSource {
 public:
@@ -113,14 +112,14 @@ class NotWritable : public Wrong<IgnoresWrites> {
 public:
     bool isWritable() const override { return false; }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(IgnoresWrites, SourceContract, NotWritable);
+VELKOR_SOURCE_CONTRACT(IgnoresWrites, NotWritable);
 
 class ForgetsSilently : public RightSource {
 public:
     using RightSource::RightSource;
     std::optional<ConfigurationValue> unset(const std::string& key) override { return take(key); }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(ForgetsSilently, SourceContract, Wrong<ForgetsSilently>);
+VELKOR_SOURCE_CONTRACT(ForgetsSilently, Wrong<ForgetsSilently>);
 
 class TellsOfMissingKeys : public RightSource {
 public:
@@ -131,7 +130,7 @@ public:
         return former;
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(TellsOfMissingKeys, SourceContract, Wrong<TellsOfMissingKeys>);
+VELKOR_SOURCE_CONTRACT(TellsOfMissingKeys, Wrong<TellsOfMissingKeys>);
 
 class TellsTwice : public RightSource {
 public:
@@ -142,7 +141,7 @@ public:
         return answer;
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(TellsTwice, SourceContract, Wrong<TellsTwice>);
+VELKOR_SOURCE_CONTRACT(TellsTwice, Wrong<TellsTwice>);
 
 class TellsOfNewKeysTooEarly : public RightSource {
 public:
@@ -155,8 +154,7 @@ public:
         return value;
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(TellsOfNewKeysTooEarly, SourceContract,
-                               Wrong<TellsOfNewKeysTooEarly>);
+VELKOR_SOURCE_CONTRACT(TellsOfNewKeysTooEarly, Wrong<TellsOfNewKeysTooEarly>);
 
 class TellsUnderItsLock : public RightSource {
 public:
@@ -166,7 +164,7 @@ public:
         return RightSource::set(key, std::move(value));
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(TellsUnderItsLock, SourceContract, Wrong<TellsUnderItsLock>);
+VELKOR_SOURCE_CONTRACT(TellsUnderItsLock, Wrong<TellsUnderItsLock>);
 
 class KeepsItsFirstListener : public RightSource {
 public:
@@ -177,7 +175,7 @@ public:
         RightSource::setChangeListener(std::move(newListener));
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(KeepsItsFirstListener, SourceContract, Wrong<KeepsItsFirstListener>);
+VELKOR_SOURCE_CONTRACT(KeepsItsFirstListener, Wrong<KeepsItsFirstListener>);
 
 class KeepsAListenerTakenBack : public RightSource {
 public:
@@ -186,22 +184,21 @@ public:
         if (newListener) RightSource::setChangeListener(std::move(newListener));
     }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(KeepsAListenerTakenBack, SourceContract,
-                               Wrong<KeepsAListenerTakenBack>);
+VELKOR_SOURCE_CONTRACT(KeepsAListenerTakenBack, Wrong<KeepsAListenerTakenBack>);
 
 class WaitsForNoCall : public RightSource {
 public:
     using RightSource::RightSource;
     bool mayReturn() const override { return true; }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(WaitsForNoCall, SourceContract, WrongWhenItChanges<WaitsForNoCall>);
+VELKOR_SOURCE_CONTRACT(WaitsForNoCall, WrongWhenItChanges<WaitsForNoCall>);
 
 class WaitsForItself : public RightSource {
 public:
     using RightSource::RightSource;
     bool mayReturn() const override { return callers.empty(); }
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(WaitsForItself, SourceContract, WrongWhenItChanges<WaitsForItself>);
+VELKOR_SOURCE_CONTRACT(WaitsForItself, WrongWhenItChanges<WaitsForItself>);
 
 // It means to spare its listener what it takes for the same news.
 class TellsOfOtherKeysOnly : public RightSource {
@@ -214,7 +211,7 @@ public:
 private:
     std::string lastTold;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(TellsOfOtherKeysOnly, SourceContract, Wrong<TellsOfOtherKeysOnly>);
+VELKOR_SOURCE_CONTRACT(TellsOfOtherKeysOnly, Wrong<TellsOfOtherKeysOnly>);
 
 class CanBeAddedOnce : public RightSource, public configuration::AttachedSource {
 public:
@@ -227,7 +224,7 @@ public:
 private:
     bool wasAttached = false;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(CanBeAddedOnce, SourceContract, Wrong<CanBeAddedOnce>);
+VELKOR_SOURCE_CONTRACT(CanBeAddedOnce, Wrong<CanBeAddedOnce>);
 
 class OwnsItsStore : public RightSource, public configuration::AttachedSource {
 public:
@@ -254,7 +251,7 @@ public:
 private:
     std::shared_ptr<OwnsItsStore> source;
 };
-INSTANTIATE_TYPED_TEST_SUITE_P(OwnsItsStore, SourceContract, OwningItsStore);
+VELKOR_SOURCE_CONTRACT(OwnsItsStore, OwningItsStore);
 
 }  // namespace
 }  // namespace velkor::layers
