@@ -3,15 +3,18 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <exception>
 #include <iostream>
 #include <memory>
 #include <optional>
 #include <system_error>
+#include <utility>
 
-#include "configuration/ConfigurationImpl.hpp"
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
+#include "configuration/admin/TypedText.hpp"
 #include "framework/common/DiagnosticLogger.hpp"
 #include "host/LogSink.hpp"
+#include "host/LoginName.hpp"
 #include "host/Options.hpp"
 #include "host/SessionStore.hpp"
 #include "host/console/CommandRegistry.hpp"
@@ -27,12 +30,11 @@
 #include "host/console/Watches.hpp"
 #include "host/messages/MessageService.hpp"
 #include "host/sources/SourceLoader.hpp"
+#include "host/state/StateLayer.hpp"
 
 namespace velkor::host {
 
 namespace {
-
-using configuration::ConfigurationImpl;
 
 bool isTerminal(int descriptor) {
     return isatty(descriptor) == 1;
@@ -46,12 +48,32 @@ public:
           limits(sourceLimits),
           store(std::make_shared<SessionStore>(limits)),
           registry(std::make_shared<CommandRegistry>()),
-          console(registry, output),
+          console(registry, output, [this] { store->acknowledge(); }),
           service(store),
           storeCommands(store, registry),
           hostCommands({store, std::make_shared<Watches>(store, showValue()),
                         service.dispatcherFor(allRequestTypes()), [this] { console.quit(); }},
                        registry) {}
+
+    /// Lets writes last in the file at `path`; gives whether they can, or reports why not.
+    bool keepStateIn(const std::string& path) {
+        try {
+            store->keepStateIn(openState(path, loginName()));
+            return true;
+        } catch (const std::exception& error) {
+            output.message(error.what());
+            return false;
+        }
+    }
+
+    /// Adds the values of the command line as a source.
+    void assign(const std::vector<Assignment>& assignments) {
+        if (assignments.empty()) return;
+        configuration::ValueMap values;
+        for (const auto& [key, text] : assignments) values[key] = configuration::typedText(text);
+        store->addInMemorySource("command-line", "", SourceRequest::commandLineOrder, true,
+                                 std::move(values));
+    }
 
     /// Gives whether all sources could be added; reports those that could not.
     bool load(const std::vector<SourceRequest>& requests) {
@@ -89,7 +111,7 @@ private:
 
     Output& output;
     const SourceLimits limits;
-    std::shared_ptr<ConfigurationImpl> store;
+    std::shared_ptr<SessionStore> store;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
     MessageService service;
@@ -112,6 +134,11 @@ ExitCode runSession(const Options& options, Output& output) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
     Session session(output, options.limits);
+    // Without it a write would be lost that is meant to last.
+    if (options.statePath && !session.keepStateIn(*options.statePath)) {
+        return ExitCode::sourceNotLoaded;
+    }
+    session.assign(options.assignments);
     const bool allLoaded = session.load(options.sources);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;

@@ -6,6 +6,7 @@
 #include <stdexcept>
 
 #include "host/sources/PropertyFile.hpp"
+#include "layers/environment/EnvironmentSource.hpp"
 
 namespace velkor::host {
 
@@ -20,8 +21,18 @@ std::shared_ptr<configuration::ConfigurationSource> makeFile(const SourceRequest
     return loadPropertyFile(request.location, limits);
 }
 
+std::string environmentName(const SourceRequest&) {
+    return "environment";
+}
+
+std::shared_ptr<configuration::ConfigurationSource> makeEnvironment(const SourceRequest& request,
+                                                                    const SourceLimits&) {
+    return std::make_shared<layers::EnvironmentSource>(layers::EnvironmentNames(request.location));
+}
+
 constexpr SourceKind kinds[] = {
     {"file", stemOfPath, makeFile},
+    {"environment", environmentName, makeEnvironment},
 };
 
 }  // namespace

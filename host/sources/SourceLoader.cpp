@@ -13,7 +13,9 @@ namespace {
 /// Gives each source without a name one that no other source has.
 class SourceNames {
 public:
-    explicit SourceNames(const std::vector<SourceRequest>& requests) {
+    SourceNames(configuration::ConfigurationImpl& store,
+                const std::vector<SourceRequest>& requests) {
+        for (const auto& source : store.describeSources().get()) taken.insert(source.name);
         for (const auto& request : requests) {
             if (request.name) taken.insert(*request.name);
         }
@@ -30,7 +32,7 @@ public:
     }
 
 private:
-    std::set<std::string> taken{"override", "default"};  // the store's own
+    std::set<std::string> taken;
 };
 
 void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
@@ -47,7 +49,7 @@ std::vector<std::string> loadSources(configuration::ConfigurationImpl& store,
                                      const std::vector<SourceRequest>& requests,
                                      const SourceLimits& limits) {
     std::vector<std::string> failures;
-    SourceNames names(requests);
+    SourceNames names(store, requests);
     for (const auto& request : requests) {
         try {
             loadSource(store, names.nameOf(request), request, limits);
