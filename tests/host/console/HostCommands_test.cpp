@@ -17,7 +17,8 @@ namespace {
 using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
-const Words hostNames{"sources", "explain", "watch", "unwatch", "send", "help", "quit"};
+const Words hostNames{"sources", "explain", "watch", "unwatch", "put", "unset",
+                      "history", "undo",    "send",  "help",    "quit"};
 
 class HostCommandsTest : public ::testing::Test {
 protected:
@@ -33,8 +34,7 @@ protected:
         return registry->find(name)->run(std::move(arguments));
     }
 
-    std::shared_ptr<configuration::ConfigurationImpl> store =
-        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     Words shown;
     bool quitting = false;
@@ -123,6 +123,20 @@ TEST_F(HostCommandsTest, WatchRefusesAKeyThatIsWatched) {
 
 TEST_F(HostCommandsTest, UnwatchRefusesAKeyThatIsNotWatched) {
     EXPECT_EQ(thrownText<CommandError>([&] { run("unwatch", {"a"}); }), "Not watched: a");
+}
+
+TEST_F(HostCommandsTest, PutAndUnsetWorkOnTheStore) {
+    EXPECT_EQ(run("put", {"a", "1"}), "");
+    EXPECT_EQ(run("unset", {"a"}), "No configuration option with key: a");
+}
+
+TEST_F(HostCommandsTest, HistoryAndUndoNeedALayerThatLasts) {
+    EXPECT_THROW(run("history", {"a", "--limit", "5"}), CommandError);
+    EXPECT_THROW(run("undo"), CommandError);
+}
+
+TEST_F(HostCommandsTest, UndoSuggestsNoKeys) {
+    EXPECT_EQ(registry->find("undo")->suggestions()(), Words{});
 }
 
 TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {

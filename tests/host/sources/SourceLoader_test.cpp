@@ -70,6 +70,12 @@ TEST_F(SourceLoaderTest, NumbersNamesThatAreTaken) {
               (Words{"override", "default-2", "base-3", "base-2", "base", "default"}));
 }
 
+TEST_F(SourceLoaderTest, NumbersNamesThatTheStoreHas) {
+    store->addInMemorySource("base", "", 5, true, {});
+    EXPECT_EQ(load({file(base)}), Words{});
+    EXPECT_EQ(sourceNames(), (Words{"override", "base", "base-2", "default"}));
+}
+
 TEST_F(SourceLoaderTest, LeavesGivenNamesToTheirSources) {
     EXPECT_EQ(load({file(base), source("base", site)}), Words{});
     EXPECT_EQ(sourceNames(), (Words{"override", "base", "base-2", "default"}));
