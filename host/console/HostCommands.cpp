@@ -22,10 +22,12 @@ struct Context {
 };
 
 std::string showSources(const Context& context, const Arguments&) {
-    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS"}};
+    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS", ""}};
     for (const auto& source : context.services.store->describeSources().get()) {
         rows.push_back({source.name, source.group.empty() ? "-" : source.group,
-                        std::to_string(source.order), source.readOnly ? "read-only" : "writable"});
+                        std::to_string(source.order), source.readOnly ? "read-only" : "writable",
+                        context.services.problemOf(source.name)});
+        if (!rows.back().back().empty()) rows.front().back() = "PROBLEM";
     }
     return formatTable(rows);
 }

@@ -18,11 +18,15 @@ struct HostServices {
     std::shared_ptr<Watches> watches;
     std::shared_ptr<const MessageDispatcher> messages;
     std::function<void()> quit;  ///< Ends the session.
+    /// What is the matter with the source of that name; empty when nothing is.
+    std::function<std::string(const std::string& name)> problemOf = [](const auto&) {
+        return std::string();
+    };
 };
 
 /// Keeps the host's own commands registered while it lives:
 ///
-/// - sources: a table of all sources in order of precedence.
+/// - sources: a table of all sources in order of precedence, with what is the matter with them.
 /// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
 ///   is the effective one.
 /// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.

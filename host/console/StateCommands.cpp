@@ -1,17 +1,16 @@
 #include "host/console/StateCommands.hpp"
 
-#include <array>
 #include <charconv>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
-#include <ctime>
 #include <optional>
 #include <utility>
 
 #include "configuration/admin/TypedText.hpp"
 #include "host/console/Command.hpp"
 #include "host/console/Table.hpp"
+#include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Conversion.hpp"
 
@@ -69,14 +68,6 @@ std::string effectiveText(SessionStore& store, const std::string& key) {
     const auto options = store.explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
     return optionText(key, options.front().value) + " (" + options.front().source + ")";
-}
-
-std::string timeText(std::chrono::system_clock::time_point when) {
-    const std::time_t seconds = std::chrono::system_clock::to_time_t(when);
-    std::tm utc{};
-    gmtime_r(&seconds, &utc);
-    std::array<char, sizeof "-2147483648-01-01T00:00:00Z"> text;
-    return {text.data(), std::strftime(text.data(), text.size(), "%Y-%m-%dT%H:%M:%SZ", &utc)};
 }
 
 std::string valueCell(const std::optional<ConfigurationValue>& value) {

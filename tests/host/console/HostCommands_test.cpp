@@ -26,8 +26,8 @@ protected:
         const auto show = [this](const auto& key, const auto& value) {
             shown.push_back(optionText(key, value));
         };
-        return {store, std::make_shared<Watches>(store, show), nullptr,
-                [this] { quitting = true; }};
+        return {store, std::make_shared<Watches>(store, show), nullptr, [this] { quitting = true; },
+                [this](const auto& name) { return name == troubled ? "not now" : ""; }};
     }
 
     std::string run(const std::string& name, Words arguments = {}) {
@@ -38,6 +38,7 @@ protected:
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     Words shown;
     bool quitting = false;
+    std::string troubled;
     HostCommands commands{services(), registry};
 };
 
@@ -91,6 +92,14 @@ TEST_F(HostCommandsTest, SourcesListsThemInOrderOfPrecedence) {
               "override  -        0           writable\n"
               "site      server.  5           read-only\n"
               "default   -        2147483647  writable\n");
+}
+
+TEST_F(HostCommandsTest, SourcesShowsWhatIsTheMatterWithOne) {
+    troubled = "override";
+    EXPECT_EQ(run("sources"),
+              "NAME      GROUP  ORDER       ACCESS    PROBLEM\n"
+              "override  -      0           writable  not now\n"
+              "default   -      2147483647  writable\n");
 }
 
 TEST_F(HostCommandsTest, ExplainShowsTheEffectiveValueFirst) {

@@ -28,7 +28,7 @@ protected:
     }
 
     Words load(const std::vector<SourceRequest>& requests, const SourceLimits& limits = {}) {
-        return loadSources(*store, requests, limits);
+        return loadSources(*store, requests, limits).failures;
     }
 
     Words sourceNames() {
