@@ -19,8 +19,8 @@ class SourceSubject {
 public:
     virtual ~SourceSubject() = default;
 
-    /// A new source that holds exactly `values`, which `canHold` has accepted. Keys are lower-case
-    /// letters and dots.
+    /// A new source that holds exactly `values`, which `canHold` has accepted. Keys consist of
+    /// lower-case letters, digits and dots.
     virtual std::shared_ptr<configuration::ConfigurationSource> make(
         const configuration::ValueMap& values) = 0;
 

@@ -3,10 +3,11 @@
 #include <chrono>
 #include <condition_variable>
 #include <future>
-#include <mutex>
 #include <thread>
 #include <utility>
 #include <vector>
+
+#include "framework/common/Mutex.hpp"
 
 namespace velkor::layers::testing::detail {
 
@@ -15,21 +16,28 @@ template <class T>
 class Noted {
 public:
     void note(T thing) {
-        const std::lock_guard<std::mutex> lock(mutex);
+        const common::MutexLock lock(mutex);
         things.push_back(std::move(thing));
         grown.notify_all();
     }
 
     std::vector<T> all() const {
-        const std::lock_guard<std::mutex> lock(mutex);
+        const common::MutexLock lock(mutex);
         return things;
     }
 
     /// Whether `condition`, which is asked about all that was noted, holds within `limit`.
     template <class Condition>
     [[nodiscard]] bool becomes(std::chrono::milliseconds limit, const Condition& condition) {
-        std::unique_lock<std::mutex> lock(mutex);
-        return grown.wait_for(lock, limit, [&] { return condition(std::as_const(things)); });
+        using Clock = std::chrono::steady_clock;
+        const auto end = Clock::now() + limit;
+        common::MutexLock lock(mutex);
+        while (!condition(std::as_const(things))) {
+            const auto left = end - Clock::now();
+            if (left <= Clock::duration::zero()) return false;
+            lock.waitFor(grown, left);
+        }
+        return true;
     }
 
     /// Whether anything is noted within `limit`.
@@ -38,9 +46,9 @@ public:
     }
 
 private:
-    mutable std::mutex mutex;
+    mutable common::Mutex mutex;
     std::condition_variable grown;
-    std::vector<T> things;  // guarded by mutex
+    std::vector<T> things VELKOR_GUARDED_BY(mutex);
 };
 
 /// Calls `function` on a thread of its own, which is left behind if nobody waits for its answer.

@@ -1,4 +1,5 @@
-// Every source of this repository keeps to the contract.
+// Every source of this repository keeps to the contract. Those of the optional libraries stand in
+// files of their own.
 
 #include "layers/testing/SourceContract.hpp"
 
@@ -7,11 +8,14 @@
 #include <optional>
 #include <string>
 #include <utility>
+#include <vector>
 
 #include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/InMemorySource.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
 #include "layers/LiveSource.hpp"
+#include "layers/environment/EnvironmentNames.hpp"
+#include "layers/environment/EnvironmentSource.hpp"
 #include "tests/layers/contract/PropertyText.hpp"
 #include "tests/layers/contract/RightSource.hpp"
 #include "tests/support/TemporaryFile.hpp"
@@ -48,6 +52,27 @@ private:
     velkor::testing::TemporaryFile file{""};
 };
 VELKOR_SOURCE_CONTRACT(PropertyFileSource, PropertyFile);
+
+class Environment : public SourceSubject {
+public:
+    std::shared_ptr<ConfigurationSource> make(const ValueMap& values) override {
+        const EnvironmentNames names("CONTRACT_");
+        std::vector<std::string> variables;
+        for (const auto& [key, value] : values) {
+            variables.push_back(names.nameOf(key).value() + "=" + boost::get<std::string>(value));
+        }
+        std::vector<const char*> pointers;
+        for (const auto& variable : variables) pointers.push_back(variable.c_str());
+        pointers.push_back(nullptr);
+        return std::make_shared<EnvironmentSource>(names, pointers.data());
+    }
+    bool isWritable() const override { return false; }
+    bool canHold(const ConfigurationValue& value) const override {
+        const auto* const text = boost::get<std::string>(&value);
+        return text != nullptr && text->find('\0') == std::string::npos;
+    }
+};
+VELKOR_SOURCE_CONTRACT(EnvironmentSource, Environment);
 
 // The base of sources that change by themselves, and as little as makes a source of it.
 class LiveTable final : public LiveSource, public configuration::ForgettingSource {
