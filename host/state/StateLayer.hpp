@@ -19,7 +19,7 @@ struct StateChange {
     std::int64_t number = 0;
     std::chrono::system_clock::time_point when{};
     std::string author{};
-    std::string action{};  ///< set, unset, undo or expired.
+    std::string action{};  ///< set, unset, undo, expired, or other.
     std::string key{};
     std::optional<configuration::ConfigurationValue> before{};
     std::optional<configuration::ConfigurationValue> after{};
