@@ -19,13 +19,17 @@ constexpr const char* description =
     "Commands are read from the terminal or from standard input; 'help' lists them.";
 
 constexpr const char* footer =
-    "Values of later sources override those of earlier ones, and what 'set' writes overrides\n"
-    "them all, unless an order says otherwise: the smaller order wins.\n"
+    "Values of later files override those of earlier ones, --env overrides the files, --set the\n"
+    "environment, and what 'set' writes overrides them all, unless an order says otherwise: the\n"
+    "smaller order wins.\n"
+    "With --env APP_ the variable APP_SERVER__MAX_SIZE is server.max_size.\n"
+    "On a terminal files are read again when they change, unless an option says otherwise.\n"
     "SIZE is a number of bytes, also with KiB, MiB or GiB behind it.\n"
     "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
     "separated by commas.\n"
     "\n"
-    "Exit status: 0 fine, 1 a command failed, 2 bad usage, 3 a source could not be loaded.";
+    "Exit status: 0 fine, 1 a command failed, 2 bad usage, 3 a source or the state could not be\n"
+    "loaded.";
 
 constexpr const char* groupSetting = "group=";
 constexpr const char* orderSetting = "order=";
@@ -99,6 +103,13 @@ std::string unguarded(const std::string& text) {
     return !text.empty() && text.front() == guard ? text.substr(1) : text;
 }
 
+SourceRequest environment(const std::string& prefix) {
+    SourceRequest request{std::nullopt, prefix};
+    request.order = SourceRequest::environmentOrder;
+    request.kind = "environment";
+    return request;
+}
+
 /// The command line's options, as the parsing library knows them.
 class Parser {
 public:
@@ -108,6 +119,13 @@ public:
         add(files, "FILE", "", "A property file, added as a read-only source.");
         add(sources, "--source", "NAME=PATH[,group=G][,order=N][,writable]",
             "A property file with all that a source has.");
+        add(environments, "--env", "PREFIX",
+            "Add the environment variables that begin with PREFIX.");
+        add(assignments, "--set", "KEY=VALUE", "A value in front of files and environment.");
+        add(states, "--state", "FILE",
+            "Keep what is set in FILE, with its history; made when missing.");
+        addFlag("--watch-files", true, "Read files again when they change.");
+        addFlag("--no-watch-files", false, "Read files once; as without a terminal.");
         add(fileSizes, "--max-file-size", "SIZE",
             "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
@@ -134,6 +152,11 @@ public:
         for (const auto& text : lines.texts) options.lines.push_back(unguarded(text));
         for (const auto& text : logs.texts) options.logs.push_back(parseLog(unguarded(text)));
         for (const auto& text : fileSizes.texts) options.limits.fileBytes = parseFileSize(text);
+        for (const auto& text : assignments.texts) {
+            options.assignments.push_back(parseAssignment(unguarded(text)));
+        }
+        if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
+        options.watchesFiles = watchesFiles;
         collectSources(options);
         return options;
     }
@@ -149,7 +172,15 @@ private:
         added.option->allow_extra_args(added.option->get_positional())->type_name(value);
     }
 
-    // Files and --source options may be mixed: their order on the command line matters.
+    // Of several the last one counts.
+    void addFlag(const char* name, bool watches, const char* help) {
+        app.add_flag_callback(
+               name, [this, watches] { watchesFiles = watches; }, help)
+            ->trigger_on_parse();
+    }
+
+    // Files and --source options may be mixed: their order on the command line matters. That of the
+    // environment doesn't.
     void collectSources(Options& options) const {
         auto file = files.texts.begin();
         auto source = sources.texts.begin();
@@ -160,11 +191,18 @@ private:
                 options.sources.push_back(parseSource(unguarded(*source++)));
             }
         }
+        for (const auto& text : environments.texts) {
+            options.sources.push_back(environment(unguarded(text)));
+        }
     }
 
     CLI::App app{description, "velkor-config"};
     Repeatable files;
     Repeatable sources;
+    Repeatable environments;
+    Repeatable assignments;
+    Repeatable states;
+    std::optional<bool> watchesFiles;
     Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;
@@ -185,6 +223,12 @@ SourceRequest parseSource(const std::string& text) {
     SourceRequest request{parts.front().substr(0, equals), parts.front().substr(equals + 1)};
     for (std::size_t i = 1; i < parts.size(); ++i) applySetting(request, parts[i], text);
     return request;
+}
+
+Assignment parseAssignment(const std::string& text) {
+    const std::size_t equals = text.find('=');
+    if (equals == std::string::npos || equals == 0) fail("--set", text, "KEY=VALUE is needed");
+    return {text.substr(0, equals), text.substr(equals + 1)};
 }
 
 std::uintmax_t parseFileSize(const std::string& text) {

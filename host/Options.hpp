@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -15,11 +16,21 @@ struct LogRequest {
     unsigned severities;
 };
 
+/// A key with the text of its value.
+struct Assignment {
+    std::string key;
+    std::string text;
+};
+
 /// What the command line asks for.
 struct Options {
-    std::vector<SourceRequest> sources{};  ///< In the order of the command line.
+    /// Files in the order of the command line, then the environment.
+    std::vector<SourceRequest> sources{};
     SourceLimits limits{};
-    std::vector<std::string> lines{};  ///< Command lines; empty: they are read.
+    std::vector<Assignment> assignments{};
+    std::optional<std::string> statePath{};
+    std::optional<bool> watchesFiles{};  ///< Nothing: as fits the session.
+    std::vector<std::string> lines{};    ///< Command lines; empty: they are read.
     std::vector<LogRequest> logs{};
     std::string information{};  ///< What --help or --version wants shown, instead of all else.
 };
@@ -35,6 +46,9 @@ Options parseOptions(const std::vector<std::string>& arguments);
 
 /// Understands NAME=PATH[,group=G][,order=N][,writable]. Throws `UsageError`.
 SourceRequest parseSource(const std::string& text);
+
+/// Understands KEY=VALUE; the key has one character at least and no "=". Throws `UsageError`.
+Assignment parseAssignment(const std::string& text);
 
 /// Understands a number of bytes with KiB, MiB, GiB or nothing behind it. Throws `UsageError`.
 std::uintmax_t parseFileSize(const std::string& text);

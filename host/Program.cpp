@@ -3,17 +3,21 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <exception>
 #include <iostream>
 #include <memory>
 #include <optional>
 #include <system_error>
+#include <utility>
 
-#include "configuration/ConfigurationImpl.hpp"
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
+#include "configuration/admin/TypedText.hpp"
 #include "framework/common/DiagnosticLogger.hpp"
 #include "host/LogSink.hpp"
+#include "host/LoginName.hpp"
 #include "host/Options.hpp"
 #include "host/SessionStore.hpp"
+#include "host/console/Announcements.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "host/console/Completer.hpp"
 #include "host/console/Console.hpp"
@@ -25,10 +29,12 @@
 #include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
 #include "host/console/SettingsCommand.hpp"
+#include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
 #include "host/messages/MessageService.hpp"
 #include "host/sources/SourceLoader.hpp"
+#include "host/state/StateLayer.hpp"
 #include "settings/Describe.hpp"
 #include "settings/Secrets.hpp"
 
@@ -36,10 +42,13 @@ namespace velkor::host {
 
 namespace {
 
-using configuration::ConfigurationImpl;
-
 bool isTerminal(int descriptor) {
     return isatty(descriptor) == 1;
+}
+
+/// Whether somebody types the commands.
+bool isInteractive(const std::vector<std::string>& lines) {
+    return lines.empty() && isTerminal(STDIN_FILENO) && isTerminal(STDOUT_FILENO);
 }
 
 /// The store with everything that can be done to it on the console.
@@ -47,21 +56,50 @@ class Session {
 public:
     Session(Output& sessionOutput, const SourceLimits& sourceLimits)
         : output(sessionOutput),
+          announcements(std::make_shared<Announcements>(output)),
           limits(sourceLimits),
           store(std::make_shared<SessionStore>(limits)),
           registry(std::make_shared<CommandRegistry>()),
-          console(registry, output),
+          console(registry, output, [this] { store->acknowledge(); }),
           service(store),
           storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
           hostCommands({store, std::make_shared<Watches>(store, showValue()),
-                        service.dispatcherFor(allRequestTypes()), [this] { console.quit(); }},
+                        service.dispatcherFor(allRequestTypes()), [this] { console.quit(); },
+                        [this](const auto& name) { return problemOf(name); }},
                        registry) {}
 
-    /// Gives whether all sources could be added; reports those that could not.
+    // Threads of sources may be about to announce something still.
+    ~Session() { announcements->close(); }
+
+    Session(const Session&) = delete;
+    Session& operator=(const Session&) = delete;
+
+    /// Lets writes last in the file at `path`; gives whether they can, or reports why not.
+    bool keepStateIn(const std::string& path) {
+        try {
+            store->keepStateIn(openState(path, loginName()));
+            return true;
+        } catch (const std::exception& error) {
+            output.message(error.what());
+            return false;
+        }
+    }
+
+    /// Adds the values of the command line as a source.
+    void assign(const std::vector<Assignment>& assignments) {
+        if (assignments.empty()) return;
+        configuration::ValueMap values;
+        for (const auto& [key, text] : assignments) values[key] = configuration::typedText(text);
+        store->addInMemorySource("command-line", "", SourceRequest::commandLineOrder, true,
+                                 std::move(values));
+    }
+
+    /// Gives whether all sources could be loaded; reports those that could not.
     bool load(const std::vector<SourceRequest>& requests) {
-        const auto failures = loadSources(*store, requests, limits);
-        for (const auto& failure : failures) output.message(failure);
-        return failures.empty();
+        auto loaded = loadSources(*store, requests, limits);
+        watchedFiles = std::move(loaded.watchedFiles);
+        for (const auto& failure : loaded.failures) output.message(failure);
+        return loaded.failures.empty();
     }
 
     /// Declares settings, and lists them by a command if there are any.
@@ -77,31 +115,39 @@ public:
     }
 
 private:
-    // Only commands change the store, so that a value is shown between two lines, never while one
-    // is being edited.
-    Watches::Show showValue() {
-        return [this](const auto& key, const auto& value) {
-            const bool isSecret = settings::secretKeys(store).count(key) != 0;
-            output.answer(optionText(key, value, isSecret));
+    Watches::Show showValue() const {
+        return [announcements = announcements, watched = std::weak_ptr(store)](const auto& key,
+                                                                               const auto& value) {
+            const auto open = watched.lock();
+            const bool isSecret = open != nullptr && settings::secretKeys(open).count(key) != 0;
+            announcements->announce(optionText(key, value, isSecret));
         };
+    }
+
+    std::string problemOf(const std::string& name) const {
+        const auto file = watchedFiles.find(name);
+        if (file == watchedFiles.end()) return "";
+        const auto problem = file->second->status().problem;
+        return problem ? "since " + timeText(problem->since) + ": " + problem->text : "";
     }
 
     std::unique_ptr<LineSource> makeLineSource(const std::vector<std::string>& lines) {
         if (!lines.empty()) return std::make_unique<GivenLines>(lines);
-        if (!isTerminal(STDIN_FILENO) || !isTerminal(STDOUT_FILENO)) {
-            return std::make_unique<LineReader>(std::cin);
-        }
+        if (!isInteractive(lines)) return std::make_unique<LineReader>(std::cin);
         const Completer completer(registry, [store = store] {
             const auto keys = store->keys().get();
             return std::vector<std::string>(keys.begin(), keys.end());
         });
         return std::make_unique<LineEditor>(
-            [completer](const std::string& line) { return completer.complete(line); });
+            [completer](const std::string& line) { return completer.complete(line); },
+            *announcements);
     }
 
     Output& output;
+    const std::shared_ptr<Announcements> announcements;
     const SourceLimits limits;
-    std::shared_ptr<ConfigurationImpl> store;
+    LoadedSources::WatchedFiles watchedFiles;
+    std::shared_ptr<SessionStore> store;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
     MessageService service;
@@ -119,6 +165,11 @@ bool answersArrived(Output& output) {
     return false;
 }
 
+std::vector<SourceRequest> watched(std::vector<SourceRequest> sources, bool watches) {
+    for (auto& source : sources) source.watched = watches;
+    return sources;
+}
+
 ExitCode runSession(const Options& options, const DeclareSettings& declare, Output& output) {
     std::optional<LogSink> logSink;
     if (!options.logs.empty()) logSink.emplace(std::cerr);
@@ -126,7 +177,13 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
     Session session(output, options.limits);
-    const bool allLoaded = session.load(options.sources);
+    // Without it a write would be lost that is meant to last.
+    if (options.statePath && !session.keepStateIn(*options.statePath)) {
+        return ExitCode::sourceNotLoaded;
+    }
+    session.assign(options.assignments);
+    const bool watches = options.watchesFiles.value_or(isInteractive(options.lines));
+    const bool allLoaded = session.load(watched(options.sources, watches));
     session.declareSettings(declare);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;

@@ -1,14 +1,36 @@
 #include "host/SessionStore.hpp"
 
+#include <utility>
+
 #include "framework/common/TextConversion.hpp"
+#include "host/console/InterruptibleWait.hpp"
 #include "host/console/Interruption.hpp"
 #include "host/sources/PropertyFile.hpp"
 
 namespace velkor::host {
 
-Future<configuration::ConfigurationValue> SessionStore::get(const std::string& key) {
+using configuration::ConfigurationValue;
+
+void SessionStore::keepStateIn(std::shared_ptr<StateLayer> layer) {
+    removeSource("override").get();
+    addSource("state", "", 0, false, layer->source()).get();
+    stateLayer = std::move(layer);
+}
+
+Future<ConfigurationValue> SessionStore::get(const std::string& key) {
     if (Interruption::isRequested()) throw Interrupted();
     return ConfigurationImpl::get(key);
+}
+
+Future<ConfigurationValue> SessionStore::set(const std::string& key, ConfigurationValue value) {
+    noteWrite();
+    return ConfigurationImpl::set(key, std::move(value));
+}
+
+Future<ConfigurationValue> SessionStore::set(const std::string& key, ConfigurationValue value,
+                                             const std::string& sourceName) {
+    noteWrite();
+    return ConfigurationImpl::set(key, std::move(value), sourceName);
 }
 
 Future<bool> SessionStore::addPropertyFileSource(const std::string& name, const std::string& group,
@@ -16,6 +38,11 @@ Future<bool> SessionStore::addPropertyFileSource(const std::string& name, const 
                                                  const std::u16string& path) {
     const std::string narrowPath = common::TextConversion("UTF-8").fromUtf16(path);
     return addSource(name, group, order, readOnly, loadPropertyFile(narrowPath, limits));
+}
+
+void SessionStore::acknowledge() {
+    if (!written.exchange(false) || stateLayer == nullptr) return;
+    resultUnlessInterrupted(stateLayer->committed());
 }
 
 }  // namespace velkor::host

@@ -8,9 +8,8 @@
 #include <utility>
 #include <vector>
 
+#include "configuration/admin/TypedText.hpp"
 #include "configuration/admin/ValueFormat.hpp"
-
-#include <locale.h>
 
 namespace velkor::configuration {
 
@@ -18,50 +17,26 @@ namespace {
 
 using Arguments = std::vector<std::string>;
 
-// The calling thread reads numbers as the C locale writes them while this lives, whatever the host
-// has set.
-class ScopedCLocale {
-public:
-    ScopedCLocale() : previous(uselocale(cLocale())) {}
-    ~ScopedCLocale() { uselocale(previous); }
-
-    ScopedCLocale(const ScopedCLocale&) = delete;
-    ScopedCLocale& operator=(const ScopedCLocale&) = delete;
-
-private:
-    static locale_t cLocale() {
-        struct Owner {
-            locale_t locale = newlocale(LC_ALL_MASK, "C", nullptr);
-            ~Owner() { freelocale(locale); }
-        };
-        static const Owner owner;
-        return owner.locale;
-    }
-
-    locale_t previous;
-};
-
 std::ostringstream textStream() {
     std::ostringstream out;
     out.imbue(std::locale::classic());
     return out;
 }
 
-ConfigurationValue parseNumber(const std::string& text) {
-    const ScopedCLocale cLocale;
-    if (text.find('.') != std::string::npos) return std::stod(text);
-    return std::stoi(text);
+bool isNumber(const ConfigurationValue& value) {
+    return boost::get<int>(&value) != nullptr || boost::get<double>(&value) != nullptr;
 }
 
 std::string setValue(Configuration& configuration, const Arguments& arguments) {
     const std::string& key = arguments.at(0);
     const std::string& text = arguments.at(1);
-    if (text == "true" || text == "false") {
-        configuration.set(key, text == "true");
+    ConfigurationValue value = typedText(text);
+    if (!isNumber(value)) {
+        configuration.set(key, std::move(value));
         return "";
     }
     try {
-        configuration.set(key, parseNumber(text));
+        configuration.set(key, std::move(value));
     } catch (...) {
         configuration.set(key, text);
     }

@@ -11,9 +11,8 @@ namespace velkor::configuration {
 
 /// Keeps the operator commands of a store registered while it lives.
 ///
-/// - "velkor.configuration.set" KEY TEXT: stores "true" and "false" as bool, a text with a "." as
-///   double and any other as int where it begins with such a number, else as narrow text. Answers
-///   nothing; a refused write is not reported.
+/// - "velkor.configuration.set" KEY TEXT: stores what `typedText` makes of the text; the text itself
+///   where a number is refused. Answers nothing; a refused write is not reported.
 /// - "velkor.configuration.get" KEY: the value, or "No configuration option with key: " and KEY.
 /// - "velkor.configuration.list": a line "KEY = VALUE" for each key, in byte order.
 ///

@@ -31,8 +31,11 @@ std::string failureText(const Command& command) {
 
 }  // namespace
 
-Console::Console(std::shared_ptr<const CommandRegistry> commandRegistry, Output& consoleOutput)
-    : registry(std::move(commandRegistry)), output(consoleOutput) {}
+Console::Console(std::shared_ptr<const CommandRegistry> commandRegistry, Output& consoleOutput,
+                 std::function<void()> acknowledgeCommand)
+    : registry(std::move(commandRegistry)),
+      output(consoleOutput),
+      acknowledge(std::move(acknowledgeCommand)) {}
 
 bool Console::run(LineSource& lines) {
     quitting = false;
@@ -66,6 +69,7 @@ void Console::execute(const std::string& line) {
     std::string answer;
     try {
         answer = command->run(std::move(arguments));
+        acknowledge();
     } catch (const Interrupted&) {
         return;
     } catch (...) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -18,7 +19,11 @@ namespace velkor::host {
 class Console {
 public:
     /// Runs the commands of `registry` and writes to `output`, which must live as long.
-    Console(std::shared_ptr<const CommandRegistry> registry, Output& output);
+    /// `acknowledge` is called after each command and before its answer is shown; what it throws
+    /// counts as thrown by the command.
+    Console(
+        std::shared_ptr<const CommandRegistry> registry, Output& output,
+        std::function<void()> acknowledge = [] {});
 
     /// Carries out `lines` until there are no more, `quit` is called or nobody reads the answers.
     /// Gives whether every line could be carried out.
@@ -33,6 +38,7 @@ private:
 
     std::shared_ptr<const CommandRegistry> registry;
     Output& output;
+    const std::function<void()> acknowledge;
     bool quitting = false;
 };
 

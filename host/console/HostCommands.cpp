@@ -5,6 +5,7 @@
 #include <utility>
 
 #include "host/console/SendCommand.hpp"
+#include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Secrets.hpp"
@@ -22,10 +23,12 @@ struct Context {
 };
 
 std::string showSources(const Context& context, const Arguments&) {
-    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS"}};
+    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS", ""}};
     for (const auto& source : context.services.store->describeSources().get()) {
         rows.push_back({source.name, source.group.empty() ? "-" : source.group,
-                        std::to_string(source.order), source.readOnly ? "read-only" : "writable"});
+                        std::to_string(source.order), source.readOnly ? "read-only" : "writable",
+                        context.services.problemOf(source.name)});
+        if (!rows.back().back().empty()) rows.front().back() = "PROBLEM";
     }
     return formatTable(rows);
 }
@@ -51,6 +54,12 @@ std::string watch(const Context& context, const Arguments& arguments) {
 std::string unwatch(const Context& context, const Arguments& arguments) {
     if (context.services.watches->remove(arguments.at(0))) return "";
     throw CommandError("Not watched: " + arguments.at(0));
+}
+
+/// A command on nothing but the session's store.
+template <std::string (*run)(SessionStore&, const Arguments&)>
+std::string onStore(const Context& context, const Arguments& arguments) {
+    return run(*context.services.store, arguments);
 }
 
 std::string helpFor(const Command& command) {
@@ -87,6 +96,10 @@ std::vector<std::string> suggestCommands(const Context& context) {
     return registry ? registry->names() : std::vector<std::string>();
 }
 
+std::vector<std::string> suggestNothing(const Context&) {
+    return {};
+}
+
 std::vector<std::string> suggestRequests(const Context&) {
     return requestTypes();
 }
@@ -107,6 +120,14 @@ constexpr HostCommand commands[] = {
     {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
     {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
     {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
+    {"put", "KEY VALUE [--for TIME]", "Set a value, with --for until the time is over.",
+     onStore<putValue>, 2, 4},
+    {"unset", "KEY", "Take back what was set for a key, and show what is effective then.",
+     onStore<unsetKey>, 1, 1},
+    {"history", "[KEY] [--limit N]", "Show what was set when and by whom, the newest first.",
+     onStore<showHistory>, 0, 3},
+    {"undo", "[N]", "Take back change N of the history, or the newest one.", onStore<undoChange>, 0,
+     1, false, suggestNothing},
     {"send", "TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2, true,
      suggestRequests},
     {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,

@@ -4,8 +4,8 @@
 #include <memory>
 #include <vector>
 
-#include "configuration/ConfigurationImpl.hpp"
 #include "framework/administration/CommandProvider.hpp"
+#include "host/SessionStore.hpp"
 #include "host/console/CommandRegistration.hpp"
 #include "host/console/Watches.hpp"
 #include "host/messages/MessageDispatcher.hpp"
@@ -14,18 +14,24 @@ namespace velkor::host {
 
 /// What the host's own commands work on. No member is empty.
 struct HostServices {
-    std::shared_ptr<configuration::ConfigurationImpl> store;
+    std::shared_ptr<SessionStore> store;
     std::shared_ptr<Watches> watches;
     std::shared_ptr<const MessageDispatcher> messages;
     std::function<void()> quit;  ///< Ends the session.
+    /// What is the matter with the source of that name; empty when nothing is.
+    std::function<std::string(const std::string& name)> problemOf = [](const auto&) {
+        return std::string();
+    };
 };
 
 /// Keeps the host's own commands registered while it lives:
 ///
-/// - sources: a table of all sources in order of precedence.
+/// - sources: a table of all sources in order of precedence, with what is the matter with them.
 /// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
 ///   is the effective one.
 /// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.
+/// - put KEY VALUE [--for TIME], unset KEY, history [KEY] [--limit N], undo [N]: see
+///   StateCommands.hpp.
 /// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest
 ///   of the line as it was typed.
 /// - help [COMMAND], quit.

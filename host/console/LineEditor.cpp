@@ -1,6 +1,8 @@
 #include "host/console/LineEditor.hpp"
 
 #include <histedit.h>
+#include <poll.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cstddef>
@@ -37,8 +39,9 @@ const char* prompt(EditLine*) {
 /// The editing library's objects, and the functions that it calls back.
 class LineEditor::Session {
 public:
-    explicit Session(Complete completeLine)
+    Session(Complete completeLine, Announcements& shownAnnouncements)
         : complete(std::move(completeLine)),
+          announcements(shownAnnouncements),
           lines(history_init()),
           editor(el_init("velkor-config", stdin, stdout, stderr)) {
         if (!lines || !editor) {
@@ -52,6 +55,7 @@ public:
         el_set(editor.get(), EL_EDITOR, "emacs");
         el_set(editor.get(), EL_SIGNAL, 1);
         el_set(editor.get(), EL_HIST, history, lines.get());
+        el_wset(editor.get(), EL_GETCFN, onCharacter);
         bindKeys();
     }
 
@@ -60,6 +64,7 @@ public:
         // of the terminal in the middle of a line: it learns the size between two lines.
         const SignalPause pause{SIGINT, SIGWINCH};
         el_resize(editor.get());
+        const Editing editing(announcements);
         do {
             cancelled = false;
             int length = 0;
@@ -78,6 +83,21 @@ public:
     }
 
 private:
+    /// A line is being edited while it lives.
+    class Editing {
+    public:
+        explicit Editing(Announcements& kept) : announcements(kept) {
+            announcements.beginEditing();
+        }
+        ~Editing() { announcements.endEditing(); }
+
+        Editing(const Editing&) = delete;
+        Editing& operator=(const Editing&) = delete;
+
+    private:
+        Announcements& announcements;
+    };
+
     void bindKeys() {
         // The narrow form of this call copies the texts and never frees them.
         el_wset(editor.get(), EL_ADDFN, L"velkor-complete", L"Complete the word", onComplete);
@@ -100,6 +120,31 @@ private:
         void* session = nullptr;
         el_get(editor, EL_CLIENTDATA, &session);
         return *static_cast<Session*>(session);
+    }
+
+    // Reads one character, and shows what is announced before it comes.
+    static int onCharacter(EditLine* editor, wchar_t* character) {
+        Session& session = of(editor);
+        while (!session.keyIsNext()) session.showAnnouncements();
+        // The library's own way to read knows its signals and all characters.
+        el_wset(editor, EL_GETCFN, static_cast<el_rfunc_t>(EL_BUILTIN_GETCFN));
+        const int count = el_wgetc(editor, character);
+        el_wset(editor, EL_GETCFN, onCharacter);
+        return count;
+    }
+
+    // Waits for the next key or announcement; gives whether it is a key, or the end of them.
+    bool keyIsNext() const {
+        pollfd awaited[] = {{STDIN_FILENO, POLLIN, 0}, {announcements.descriptor(), POLLIN, 0}};
+        while (::poll(awaited, 2, -1) < 0) continue;
+        return awaited[0].revents != 0;
+    }
+
+    void showAnnouncements() {
+        std::fputs("\n", stdout);
+        std::fflush(stdout);
+        announcements.show();
+        el_set(editor.get(), EL_REFRESH);
     }
 
     static unsigned char onCancel(EditLine* editor, int) {
@@ -139,14 +184,15 @@ private:
     }
 
     const Complete complete;
+    Announcements& announcements;
     const std::unique_ptr<History, HistoryDeleter> lines;
     const std::unique_ptr<EditLine, EditLineDeleter> editor;
     bool cancelled = false;
     const Interruption interruption;
 };
 
-LineEditor::LineEditor(Complete complete)
-    : session(std::make_unique<Session>(std::move(complete))) {}
+LineEditor::LineEditor(Complete complete, Announcements& announcements)
+    : session(std::make_unique<Session>(std::move(complete), announcements)) {}
 
 LineEditor::~LineEditor() = default;
 

@@ -4,6 +4,7 @@
 #include <memory>
 #include <string>
 
+#include "host/console/Announcements.hpp"
 #include "host/console/Completer.hpp"
 #include "host/console/LineSource.hpp"
 
@@ -13,7 +14,7 @@ namespace velkor::host {
 /// completion by the Tab key. Ctrl-C drops the line, Ctrl-D on an empty line ends the input. While
 /// no line is being read, Ctrl-C is an `Interruption`. The terminal is in its ordinary mode again
 /// whenever no line is being read, and when a signal ends the program meanwhile. Reads the user's
-/// own key bindings from ~/.editrc.
+/// own key bindings from ~/.editrc. What is announced while a line is edited is shown above it.
 ///
 /// There may be one at a time. Needs the character type locale to be one of UTF-8.
 class LineEditor final : public LineSource {
@@ -21,9 +22,9 @@ public:
     /// What may follow the given text before the cursor.
     using Complete = std::function<Completion(const std::string&)>;
 
-    /// Takes over the terminal. Throws `std::runtime_error` "The terminal can't be used for line
-    /// editing.".
-    explicit LineEditor(Complete complete);
+    /// Takes over the terminal. `announcements` must live as long. Throws `std::runtime_error` "The
+    /// terminal can't be used for line editing.".
+    LineEditor(Complete complete, Announcements& announcements);
     ~LineEditor() override;
 
     LineEditor(const LineEditor&) = delete;

@@ -4,8 +4,11 @@
 #include <filesystem>
 #include <iterator>
 #include <stdexcept>
+#include <system_error>
 
 #include "host/sources/PropertyFile.hpp"
+#include "layers/environment/EnvironmentSource.hpp"
+#include "layers/files/ReloadingFileSource.hpp"
 
 namespace velkor::host {
 
@@ -15,13 +18,37 @@ std::string stemOfPath(const SourceRequest& request) {
     return std::filesystem::path(request.location).stem().string();
 }
 
+// Whether a file is there, or may still come, that can be read again: a pipe can't.
+bool canBeWatched(const std::string& path) {
+    std::error_code unknown;
+    const auto kind = std::filesystem::status(path, unknown).type();
+    return kind == std::filesystem::file_type::regular ||
+           kind == std::filesystem::file_type::not_found;
+}
+
 std::shared_ptr<configuration::ConfigurationSource> makeFile(const SourceRequest& request,
                                                              const SourceLimits& limits) {
-    return loadPropertyFile(request.location, limits);
+    if (!request.watched || !canBeWatched(request.location)) {
+        return loadPropertyFile(request.location, limits);
+    }
+    layers::ReloadingFileOptions options;
+    options.mustBeReadable = false;
+    options.mostBytes = limits.fileBytes;
+    return std::make_shared<layers::ReloadingFileSource>(request.location, options);
+}
+
+std::string environmentName(const SourceRequest&) {
+    return "environment";
+}
+
+std::shared_ptr<configuration::ConfigurationSource> makeEnvironment(const SourceRequest& request,
+                                                                    const SourceLimits&) {
+    return std::make_shared<layers::EnvironmentSource>(layers::EnvironmentNames(request.location));
 }
 
 constexpr SourceKind kinds[] = {
     {"file", stemOfPath, makeFile},
+    {"environment", environmentName, makeEnvironment},
 };
 
 }  // namespace

@@ -13,7 +13,9 @@ namespace {
 /// Gives each source without a name one that no other source has.
 class SourceNames {
 public:
-    explicit SourceNames(const std::vector<SourceRequest>& requests) {
+    SourceNames(configuration::ConfigurationImpl& store,
+                const std::vector<SourceRequest>& requests) {
+        for (const auto& source : store.describeSources().get()) taken.insert(source.name);
         for (const auto& request : requests) {
             if (request.name) taken.insert(*request.name);
         }
@@ -30,34 +32,35 @@ public:
     }
 
 private:
-    std::set<std::string> taken{"override", "default"};  // the store's own
+    std::set<std::string> taken;
 };
 
 void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
-                const SourceRequest& request, const SourceLimits& limits) {
-    store
-        .addSource(name, request.group, request.order, !request.writable,
-                   sourceKind(request.kind).make(request, limits))
-        .get();
+                const SourceRequest& request, const SourceLimits& limits, LoadedSources& loaded) {
+    const auto source = sourceKind(request.kind).make(request, limits);
+    store.addSource(name, request.group, request.order, !request.writable, source).get();
+    const auto file = std::dynamic_pointer_cast<const layers::ReloadingFileSource>(source);
+    if (file == nullptr) return;
+    loaded.watchedFiles.emplace(name, file);
+    if (const auto problem = file->status().problem) loaded.failures.push_back(problem->text);
 }
 
 }  // namespace
 
-std::vector<std::string> loadSources(configuration::ConfigurationImpl& store,
-                                     const std::vector<SourceRequest>& requests,
-                                     const SourceLimits& limits) {
-    std::vector<std::string> failures;
-    SourceNames names(requests);
+LoadedSources loadSources(configuration::ConfigurationImpl& store,
+                          const std::vector<SourceRequest>& requests, const SourceLimits& limits) {
+    LoadedSources loaded;
+    SourceNames names(store, requests);
     for (const auto& request : requests) {
         try {
-            loadSource(store, names.nameOf(request), request, limits);
+            loadSource(store, names.nameOf(request), request, limits, loaded);
         } catch (const std::bad_alloc&) {
-            failures.push_back("Out of memory while loading: " + request.location);
+            loaded.failures.push_back("Out of memory while loading: " + request.location);
         } catch (const std::exception& error) {
-            failures.emplace_back(error.what());
+            loaded.failures.emplace_back(error.what());
         }
     }
-    return failures;
+    return loaded;
 }
 
 }  // namespace velkor::host

@@ -12,12 +12,20 @@ struct SourceRequest {
     /// so that files override those before them.
     static constexpr int defaultOrder = 1000;
 
+    /// In front of the files, and behind what the command line sets by itself.
+    static constexpr int environmentOrder = 200;
+
+    /// The order of the values that the command line sets by itself.
+    static constexpr int commandLineOrder = 100;
+
     std::optional<std::string> name{};  ///< Nothing: one is made from the location.
-    std::string location;               ///< Where its values are: for a file its path.
+    /// Where its values are: for a file its path, for the environment the beginning of the names.
+    std::string location;
     std::string group{};
     int order = defaultOrder;
     bool writable = false;
     std::string kind = "file";  ///< See `sourceKind`.
+    bool watched = false;       ///< It is read again when it changes, if it can be.
 };
 
 /// What the making of a source may cost.

@@ -98,6 +98,39 @@ TEST(Options, AFileSizeMayHaveAUnit) {
     EXPECT_EQ(parseFileSize("17179869183GiB"), 18'446'744'072'635'809'792U);
 }
 
+TEST(Options, TheEnvironmentIsASourceInFrontOfTheFiles) {
+    const Options options = parseOptions({"--env", "APP_", "a"});
+    EXPECT_EQ(pathsOf(options), (Words{"a", "APP_"}));
+    EXPECT_EQ(options.sources[1].kind, "environment");
+    EXPECT_LT(options.sources[1].order, options.sources[0].order);
+    EXPECT_FALSE(options.sources[1].writable);
+}
+
+TEST(Options, AnAssignmentIsAKeyAndWhatFollowsTheFirstEqualsSign) {
+    const auto assignments =
+        parseOptions({"--set", "a.b=c=d", "--set=[a]=[b,c]", "--set", "e="}).assignments;
+    ASSERT_EQ(assignments.size(), 3U);
+    EXPECT_EQ(assignments[0].key, "a.b");
+    EXPECT_EQ(assignments[0].text, "c=d");
+    EXPECT_EQ(assignments[1].key, "[a]");
+    EXPECT_EQ(assignments[1].text, "[b,c]");
+    EXPECT_EQ(assignments[2].text, "");
+}
+
+TEST(Options, TheLastPlaceForTheStateCounts) {
+    EXPECT_EQ(parseOptions({"a"}).statePath, std::nullopt);
+    EXPECT_EQ(parseOptions({"--state", "a.db"}).statePath, "a.db");
+    EXPECT_EQ(parseOptions({"--state=a.db", "--state=b.db"}).statePath, "b.db");
+}
+
+TEST(Options, TheLastWordOnWatchedFilesCounts) {
+    EXPECT_EQ(parseOptions({"a"}).watchesFiles, std::nullopt);
+    EXPECT_EQ(parseOptions({"--watch-files"}).watchesFiles, true);
+    EXPECT_EQ(parseOptions({"--no-watch-files"}).watchesFiles, false);
+    EXPECT_EQ(parseOptions({"--no-watch-files", "--watch-files"}).watchesFiles, true);
+    EXPECT_EQ(parseOptions({"--watch-files", "--no-watch-files"}).watchesFiles, false);
+}
+
 TEST(Options, LogNamesAChannelAndItsSeverities) {
     const auto logs =
         parseOptions({"--log", "velkor::configuration=debug,trace", "--log=b=24"}).logs;
@@ -112,6 +145,7 @@ TEST(Options, HelpDescribesEveryOption) {
     const std::string help = parseOptions({"--help"}).information;
     for (const char* part :
          {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "--max-file-size SIZE",
+          "--env PREFIX", "--set KEY=VALUE", "--state FILE", "--watch-files", "--no-watch-files",
           "-c LINE", "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
         EXPECT_NE(help.find(part), std::string::npos) << part;
     }
@@ -154,6 +188,8 @@ INSTANTIATE_TEST_SUITE_P(
         UsageCase{"EmptyPath", {"--source", "n="}, "--source n=: NAME=PATH is needed"},
         UsageCase{"EmptyName", {"--source", "=p"}, "--source =p: NAME=PATH is needed"},
         UsageCase{"NothingAtAll", {"--source", ""}, "--source : NAME=PATH is needed"},
+        UsageCase{"NoKey", {"--set", "=v"}, "--set =v: KEY=VALUE is needed"},
+        UsageCase{"NoValue", {"--set", "k"}, "--set k: KEY=VALUE is needed"},
         badSize("SizeNegative", "-1"), badSize("SizeBlank", " 1"),
         badSize("SizeWithoutNumber", "KiB"), badSize("SizeWithUnknownUnit", "1KB"),
         badSize("SizeWithTextBehind", "1KiBs"), badSize("SizeFractional", "0.5GiB"),

@@ -2,16 +2,19 @@
 
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <csignal>
+#include <exception>
 #include <memory>
 #include <stdexcept>
 #include <string>
-#include <vector>
+#include <thread>
 
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "host/console/Interruption.hpp"
 #include "host/console/ValueText.hpp"
+#include "tests/host/state/FakeState.hpp"
 #include "tests/support/TemporaryFile.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -47,6 +50,74 @@ TEST_F(SessionStoreTest, EndsAListWhenItIsInterrupted) {
     EXPECT_THROW(registry->find("list")->run({}), Interrupted);
     Interruption::take();
     EXPECT_EQ(registry->find("list")->run({}), "a = 1\n");
+}
+
+TEST_F(SessionStoreTest, LetsALayerThatLastsTakeThePlaceOfOverride) {
+    const auto state = std::make_shared<FakeState>();
+    store->set("a", 1);
+    store->keepStateIn(state);
+    const auto sources = store->describeSources().get();
+    ASSERT_EQ(sources.size(), 2U);
+    EXPECT_EQ(sources[0].name, "state");
+    EXPECT_EQ(sources[0].order, 0);
+    EXPECT_FALSE(sources[0].readOnly);
+    EXPECT_EQ(sources[1].name, "default");
+    store->set("a", 2);
+    EXPECT_TRUE(state->values->has("a"));
+    EXPECT_EQ(store->state(), state.get());
+}
+
+TEST_F(SessionStoreTest, AcknowledgesAtOnceWhatDoesNotLast) {
+    EXPECT_EQ(store->state(), nullptr);
+    store->set("a", 1);
+    store->acknowledge();
+}
+
+class DurableSessionTest : public SessionStoreTest {
+protected:
+    DurableSessionTest() { store->keepStateIn(state); }
+
+    std::shared_ptr<FakeState> state = std::make_shared<FakeState>();
+};
+
+TEST_F(DurableSessionTest, AcknowledgesWhenEverythingIsOnDisk) {
+    Promise<bool> onDisk;
+    std::atomic<bool> isThere{false};
+    std::thread disk;
+    state->commit = [&] {
+        disk = std::thread([&] {
+            isThere = true;
+            onDisk.setValue(true);
+        });
+        return onDisk.getFuture();
+    };
+    store->set("a", 1);
+    store->acknowledge();
+    EXPECT_TRUE(isThere);
+    disk.join();
+}
+
+TEST_F(DurableSessionTest, AcknowledgesEveryWriteOnce) {
+    store->acknowledge();
+    EXPECT_EQ(state->calls.size(), 0U);
+    store->set("a", 1);
+    store->set("b", "text", "default");
+    store->acknowledge();
+    EXPECT_EQ(state->calls.size(), 1U);
+    store->get("a").get();
+    store->acknowledge();
+    EXPECT_EQ(state->calls.size(), 1U);
+    store->set("a", 1, "state");
+    store->acknowledge();
+    EXPECT_EQ(state->calls.size(), 2U);
+}
+
+TEST_F(DurableSessionTest, TellsWhyAWriteDoesNotLastAndIsReadyForTheNext) {
+    const auto failure = std::make_exception_ptr(std::runtime_error("a.db: no space"));
+    state->commit = [&] { return makeFailedFuture<bool>(failure); };
+    store->set("a", 1);
+    EXPECT_EQ(thrownText<std::runtime_error>([this] { store->acknowledge(); }), "a.db: no space");
+    store->acknowledge();
 }
 
 }  // namespace

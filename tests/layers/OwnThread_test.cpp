@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <atomic>
+#include <csignal>
 #include <memory>
 
 #include "tests/support/BoundedWait.hpp"
@@ -31,6 +32,21 @@ TEST(OwnThread, GoesOnAloneWhenItEndsItsOwner) {
     owned->countDown();
 
     EXPECT_TRUE(finished->wait());
+}
+
+bool blocks(int signal) {
+    sigset_t blocked;
+    ::pthread_sigmask(SIG_SETMASK, nullptr, &blocked);
+    return ::sigismember(&blocked, signal) == 1;
+}
+
+TEST(OwnThread, LeavesTheSignalsOfTheProcessToOthers) {
+    bool blocksThere = false;
+    {
+        const OwnThread thread([&] { blocksThere = blocks(SIGINT) && blocks(SIGWINCH); });
+    }
+    EXPECT_TRUE(blocksThere);
+    EXPECT_FALSE(blocks(SIGINT));
 }
 
 }  // namespace

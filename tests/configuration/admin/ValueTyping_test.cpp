@@ -6,6 +6,7 @@
 #include <ostream>
 #include <string>
 
+#include "configuration/admin/TypedText.hpp"
 #include "tests/configuration/admin/CommandTesting.hpp"
 #include "tests/support/ScopedCommaCLocale.hpp"
 #include "tests/support/ScopedGlobalLocale.hpp"
@@ -31,6 +32,10 @@ class ValueTyping : public testing::CommandTest,
 
 TEST_P(ValueTyping, StoresThis) {
     EXPECT_EQ(typed(GetParam().text), GetParam().stored);
+}
+
+TEST_P(ValueTyping, GivesTheSameToOtherCommands) {
+    EXPECT_EQ(textOf(typedText(GetParam().text)), GetParam().stored);
 }
 
 TEST_P(ValueTyping, StoresTheSameUnderAHostsLocales) {

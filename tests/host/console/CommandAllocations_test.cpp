@@ -45,8 +45,7 @@ protected:
         return {store, std::make_shared<Watches>(store, show), nullptr, [] {}};
     }
 
-    std::shared_ptr<configuration::ConfigurationImpl> store =
-        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
 };
 

@@ -53,6 +53,30 @@ protected:
     Console console{registry, output};
 };
 
+TEST_F(ConsoleTest, ShowsAnAnswerOnceItIsAcknowledged) {
+    std::string shownBefore;
+    Console acknowledging(registry, output, [&] { shownBefore += answers.str() + '|'; });
+    GivenLines lines({"echo a", "echo b"});
+    EXPECT_TRUE(acknowledging.run(lines));
+    EXPECT_EQ(shownBefore, "|<a>\n|");
+    EXPECT_EQ(answers.str(), "<a>\n<b>\n");
+}
+
+TEST_F(ConsoleTest, ShowsWhyACommandIsNotAcknowledged) {
+    Console refusing(registry, output, [] { throw std::runtime_error("no luck"); });
+    GivenLines lines({"echo a"});
+    EXPECT_FALSE(refusing.run(lines));
+    EXPECT_EQ(answers.str(), "");
+    EXPECT_EQ(messages.str(), "velkor-config: host.echo: no luck\n");
+}
+
+TEST_F(ConsoleTest, AWaitForAnAcknowledgementThatIsInterruptedIsNoFailure) {
+    Console interrupted(registry, output, [] { throw Interrupted(); });
+    GivenLines lines({"echo a"});
+    EXPECT_TRUE(interrupted.run(lines));
+    EXPECT_EQ(answers.str() + messages.str(), "");
+}
+
 TEST_F(ConsoleTest, ShowsTheAnswersInTheOrderOfTheLines) {
     EXPECT_TRUE(run({"echo a 'b c'", "host.echo d"}));
     EXPECT_EQ(answers.str(), "<a><b c>\n<d>\n");

@@ -18,7 +18,8 @@ namespace {
 using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
-const Words hostNames{"sources", "explain", "watch", "unwatch", "send", "help", "quit"};
+const Words hostNames{"sources", "explain", "watch", "unwatch", "put", "unset",
+                      "history", "undo",    "send",  "help",    "quit"};
 
 class HostCommandsTest : public ::testing::Test {
 protected:
@@ -26,19 +27,19 @@ protected:
         const auto show = [this](const auto& key, const auto& value) {
             shown.push_back(optionText(key, value));
         };
-        return {store, std::make_shared<Watches>(store, show), nullptr,
-                [this] { quitting = true; }};
+        return {store, std::make_shared<Watches>(store, show), nullptr, [this] { quitting = true; },
+                [this](const auto& name) { return name == troubled ? "not now" : ""; }};
     }
 
     std::string run(const std::string& name, Words arguments = {}) {
         return registry->find(name)->run(std::move(arguments));
     }
 
-    std::shared_ptr<configuration::ConfigurationImpl> store =
-        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     Words shown;
     bool quitting = false;
+    std::string troubled;
     HostCommands commands{services(), registry};
 };
 
@@ -94,6 +95,14 @@ TEST_F(HostCommandsTest, SourcesListsThemInOrderOfPrecedence) {
               "default   -        2147483647  writable\n");
 }
 
+TEST_F(HostCommandsTest, SourcesShowsWhatIsTheMatterWithOne) {
+    troubled = "override";
+    EXPECT_EQ(run("sources"),
+              "NAME      GROUP  ORDER       ACCESS    PROBLEM\n"
+              "override  -      0           writable  not now\n"
+              "default   -      2147483647  writable\n");
+}
+
 TEST_F(HostCommandsTest, ExplainShowsTheEffectiveValueFirst) {
     store->addInMemorySource("site", "server", 5, true, {{"port", std::string("80")}});
     store->set("server.port", 1);
@@ -139,6 +148,20 @@ TEST_F(HostCommandsTest, WatchRefusesAKeyThatIsWatched) {
 
 TEST_F(HostCommandsTest, UnwatchRefusesAKeyThatIsNotWatched) {
     EXPECT_EQ(thrownText<CommandError>([&] { run("unwatch", {"a"}); }), "Not watched: a");
+}
+
+TEST_F(HostCommandsTest, PutAndUnsetWorkOnTheStore) {
+    EXPECT_EQ(run("put", {"a", "1"}), "");
+    EXPECT_EQ(run("unset", {"a"}), "No configuration option with key: a");
+}
+
+TEST_F(HostCommandsTest, HistoryAndUndoNeedALayerThatLasts) {
+    EXPECT_THROW(run("history", {"a", "--limit", "5"}), CommandError);
+    EXPECT_THROW(run("undo"), CommandError);
+}
+
+TEST_F(HostCommandsTest, UndoSuggestsNoKeys) {
+    EXPECT_EQ(registry->find("undo")->suggestions()(), Words{});
 }
 
 TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {

@@ -23,8 +23,7 @@ class SendCommandTest : public ::testing::Test {
 protected:
     std::string send(Words arguments) { return registry->find("send")->run(std::move(arguments)); }
 
-    std::shared_ptr<configuration::ConfigurationImpl> store =
-        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
     MessageService service{store};
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     HostCommands commands{{store, std::make_shared<Watches>(store, [](const auto&, const auto&) {}),

@@ -28,7 +28,7 @@ TEST(LoadAllocations, OneThatFailsIsReportedWithTheLocation) {
         Words texts;
         try {
             const AllocationFailure failure(successes);
-            texts = loadSources(*store, requests, {});
+            texts = loadSources(*store, requests, {}).failures;
             hasFailed = failure.hasHappened();
         } catch (const std::bad_alloc&) {
             continue;  // before the first request

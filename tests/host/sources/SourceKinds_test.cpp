@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <optional>
 #include <stdexcept>
 #include <string>
@@ -35,6 +36,17 @@ TEST(SourceKinds, FileKeepsTheLimit) {
 
 TEST(SourceKinds, FileIsCalledLikeItselfWithoutFolderAndLastExtension) {
     EXPECT_EQ(sourceKind("file").usualName(requestFor("/a/b.c.properties")), "b.c");
+}
+
+TEST(SourceKinds, EnvironmentMakesASourceOfTheVariablesWithAPrefix) {
+    ::setenv("KINDS_TEST_A__B", "1", 1);
+    const auto source = sourceKind("environment").make(requestFor("KINDS_TEST_"), {});
+    ::unsetenv("KINDS_TEST_A__B");
+    EXPECT_TRUE(source->has("a.b"));
+}
+
+TEST(SourceKinds, EnvironmentIsCalledSo) {
+    EXPECT_EQ(sourceKind("environment").usualName(requestFor("A_")), "environment");
 }
 
 TEST(SourceKinds, OthersAreRefused) {

@@ -28,7 +28,7 @@ protected:
     }
 
     Words load(const std::vector<SourceRequest>& requests, const SourceLimits& limits = {}) {
-        return loadSources(*store, requests, limits);
+        return loadSources(*store, requests, limits).failures;
     }
 
     Words sourceNames() {
@@ -68,6 +68,12 @@ TEST_F(SourceLoaderTest, NumbersNamesThatAreTaken) {
     load({file(base), file(other), file(base), file(reserved)});
     EXPECT_EQ(sourceNames(),
               (Words{"override", "default-2", "base-3", "base-2", "base", "default"}));
+}
+
+TEST_F(SourceLoaderTest, NumbersNamesThatTheStoreHas) {
+    store->addInMemorySource("base", "", 5, true, {});
+    EXPECT_EQ(load({file(base)}), Words{});
+    EXPECT_EQ(sourceNames(), (Words{"override", "base", "base-2", "default"}));
 }
 
 TEST_F(SourceLoaderTest, LeavesGivenNamesToTheirSources) {

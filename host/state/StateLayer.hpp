@@ -1,0 +1,58 @@
+#pragma once
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "configuration/ConfigurationValue.hpp"
+#include "configuration/sources/ConfigurationSource.hpp"
+#include "framework/Future.hpp"
+
+namespace velkor::host {
+
+/// One change of the layer that lasts, as its journal has it.
+struct StateChange {
+    std::int64_t number = 0;
+    std::chrono::system_clock::time_point when{};
+    std::string author{};
+    std::string action{};  ///< set, unset, undo, expired, or other.
+    std::string key{};
+    std::optional<configuration::ConfigurationValue> before{};
+    std::optional<configuration::ConfigurationValue> after{};
+};
+
+/// The layer of a session that outlasts it. Thread-safe. What an operation throws names the place
+/// and the reason in one line.
+class StateLayer {
+public:
+    virtual ~StateLayer() = default;
+
+    /// The layer as a source; never null, always the same.
+    virtual std::shared_ptr<configuration::ConfigurationSource> source() const = 0;
+
+    /// Stores `value` for `lifetime`, which is positive; then the layer unsets `key` by itself.
+    virtual void setFor(const std::string& key, configuration::ConfigurationValue value,
+                        std::chrono::milliseconds lifetime) = 0;
+
+    /// Resolves when all that was written before is on disk; fails with the reason when it is not.
+    virtual Future<bool> committed() = 0;
+
+    /// The newest changes, at most `limit`, of a key, of all keys that a prefix with "." at its end
+    /// begins, or, where that is empty, of all keys. The newest comes first.
+    virtual std::vector<StateChange> history(const std::string& keyOrPrefix, std::size_t limit) = 0;
+
+    /// Takes back the change with that number, or the newest one, by a change of its own, which it
+    /// gives.
+    virtual StateChange undo(std::optional<std::int64_t> number) = 0;
+};
+
+/// The layer in the file at `path`, which is made when it is missing. Changes are by `author`.
+/// Throws `std::runtime_error` with one line that names the path and the reason; "--state needs
+/// velkor::sqlite, which this velkor-config was built without: " and the path when that is so.
+std::shared_ptr<StateLayer> openState(const std::string& path, const std::string& author);
+
+}  // namespace velkor::host
