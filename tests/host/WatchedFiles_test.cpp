@@ -42,6 +42,19 @@ TEST_F(WatchedFilesTest, LeaveALineThatIsBeingTypedAsItIs) {
     EXPECT_TRUE(terminal.shows("\r\n'2'\r\nvelkor> "));
 }
 
+TEST_F(WatchedFilesTest, TakeTheRowOfTheLineWhereTheTerminalCanClearIt) {
+    TerminalSession terminal({file.path().string()}, "xterm");
+    begin(terminal, "1");
+    terminal.type("get p");
+    EXPECT_TRUE(terminal.shows("get p"));
+    file.rewrite("port=2\n");
+    EXPECT_TRUE(terminal.shows("\r\x1b[Kport = '2'\r\nvelkor> get p"));
+    terminal.type(std::string(80, 'x'));
+    EXPECT_TRUE(terminal.shows("xxxx"));
+    file.rewrite("port=3\n");
+    EXPECT_TRUE(terminal.shows("\nport = '3'\r\nvelkor> get pxxxx"));
+}
+
 TEST_F(WatchedFilesTest, MayComeLater) {
     const TemporaryFile moved("port=1\n", "moved.properties");
     const auto later = file.parent() / "folder" / "file.properties";
