@@ -1,4 +1,6 @@
+#include <fcntl.h>
 #include <langinfo.h>
+#include <unistd.h>
 
 #include <clocale>
 #include <csignal>
@@ -19,9 +21,19 @@ void useUtf8() {
     if (!isUtf8) std::setlocale(LC_CTYPE, "C.UTF-8");
 }
 
+// What is opened later must not be taken for a standard stream that is closed. Using one fails as
+// it did: the place of each is held the wrong way round.
+void holdPlacesOfStandardStreams() {
+    for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
+        const bool isClosed = ::fcntl(stream, F_GETFD) < 0;
+        if (isClosed) ::open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY);
+    }
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
+    holdPlacesOfStandardStreams();
     // A reader of the answers that goes away ends the session, not the process.
     std::signal(SIGPIPE, SIG_IGN);
     std::ios::sync_with_stdio(false);

@@ -8,6 +8,7 @@
 #include <cstddef>
 #include <cstdio>
 #include <stdexcept>
+#include <string_view>
 #include <utility>
 #include <vector>
 
@@ -29,6 +30,9 @@ struct EditLineDeleter {
 struct HistoryDeleter {
     void operator()(History* lines) const { history_end(lines); }
 };
+
+// Clears the row from the cursor on, as nearly every terminal knows it.
+constexpr std::string_view clearing = "\x1b[K";
 
 const char* prompt(EditLine*) {
     return "velkor> ";
@@ -141,10 +145,25 @@ private:
     }
 
     void showAnnouncements() {
-        std::fputs("\n", stdout);
+        std::fputs(canBeCleared() ? ("\r" + std::string(clearing)).c_str() : "\n", stdout);
         std::fflush(stdout);
         announcements.show();
         el_set(editor.get(), EL_REFRESH);
+    }
+
+    // Whether nothing need stay on the screen of the line that is edited: it has one row, and the
+    // terminal the usual way to clear that.
+    bool canBeCleared() const {
+        const char* known = nullptr;
+        int columns = 0;
+        el_get(editor.get(), EL_GETTC, "ce", &known);
+        el_get(editor.get(), EL_GETTC, "co", &columns);
+        const LineInfo* line = el_line(editor.get());
+        const std::string_view typed(line->buffer,
+                                     static_cast<std::size_t>(line->lastchar - line->buffer));
+        const std::size_t width = characterCount(prompt(nullptr)) + characterCount(typed);
+        return known != nullptr && std::string_view(known) == clearing &&
+               width < static_cast<std::size_t>(columns);
     }
 
     static unsigned char onCancel(EditLine* editor, int) {

@@ -1,5 +1,6 @@
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <ostream>
 #include <string>
 #include <vector>
@@ -56,6 +57,39 @@ TEST(Program, ListsItsSources) {
 TEST(Program, HasNoCommandForSettingsWhereThereAreNone) {
     EXPECT_EQ(runProgram({"-c", "settings"}).err, "velkor-config: Unknown command: settings\n");
     EXPECT_EQ(runProgram({"-c", "help"}).out.find("settings"), std::string::npos);
+}
+
+TEST(Program, TakesValuesFromTheEnvironmentAndTheCommandLine) {
+    ::setenv("PROGRAM_TEST_SERVER__PORT", "1", 1);
+    ::setenv("PROGRAM_TEST_SERVER__BACKLOG", "2", 1);
+    const auto result =
+        runProgram({"--set", "server.port=3.5", serviceFile, "--env", "PROGRAM_TEST_", "-c",
+                    "sources", "-c", "explain server.port", "-c", "get server.backlog"});
+    ::unsetenv("PROGRAM_TEST_SERVER__PORT");
+    ::unsetenv("PROGRAM_TEST_SERVER__BACKLOG");
+    EXPECT_EQ(result.out,
+              "NAME          GROUP  ORDER       ACCESS\n"
+              "override      -      0           writable\n"
+              "command-line  -      100         read-only\n"
+              "environment   -      200         read-only\n"
+              "service       -      1000        read-only\n"
+              "default       -      2147483647  writable\n"
+              "effective   command-line  3.5\n"
+              "overridden  environment   '1'\n"
+              "overridden  service       '8080'\n"
+              "'2'\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, ReadsFilesOnceWhereThereIsNoTerminal) {
+    EXPECT_EQ(runProgram({"/no/file", "-c", "sources"}).out.find("file"), std::string::npos);
+    EXPECT_NE(runProgram({"--watch-files", "/no/file", "-c", "sources"})
+                  .out.find("Property file could not be opened: /no/file: No such file"),
+              std::string::npos);
+}
+
+TEST(Program, ReadsAPipeToItsEndThoughFilesAreWatched) {
+    EXPECT_EQ(runProgram({"--watch-files", "/dev/stdin", "-c", "get a"}, "a=1\n").out, "'1'\n");
 }
 
 TEST(Program, TakesMessagesAsJson) {

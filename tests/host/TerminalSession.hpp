@@ -23,13 +23,14 @@ namespace velkor::host {
 /// The program under test on a terminal of its own, with a person at the keys.
 class TerminalSession {
 public:
-    explicit TerminalSession(const std::vector<std::string>& arguments) {
+    /// A terminal without `abilities` shows what is written as it is.
+    explicit TerminalSession(const std::vector<std::string>& arguments,
+                             const char* abilities = "dumb") {
         child = ::forkpty(&keys, nullptr, nullptr, nullptr);
         if (child < 0) throw std::runtime_error("no pseudo terminal");
         if (child == 0) {
-            // A terminal without abilities shows what is written as it is; nobody's own key
-            // bindings have a say.
-            ::setenv("TERM", "dumb", 1);
+            // Nobody's own key bindings have a say.
+            ::setenv("TERM", abilities, 1);
             ::setenv("HOME", "/nonexistent", 1);
             ::setenv("LC_ALL", "C", 1);
             becomeProgram(arguments);
