@@ -37,7 +37,10 @@ ConfigurationImpl::~ConfigurationImpl() {
         const StoreLock::Level level(storeLock);
         closing = true;
         layers = sources.list();
-        for (const auto& entry : *layers) entry->source->setChangeListener({});
+        for (const auto& entry : *layers) {
+            entry->source->setChangeListener({});
+            if (entry->attached != nullptr) entry->attached->detach();
+        }
     }
     while (publishers->removeOldest() != nullptr) continue;
     while (changeStreams->removeOldest() != nullptr) continue;
@@ -133,8 +136,7 @@ Future<bool> ConfigurationImpl::addSource(const std::string& name, const std::st
     }
     const std::string prefix = detail::normalisedGroup(group);
     storeLock.retire(sources.list());
-    const auto entry =
-        sources.insert(ConfigurationSourceMap(name, prefix, order, readOnly, source));
+    const auto entry = insert(ConfigurationSourceMap(name, prefix, order, readOnly, source));
     version.fetch_add(1, std::memory_order_release);
     updateHasForeignCode();
     const auto keys = source->keys();
@@ -158,6 +160,7 @@ Future<bool> ConfigurationImpl::removeSource(const std::string& name) {
     const std::string prefix = entry->group;
     storeLock.retire(sources.list());
     sources.erase(*entry);
+    if (entry->attached != nullptr) entry->attached->detach();
     version.fetch_add(1, std::memory_order_release);
     updateHasForeignCode();
     tellStreams(operation.mutexLevel(), prefix, keys);
@@ -168,16 +171,6 @@ Future<bool> ConfigurationImpl::removeSource(const std::string& name) {
 
 std::shared_ptr<Configuration> ConfigurationImpl::getPtr() {
     return shared_from_this();
-}
-
-Future<std::vector<SourceDescription>> ConfigurationImpl::describeSources() {
-    const Operation operation(*this);
-    return makeReadyFuture(sources.describe());
-}
-
-Future<std::vector<Option>> ConfigurationImpl::explain(const std::string& key) {
-    const Operation operation(*this);
-    return makeReadyFuture(sources.holders(key));
 }
 
 bool ConfigurationImpl::doHas(std::unique_lock<std::recursive_mutex>& lock,

@@ -13,6 +13,7 @@
 #include "configuration/Configuration.hpp"
 #include "configuration/detail/SourceRegistry.hpp"
 #include "configuration/detail/StoreLock.hpp"
+#include "configuration/sources/AttachedSource.hpp"
 #include "configuration/sources/ConfigurationSource.hpp"
 #include "configuration/sources/ConfigurationSourceMap.hpp"
 #include "configuration/sources/SourceDescription.hpp"
@@ -77,13 +78,17 @@ public:
     /// null." before anything else happens. What the source throws, and lack of memory, leaves the
     /// call; the source may be registered by then, with or without a listener.
     ///
+    /// An `AttachedSource` is attached before it is registered; what it throws then leaves the
+    /// call, and nothing has changed.
+    ///
     /// The listener is installed last. As long as there is none, watchers are told of what is
     /// written to the source through the store by the store itself.
     ///
     /// Lifetime: the source gets a change listener that points to this store without owning it. The
     /// store takes it back when it is destroyed, not when the source is removed, so a source that
-    /// others still write after its removal must not outlive the store. A source that is registered
-    /// while the store is destroyed gets no listener.
+    /// others still write after its removal must not outlive the store, unless it is an
+    /// `AttachedSource`: that is told of its removal and of the end of the store. A source that is
+    /// registered while the store is destroyed gets no listener.
     Future<bool> addSource(const std::string& name, const std::string& group, int order,
                            bool readOnly, std::shared_ptr<ConfigurationSource> source);
 
@@ -154,11 +159,15 @@ protected:
 
 private:
     class Operation;
+    class Host;
 
     Future<ConfigurationValue> write(const detail::RegisteredSource& target, const std::string& key,
                                      ConfigurationValue&& value) VELKOR_REQUIRES(storeLock);
     Future<bool> forget(const Change& change, const detail::RegisteredSource* target)
         VELKOR_REQUIRES(storeLock);
+    std::shared_ptr<detail::RegisteredSource> insert(ConfigurationSourceMap entry)
+        VELKOR_REQUIRES(storeLock);
+    void changeTogether(const std::function<void()>& change);
     void reportChange(const std::string& group, const std::string& key);
     void onSourceChanged(const std::string& group, const std::string& key);
     void tellStreams(detail::StoreLock::Level& level, const std::string& group,
@@ -177,6 +186,8 @@ private:
     detail::SourceRegistry sources VELKOR_GUARDED_BY(storeLock);
     std::unique_ptr<detail::WatchList> publishers VELKOR_GUARDED_BY(storeLock);
     std::unique_ptr<detail::ChangeList> changeStreams VELKOR_GUARDED_BY(storeLock);
+    // What sources are attached to; made with the first of them.
+    std::unique_ptr<SourceHost> host VELKOR_GUARDED_BY(storeLock);
     // Where changes are collected instead of being told while several are made together.
     std::vector<std::string>* deferred VELKOR_GUARDED_BY(storeLock) = nullptr;
     // What writes to sources without a listener wait for.

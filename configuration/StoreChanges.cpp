@@ -1,7 +1,8 @@
-// How the store tells of changes, and what it offers beyond `Configuration`: several keys at once,
-// forgetting, and the stream of changes.
+// How the store tells of changes, and what it offers beyond `Configuration`: a look at the sources,
+// several keys at once, forgetting, the stream of changes, and sources that change by themselves.
 
 #include <algorithm>
+#include <exception>
 #include <iterator>
 #include <stdexcept>
 #include <string_view>
@@ -54,6 +55,16 @@ std::vector<std::string> unique(const std::vector<std::string>& keys) {
 }
 
 }  // namespace
+
+Future<std::vector<SourceDescription>> ConfigurationImpl::describeSources() {
+    const Operation operation(*this);
+    return makeReadyFuture(sources.describe());
+}
+
+Future<std::vector<Option>> ConfigurationImpl::explain(const std::string& key) {
+    const Operation operation(*this);
+    return makeReadyFuture(sources.holders(key));
+}
 
 Future<Reading> ConfigurationImpl::read(const std::vector<std::string>& keys) {
     const Operation operation(*this);
@@ -113,6 +124,48 @@ Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Ch
     if (!changed.empty()) version.fetch_add(1, std::memory_order_release);
     tellAll(operation.mutexLevel(), unique(changed));
     return makeReadyFuture(outcome);
+}
+
+class ConfigurationImpl::Host final : public SourceHost {
+public:
+    explicit Host(ConfigurationImpl& hostingStore) : store(hostingStore) {}
+
+    void changeTogether(const std::function<void()>& change) override {
+        store.changeTogether(change);
+    }
+
+private:
+    ConfigurationImpl& store;
+};
+
+// Registers a source, which knows of it beforehand if it wants to.
+std::shared_ptr<detail::RegisteredSource> ConfigurationImpl::insert(ConfigurationSourceMap entry) {
+    auto* const attached = dynamic_cast<AttachedSource*>(entry.source.get());
+    if (attached == nullptr) return sources.insert(std::move(entry));
+    if (host == nullptr) host = std::make_unique<Host>(*this);
+    attached->attach(std::shared_ptr<SourceHost>(weak_from_this().lock(), host.get()));
+    try {
+        return sources.insert(std::move(entry));
+    } catch (...) {
+        attached->detach();
+        throw;
+    }
+}
+
+void ConfigurationImpl::changeTogether(const std::function<void()>& change) {
+    Operation operation(*this);
+    std::vector<std::string> changed;
+    std::exception_ptr failure;
+    {
+        const Deferral deferral(deferred, changed);
+        try {
+            change();
+        } catch (...) {
+            failure = std::current_exception();
+        }
+    }
+    tellAll(operation.mutexLevel(), unique(changed));
+    if (failure) std::rethrow_exception(failure);
 }
 
 void ConfigurationImpl::onSourceChanged(const std::string& group, const std::string& key) {

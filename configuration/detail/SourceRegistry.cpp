@@ -26,6 +26,7 @@ RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
     : ConfigurationSourceMap(std::move(entry)),
       table(nullptr),
       forgetting(dynamic_cast<ForgettingSource*>(source.get())),
+      attached(dynamic_cast<AttachedSource*>(source.get())),
       foreign(true) {
     if (const auto* const answering = dynamic_cast<const TableSource*>(source.get())) {
         table = answering->table();

@@ -8,6 +8,7 @@
 
 #include "configuration/Option.hpp"
 #include "configuration/detail/KeyBuffer.hpp"
+#include "configuration/sources/AttachedSource.hpp"
 #include "configuration/sources/ConfigurationSourceMap.hpp"
 #include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/SourceDescription.hpp"
@@ -30,6 +31,7 @@ struct RegisteredSource : ConfigurationSourceMap {
 
     const ValueTable* table;       ///< What it answers from; null: the source itself is asked.
     ForgettingSource* forgetting;  ///< The source, if keys can be taken out of it; else null.
+    AttachedSource* attached;      ///< The source, if it is told of its registration; else null.
     bool foreign;                  ///< It is not of one of this library's own classes.
     bool reportsChanges = false;   ///< The store's listener is installed.
 };
