@@ -140,12 +140,12 @@ int openFile(sqlite3_vfs* vfs, const char* name, sqlite3_file* file, int flags, 
     PowerCutVfs& powerCutVfs = vfsOf(vfs);
     file->pMethods = nullptr;
     const std::string path = name == nullptr ? "" : name;
+    const bool mayCreate = (flags & SQLITE_OPEN_CREATE) != 0;
     SimulatedDisk::OpenFile opened;
-    const DiskAnswer answer =
-        powerCutVfs.disk().open(path, (flags & SQLITE_OPEN_CREATE) != 0, opened);
+    const DiskAnswer answer = powerCutVfs.disk().open(path, mayCreate, opened);
     if (answer != DiskAnswer::done) return codeOf(answer, SQLITE_CANTOPEN);
     constexpr int journals = SQLITE_OPEN_WAL | SQLITE_OPEN_MAIN_JOURNAL | SQLITE_OPEN_SUPER_JOURNAL;
-    opened.isNewName = opened.isNewName && (flags & journals) != 0;
+    opened.syncsFolder = mayCreate && (flags & journals) != 0;
     const bool isTemporary = (flags & SQLITE_OPEN_DELETEONCLOSE) != 0;
     static_cast<VfsFile*>(file)->connection = new Connection{
         powerCutVfs.disk(), opened, powerCutVfs.locksOf(opened), isTemporary ? path : ""};

@@ -19,9 +19,15 @@ public:
 
     /// One of few keys, in groups, of any bytes.
     std::string key() {
-        static const std::array<std::string, 8> keys{
-            "a",      "server.port", "server.host", "server.tls.key",
-            "x.y.z",  "x.y",         "Gr\xc3\xb6\xc3\x9f" "e",  "a b=\xff\n'"};
+        static const std::array<std::string, 8> keys{"a",
+                                                     "server.port",
+                                                     "server.host",
+                                                     "server.tls.key",
+                                                     "x.y.z",
+                                                     "x.y",
+                                                     "Gr\xc3\xb6\xc3\x9f"
+                                                     "e",
+                                                     "a b=\xff\n'"};
         return keys[below(keys.size(), random)];
     }
 
@@ -42,8 +48,8 @@ private:
 
     double one(const double*) {
         using Limits = std::numeric_limits<double>;
-        const std::array<double, 6> awkward{0.1,          -0.0,          Limits::infinity(),
-                                            Limits::max(), Limits::denorm_min(), -1e-300};
+        const std::array<double, 6> awkward{
+            0.1, -0.0, Limits::infinity(), Limits::max(), Limits::denorm_min(), -1e-300};
         return awkward[below(awkward.size(), random)];
     }
 

@@ -24,11 +24,11 @@ DiskAnswer SimulatedDisk::open(const std::string& name, bool mayCreate, OpenFile
     if (answer != DiskAnswer::done) return answer;
     const auto found = names.find(name);
     if (found != names.end()) {
-        opened = {found->second, session, false};
+        opened = {found->second, session};
         return DiskAnswer::done;
     }
     if (!mayCreate) return DiskAnswer::failed;
-    opened = {std::make_shared<SimulatedFile>(), session, true};
+    opened = {std::make_shared<SimulatedFile>(), session};
     if (!name.empty()) names.emplace(name, opened.file);
     return DiskAnswer::done;
 }
@@ -62,7 +62,7 @@ DiskAnswer SimulatedDisk::sync(OpenFile& which) {
     const DiskAnswer answer = admit(lock, DiskOperation::sync, which.session);
     if (answer != DiskAnswer::done) return answer;
     which.file->sync();
-    if (std::exchange(which.isNewName, false)) durableNames = names;
+    if (std::exchange(which.syncsFolder, false)) durableNames = names;
     return answer;
 }
 
@@ -146,7 +146,7 @@ void SimulatedDisk::hold() {
 
 void SimulatedDisk::waitUntilHolding() {
     std::unique_lock<std::mutex> lock(mutex);
-    heldUp.wait(lock, [this] { return waiting > 0; });
+    heldUp.wait(lock, [this] { return waiting > 0 || !isPowered; });
 }
 
 void SimulatedDisk::letGo() {
@@ -163,7 +163,7 @@ DiskAnswer SimulatedDisk::admit(std::unique_lock<std::mutex>& lock, DiskOperatio
         goesOn.wait(lock, [this] { return !isHolding; });
         --waiting;
     }
-    if (changesTheDisk(operation) && loseOneUse()) isPowered = false;
+    if (changesTheDisk(operation) && loseOneUse()) losePower();
     if (!isPowered || caller != session) return DiskAnswer::failed;
     if (!fault || fault->operation != operation) return DiskAnswer::done;
     if (fault->successes > 0) {
@@ -182,6 +182,11 @@ bool SimulatedDisk::loseOneUse() {
     if (*usesLeft == 0) return true;
     --*usesLeft;
     return false;
+}
+
+void SimulatedDisk::losePower() {
+    isPowered = false;
+    heldUp.notify_all();
 }
 
 void SimulatedDisk::start() {

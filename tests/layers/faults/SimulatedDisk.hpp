@@ -40,7 +40,7 @@ public:
     struct OpenFile {
         std::shared_ptr<SimulatedFile> file;
         unsigned session = 0;
-        bool isNewName = false;  ///< Whether its first sync is to sync the folder as well.
+        bool syncsFolder = false;  ///< Whether its first sync is to sync the folder as well.
     };
 
     struct ReadAnswer {
@@ -84,7 +84,7 @@ public:
     /// Holds up every write and sync until `letGo`.
     void hold();
 
-    /// Waits until a thread is held up.
+    /// Waits until a thread is held up, or the power is off.
     void waitUntilHolding();
     void letGo();
 
@@ -93,6 +93,7 @@ private:
 
     DiskAnswer admit(std::unique_lock<std::mutex>& lock, DiskOperation operation, unsigned caller);
     bool loseOneUse();
+    void losePower();
     void start();
 
     mutable std::mutex mutex;  // guards all below

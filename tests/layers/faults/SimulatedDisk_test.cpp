@@ -37,6 +37,7 @@ protected:
         std::set<std::string> left;
         for (std::uint64_t seed = 1; seed <= 100; ++seed) {
             SimulatedDisk::OpenFile file = opened();
+            file.syncsFolder = true;
             disk.resize(file, 0);
             write(file, std::string(2 * sector, 'a'));
             disk.sync(file);
@@ -106,6 +107,7 @@ TEST_F(SimulatedDiskTest, KeepsOrLosesTheNameOfANewFile) {
 
 TEST_F(SimulatedDiskTest, KeepsTheNamesThatWereSynced) {
     SimulatedDisk::OpenFile file = opened("new");
+    file.syncsFolder = true;
     disk.sync(file);
     for (std::uint64_t seed = 1; seed <= 100; ++seed) {
         Random random(seed);

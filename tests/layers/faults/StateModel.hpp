@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <map>
@@ -61,61 +62,93 @@ class StateModel {
 public:
     using Value = configuration::ConfigurationValue;
     using Action = layers::JournalAction;
+    using Time = std::chrono::system_clock::time_point;
 
     explicit StateModel(std::string writer) : author(std::move(writer)) {}
 
-    void set(const std::string& key, const Value& value) { note(Action::set, key, value); }
+    void set(const std::string& key, const Value& value, std::optional<Time> expires = {}) {
+        note(Action::set, key, value, expires);
+    }
 
     /// Says whether there was something to unset.
     bool unset(const std::string& key) {
-        if (values.count(key) == 0) return false;
+        if (held.count(key) == 0) return false;
         note(Action::unset, key, std::nullopt);
         return true;
     }
 
     /// Undoes the entry at that place.
     void undo(std::size_t place) {
-        const layers::JournalEntry undone = entries[place];
+        const layers::JournalEntry undone = notes[place].entry;
         note(Action::undo, undone.key, undone.before);
     }
 
+    /// Unsets what is to go by `now`.
+    void expire(Time now) {
+        std::vector<std::string> keys;
+        for (const auto& [key, place] : held) {
+            if (notes[place].expires && *notes[place].expires <= now) keys.push_back(key);
+        }
+        for (const std::string& key : keys) note(Action::expired, key, std::nullopt);
+    }
+
+    /// How many entries the journal holds.
+    std::size_t size() const { return notes.size(); }
+
+    std::int64_t change(std::size_t place) const { return notes[place].entry.change; }
+
     /// The journal, oldest first.
-    const std::vector<layers::JournalEntry>& journal() const { return entries; }
+    std::vector<std::string> journal() const {
+        std::vector<std::string> texts;
+        for (const Note& each : notes) texts.push_back(textOf(each.entry));
+        return texts;
+    }
 
-    const std::map<std::string, Value>& present() const { return values; }
+    SpelledValues values() const {
+        SpelledValues spelled;
+        for (const auto& [key, place] : held) spelled[key] = textOf(notes[place].entry.after);
+        return spelled;
+    }
 
-    /// Forgets all entries but the first `count`: nobody was told that they are kept.
+    /// Forgets all entries but the first `count`.
     void keep(std::size_t count) {
-        entries.resize(count);
-        values.clear();
-        for (const auto& entry : entries) store(entry);
+        notes.resize(count);
+        held.clear();
+        for (std::size_t place = 0; place < count; ++place) hold(place);
     }
 
 private:
-    void note(Action action, const std::string& key, const std::optional<Value>& after) {
+    struct Note {
         layers::JournalEntry entry;
-        entry.change = entries.empty() ? 1 : entries.back().change + 1;
+        std::optional<Time> expires;
+    };
+
+    void note(Action action, const std::string& key, const std::optional<Value>& after,
+              std::optional<Time> expires = {}) {
+        layers::JournalEntry entry;
+        entry.change = notes.empty() ? 1 : notes.back().entry.change + 1;
         entry.author = author;
         entry.action = action;
         entry.key = key;
-        const auto present = values.find(key);
-        if (present != values.end()) entry.before = present->second;
+        const auto present = held.find(key);
+        if (present != held.end()) entry.before = notes[present->second].entry.after;
         entry.after = after;
-        store(entry);
-        entries.push_back(std::move(entry));
+        notes.push_back({std::move(entry), expires});
+        hold(notes.size() - 1);
     }
 
-    void store(const layers::JournalEntry& entry) {
+    void hold(std::size_t place) {
+        const layers::JournalEntry& entry = notes[place].entry;
         if (entry.after) {
-            values[entry.key] = *entry.after;
+            held[entry.key] = place;
         } else {
-            values.erase(entry.key);
+            held.erase(entry.key);
         }
     }
 
-    const std::string author;
-    std::map<std::string, Value> values;
-    std::vector<layers::JournalEntry> entries;
+    std::string author;
+    std::vector<Note> notes;
+    std::map<std::string, std::size_t> held;  ///< The note of each key that has a value.
 };
 
 }  // namespace velkor::testing
