@@ -1,5 +1,6 @@
 #pragma once
 
+#include <chrono>
 #include <condition_variable>
 #include <mutex>
 
@@ -51,6 +52,11 @@ public:
     /// Waits for `condition` with the mutex released; it is held again on return. May wake
     /// spuriously, so callers wait in a loop.
     void wait(std::condition_variable& condition) { condition.wait(lock); }
+
+    /// As above, no longer than `limit`.
+    void waitFor(std::condition_variable& condition, std::chrono::nanoseconds limit) {
+        condition.wait_for(lock, limit);
+    }
 
 private:
     std::unique_lock<std::mutex> lock;

@@ -1,0 +1,36 @@
+#pragma once
+
+#include <chrono>
+#include <cstdint>
+#include <optional>
+#include <string>
+
+#include "configuration/ConfigurationValue.hpp"
+
+namespace velkor::layers {
+
+/// How a write came about.
+enum class JournalAction {
+    set,      ///< A value was set, for good or for a time.
+    unset,    ///< The key was unset.
+    undo,     ///< A former change was undone.
+    expired,  ///< The time of the value was over.
+    other,    ///< In a way that this version doesn't know.
+};
+
+/// One write of a `SqliteSource`.
+struct JournalEntry {
+    std::int64_t change = 0;  ///< Its number: grows with every write, never used twice.
+    std::chrono::system_clock::time_point when{};  ///< In whole microseconds.
+    std::string author{};
+    JournalAction action = JournalAction::set;
+    std::string key{};
+    std::optional<configuration::ConfigurationValue> before{};  ///< Nothing: it had no value.
+    std::optional<configuration::ConfigurationValue> after{};   ///< Nothing: it has none since.
+
+    /// False when a value is of a kind that this version doesn't know. It stands as narrow text
+    /// then, the bytes that are in the file.
+    bool known = true;
+};
+
+}  // namespace velkor::layers

@@ -1,0 +1,7 @@
+#include "layers/sqlite/Loggers.hpp"
+
+namespace velkor::layers {
+
+const common::DiagnosticLogger sqliteLogger("velkor::layers::sqlite");
+
+}  // namespace velkor::layers

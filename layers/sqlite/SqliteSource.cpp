@@ -1,0 +1,105 @@
+#include "layers/sqlite/SqliteSource.hpp"
+
+#include <stdexcept>
+#include <utility>
+
+#include <pthread.h>
+#include <signal.h>
+
+#include "layers/sqlite/SqliteErrors.hpp"
+#include "layers/sqlite/detail/Committer.hpp"
+#include "layers/sqlite/detail/TableWrite.hpp"
+
+namespace velkor::layers {
+
+using configuration::ConfigurationValue;
+using configuration::ValueMap;
+using configuration::ValueTable;
+using detail::Committer;
+using detail::PreparedWrite;
+
+std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& path,
+                                                 const SqliteOptions& options) {
+    ValueMap values;
+    auto shared = std::make_shared<Committer>(path, options, values);
+    auto source = std::make_shared<SqliteSource>(Key(), shared, std::move(values));
+    source->change([&](ValueTable& table) { return shared->expire(table); });
+    const auto changeTable = [weak = std::weak_ptr(source)](const Committer::Mutation& mutation) {
+        const auto alive = weak.lock();
+        if (alive) alive->change(mutation);
+        return alive != nullptr;
+    };
+    source->thread.emplace([shared, changeTable] { shared->run(changeTable); });
+    return source;
+}
+
+SqliteSource::SqliteSource(Key, std::shared_ptr<Committer> shared, ValueMap&& initialValues)
+    : LiveSource(typeid(SqliteSource), std::move(initialValues)), committer(std::move(shared)) {}
+
+SqliteSource::~SqliteSource() {
+    committer->queue().end();
+}
+
+ConfigurationValue SqliteSource::set(const std::string& key, ConfigurationValue value) {
+    return store(committer->prepare(JournalAction::set, key, std::move(value)));
+}
+
+ConfigurationValue SqliteSource::setFor(const std::string& key, ConfigurationValue value,
+                                        std::chrono::milliseconds lifetime) {
+    if (lifetime <= lifetime.zero()) throw std::invalid_argument(sqlite_errors::noLifetime);
+    return store(committer->prepare(JournalAction::set, key, std::move(value), lifetime));
+}
+
+ConfigurationValue SqliteSource::store(PreparedWrite&& write) {
+    ConfigurationValue answer;
+    change([&](ValueTable& table) {
+        const JournalEntry& entry = write.write().entry;
+        committer->complete(table, write);
+        answer = entry.before ? *entry.before : *entry.after;
+        Keys changed{entry.key};
+        detail::put(table, committer->queue(), std::move(write));
+        return changed;
+    });
+    return answer;
+}
+
+std::optional<ConfigurationValue> SqliteSource::unset(const std::string& key) {
+    auto write = committer->prepare(JournalAction::unset, key, std::nullopt);
+    std::optional<ConfigurationValue> removed;
+    change([&](ValueTable& table) {
+        committer->complete(table, write);
+        removed = write.write().entry.before;
+        if (!removed) return Keys();
+        Keys changed{key};
+        detail::put(table, committer->queue(), std::move(write));
+        return changed;
+    });
+    return removed;
+}
+
+Future<bool> SqliteSource::committed() {
+    return committer->queue().committed();
+}
+
+std::vector<JournalEntry> SqliteSource::history(const std::string& keyOrPrefix, std::size_t limit) {
+    return committer->stateFile().history(keyOrPrefix, limit);
+}
+
+JournalEntry SqliteSource::undo(std::optional<std::int64_t> change) {
+    JournalEntry undone = committer->find(change);
+    if (!undone.known) {
+        throw std::runtime_error(sqlite_errors::unknownKind + std::to_string(undone.change));
+    }
+    auto write = committer->prepare(JournalAction::undo, undone.key, std::move(undone.before));
+    JournalEntry done;
+    LiveSource::change([&](ValueTable& table) {
+        committer->complete(table, write);
+        done = write.write().entry;
+        Keys changed{done.key};
+        done.change = detail::put(table, committer->queue(), std::move(write));
+        return changed;
+    });
+    return done;
+}
+
+}  // namespace velkor::layers

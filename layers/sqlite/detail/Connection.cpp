@@ -1,0 +1,65 @@
+#include "layers/sqlite/detail/Connection.hpp"
+
+#include <new>
+#include <stdexcept>
+#include <system_error>
+
+#include "layers/sqlite/detail/Statement.hpp"
+
+namespace velkor::layers::detail {
+
+Connection::Connection(const std::filesystem::path& path, const std::string& vfs) {
+    constexpr int flags =
+        SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE;
+    sqlite3* opened = nullptr;
+    const int result =
+        sqlite3_open_v2(path.c_str(), &opened, flags, vfs.empty() ? nullptr : vfs.c_str());
+    native.reset(opened);
+    if (opened == nullptr) throw std::bad_alloc();
+    if (result != SQLITE_OK) fail();
+    if (sqlite3_db_readonly(opened, "main") == 1) throw std::runtime_error("it is read-only");
+}
+
+void Connection::execute(const std::string& sql) {
+    if (sqlite3_exec(handle(), sql.c_str(), nullptr, nullptr, nullptr) != SQLITE_OK) fail();
+}
+
+std::int64_t Connection::number(const std::string& sql) {
+    Statement statement(*this, sql);
+    Execution query(statement);
+    return query.next() ? query.number(0) : 0;
+}
+
+std::string Connection::text(const std::string& sql) {
+    Statement statement(*this, sql);
+    Execution query(statement);
+    return query.next() ? std::string(query.bytes(0)) : std::string();
+}
+
+void Connection::fail() const {
+    std::string cause = sqlite3_errmsg(handle());
+    const int kind = sqlite3_errcode(handle());
+    const int reason = sqlite3_system_errno(handle());
+    if ((kind == SQLITE_CANTOPEN || kind == SQLITE_IOERR) && reason != 0) {
+        cause += " (" + std::generic_category().message(reason) + ")";
+    }
+    throw std::runtime_error(cause);
+}
+
+Transaction::Transaction(Connection& changed) : connection(changed) {
+    connection.execute("BEGIN IMMEDIATE");
+}
+
+Transaction::~Transaction() {
+    // Some failures have taken all back already. Where this fails, the next one can't begin, and
+    // says why.
+    if (connection.inTransaction()) {
+        sqlite3_exec(connection.handle(), "ROLLBACK", nullptr, nullptr, nullptr);
+    }
+}
+
+void Transaction::commit() {
+    connection.execute("COMMIT");
+}
+
+}  // namespace velkor::layers::detail

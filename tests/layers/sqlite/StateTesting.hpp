@@ -1,0 +1,102 @@
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <chrono>
+#include <cstdint>
+#include <cstdlib>
+#include <filesystem>
+#include <functional>
+#include <memory>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "layers/sqlite/SqliteSource.hpp"
+#include "tests/support/ValueText.hpp"
+
+namespace velkor::testing {
+
+using layers::JournalAction;
+using layers::JournalEntry;
+using layers::SqliteOptions;
+using layers::SqliteSource;
+
+/// A folder of its own for a state file; gone, with all that is in it, when this is destroyed.
+class StateFolder {
+public:
+    StateFolder() {
+        std::string name = (std::filesystem::temp_directory_path() / "velkor-XXXXXX").string();
+        if (::mkdtemp(name.data()) == nullptr) throw std::runtime_error("can't create " + name);
+        folder = std::filesystem::canonical(name);
+    }
+
+    ~StateFolder() {
+        std::error_code leftBehind;
+        std::filesystem::remove_all(folder, leftBehind);
+    }
+
+    StateFolder(const StateFolder&) = delete;
+    StateFolder& operator=(const StateFolder&) = delete;
+
+    std::filesystem::path path() const { return folder; }
+    std::filesystem::path file() const { return folder / "state.db"; }
+
+private:
+    std::filesystem::path folder;
+};
+
+/// A clock that stands still until it is set.
+class HandClock {
+public:
+    using Time = std::chrono::system_clock::time_point;
+
+    /// What the options of a source take.
+    std::function<Time()> function() const {
+        return [now = micros] { return Time(std::chrono::microseconds(*now)); };
+    }
+
+    void advance(std::chrono::microseconds by) { *micros += by.count(); }
+    Time now() const { return function()(); }
+
+private:
+    std::shared_ptr<std::atomic<std::int64_t>> micros =
+        std::make_shared<std::atomic<std::int64_t>>(1'700'000'000'000'000);
+};
+
+inline std::string nameOf(JournalAction action) {
+    switch (action) {
+        case JournalAction::set:
+            return "set";
+        case JournalAction::unset:
+            return "unset";
+        case JournalAction::undo:
+            return "undo";
+        case JournalAction::expired:
+            return "expired";
+        case JournalAction::other:
+            break;
+    }
+    return "other";
+}
+
+/// "1 alice set key: int 1 -> int 2".
+inline std::string textOf(const JournalEntry& entry) {
+    return std::to_string(entry.change) + " " + entry.author + " " + nameOf(entry.action) + " " +
+           entry.key + ": " + (entry.before ? textOf(*entry.before) : "none") + " -> " +
+           (entry.after ? textOf(*entry.after) : "none");
+}
+
+inline std::vector<std::string> textsOf(const std::vector<JournalEntry>& entries) {
+    std::vector<std::string> texts;
+    for (const auto& entry : entries) texts.push_back(textOf(entry));
+    return texts;
+}
+
+/// All of the journal, newest first.
+inline std::vector<std::string> historyOf(SqliteSource& source, const std::string& of = "") {
+    return textsOf(source.history(of, 1000));
+}
+
+}  // namespace velkor::testing
