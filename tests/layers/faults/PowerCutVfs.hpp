@@ -14,8 +14,8 @@
 namespace velkor::testing {
 
 /// Registers a VFS of SQLite whose files are on a `SimulatedDisk`. It promises what the usual one
-/// does: a write leaves the bytes beside it alone, and the first sync of a journal syncs the folder,
-/// too. Connections of one process may share a file; a start of the disk takes their locks
+/// does: a write leaves the bytes beside it alone, and the first sync of a journal syncs the
+/// folder, too. Connections of one process may share a file; a start of the disk takes their locks
 /// and their shared memory. Outlives all connections that use it.
 class PowerCutVfs {
 public:

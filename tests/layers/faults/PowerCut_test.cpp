@@ -19,7 +19,6 @@ using velkor::testing::Random;
 using velkor::testing::RandomWrites;
 using velkor::testing::SimulatedState;
 using velkor::testing::StateModel;
-using velkor::testing::textOf;
 using velkor::testing::valuesOf;
 
 /// How a life of the writer ends.
@@ -44,7 +43,7 @@ public:
         } else {
             state.disk().restartAfterPowerCut(random);
         }
-        if (below(3, random) == 0) state.advance(2 * RandomWrites::lifetime);
+        if (below(3, random) == 0) state.clock.advance(2 * RandomWrites::lifetime);
     }
 
     /// Looks at what the last life left.
@@ -55,12 +54,12 @@ private:
     /// expired meanwhile. The values are those that the journal leads to.
     void look(SqliteSource& source) {
         source.committed().get();
-        const auto journal = textsOf(journalOf(source));
+        const auto journal = journalOf(source);
         const auto values = valuesOf(source);
         for (std::size_t kept = model.size() + 1; kept-- > acknowledged;) {
             StateModel left = model;
             left.keep(kept);
-            left.expire(state.now());
+            left.expire(state.clock.now());
             if (left.journal() != journal) continue;
             EXPECT_EQ(values, left.values());
             model = left;
@@ -78,20 +77,14 @@ private:
         if (below(4, random) == 0) writes.undo(source);
         if (below(2, random) == 0) {
             state.disk().hold();
-            if (writes.write(source, state.now())) state.disk().waitUntilHolding();
+            if (writes.write(source, state.clock.now())) state.disk().waitUntilHolding();
         }
         for (std::size_t count = below(5, random); count > 0; --count) {
-            writes.write(source, state.now());
+            writes.write(source, state.clock.now());
         }
         state.disk().letGo();
         source.committed().get();
         acknowledged = model.size();
-    }
-
-    static std::vector<std::string> textsOf(const std::vector<JournalEntry>& journal) {
-        std::vector<std::string> texts;
-        for (const JournalEntry& entry : journal) texts.push_back(textOf(entry));
-        return texts;
     }
 
     SimulatedState state;

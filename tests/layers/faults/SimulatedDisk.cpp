@@ -60,7 +60,10 @@ DiskAnswer SimulatedDisk::resize(const OpenFile& which, std::size_t size) {
 DiskAnswer SimulatedDisk::sync(OpenFile& which) {
     std::unique_lock<std::mutex> lock(mutex);
     const DiskAnswer answer = admit(lock, DiskOperation::sync, which.session);
-    if (answer != DiskAnswer::done) return answer;
+    if (answer != DiskAnswer::done) {
+        which.file->failToSync();
+        return answer;
+    }
     which.file->sync();
     if (std::exchange(which.syncsFolder, false)) durableNames = names;
     return answer;

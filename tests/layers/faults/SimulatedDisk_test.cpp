@@ -80,6 +80,17 @@ TEST_F(SimulatedDiskTest, KeepsAnyVersionOfASectorSinceItsSync) {
               (std::set<std::string>{sectors('a', 'a'), sectors('b', 'a'), sectors('c', 'a')}));
 }
 
+TEST_F(SimulatedDiskTest, IsNoSurerOfWhatCouldNotBeSyncedAfterTheNextSync) {
+    const auto left = leftAfter([this](SimulatedDisk::OpenFile& file) {
+        write(file, sectors('b', 'b'));
+        disk.fail({DiskOperation::sync});
+        disk.sync(file);
+        write(file, std::string(sector, 'c'));
+        disk.sync(file);
+    });
+    EXPECT_EQ(left, (std::set<std::string>{sectors('c', 'a'), sectors('c', 'b')}));
+}
+
 TEST_F(SimulatedDiskTest, KeepsOrLosesAChangeOfTheSize) {
     const auto left =
         leftAfter([this](SimulatedDisk::OpenFile& file) { disk.resize(file, sector); });

@@ -19,6 +19,7 @@ void SimulatedFile::write(std::size_t offset, const unsigned char* bytes, std::s
     const std::size_t last = (offset + count - 1) / sectorSize;
     for (std::size_t index = offset / sectorSize; index <= last; ++index) {
         versions[index].push_back(sectorOf(written, index));
+        unsyncable.erase(index);
     }
 }
 
@@ -29,11 +30,19 @@ void SimulatedFile::resize(std::size_t newSize) {
 
 void SimulatedFile::sync() {
     durable.resize(written.size());
-    for (const auto& version : versions) {
-        store(durable, version.first, sectorOf(written, version.first));
+    for (auto version = versions.begin(); version != versions.end();) {
+        if (unsyncable.count(version->first) > 0) {
+            ++version;
+            continue;
+        }
+        store(durable, version->first, sectorOf(written, version->first));
+        version = versions.erase(version);
     }
-    versions.clear();
     sizes.clear();
+}
+
+void SimulatedFile::failToSync() {
+    for (const auto& version : versions) unsyncable.insert(version.first);
 }
 
 void SimulatedFile::losePower(unsigned lost, Random& random) {
@@ -47,6 +56,7 @@ void SimulatedFile::losePower(unsigned lost, Random& random) {
         store(written, index, loses() ? sectors[below(sectors.size(), random)] : sectors.back());
     }
     versions.clear();
+    unsyncable.clear();
     sizes.clear();
     durable = written;
 }

@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <map>
 #include <random>
+#include <set>
 #include <vector>
 
 namespace velkor::testing {
@@ -31,8 +32,12 @@ public:
     /// Cuts the content to `newSize` bytes, or extends it by zeros.
     void resize(std::size_t newSize);
 
-    /// Makes all that was written last beyond the next power cut.
+    /// Lets what was written last survive power cuts.
     void sync();
+
+    /// A sync that fails: what was written by now is no surer after the next one either, but for
+    /// the sectors that are written again.
+    void failToSync();
 
     /// A power cut: leaves the file with one of the sizes and each sector with one of the versions
     /// that it had since the last sync. An older version is left with a chance of `lost` percent.
@@ -48,6 +53,7 @@ private:
     std::vector<unsigned char> written;                   ///< What a reader sees.
     std::vector<unsigned char> durable;                   ///< As of the last sync.
     std::map<std::size_t, std::vector<Sector>> versions;  ///< Of the sectors written since.
+    std::set<std::size_t> unsyncable;                     ///< Sectors that no sync reaches.
     std::vector<std::size_t> sizes;                       ///< That the file had since.
 };
 

@@ -1,14 +1,11 @@
 #pragma once
 
-#include <atomic>
-#include <chrono>
-#include <filesystem>
 #include <memory>
 #include <string>
 
 #include "layers/sqlite/SqliteSource.hpp"
 #include "tests/layers/faults/PowerCutVfs.hpp"
-#include "tests/support/TemporaryFile.hpp"
+#include "tests/layers/sqlite/StateTesting.hpp"
 
 namespace velkor::testing {
 
@@ -16,8 +13,6 @@ namespace velkor::testing {
 /// folder, where the lock of the one who writes is.
 class SimulatedState {
 public:
-    using Time = std::chrono::system_clock::time_point;
-
     static constexpr const char* author = "somebody";
 
     /// Throws as `SqliteSource::open`.
@@ -25,19 +20,17 @@ public:
         layers::SqliteOptions options;
         options.author = author;
         options.vfs = vfs.name();
-        options.clock = [this] { return now(); };
-        return layers::SqliteSource::open(neighbour.parent() / "state.db", options);
+        options.clock = clock.function();
+        return layers::SqliteSource::open(folder.file(), options);
     }
+
+    HandClock clock;
 
     SimulatedDisk& disk() { return vfs.disk(); }
 
-    Time now() const { return Time(std::chrono::seconds(secondsPassed)); }
-    void advance(std::chrono::seconds time) { secondsPassed += time.count(); }
-
 private:
-    TemporaryFile neighbour{""};
+    StateFolder folder;
     PowerCutVfs vfs{"simulated-state"};
-    std::atomic<std::chrono::seconds::rep> secondsPassed{1'000'000'000};
 };
 
 }  // namespace velkor::testing

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
@@ -10,7 +11,7 @@
 #include <vector>
 
 #include "layers/sqlite/SqliteSource.hpp"
-#include "tests/support/ValueText.hpp"
+#include "tests/layers/sqlite/StateTesting.hpp"
 
 namespace velkor::testing {
 
@@ -23,38 +24,11 @@ inline SpelledValues valuesOf(layers::SqliteSource& source) {
     return values;
 }
 
-inline std::string textOf(const std::optional<configuration::ConfigurationValue>& value) {
-    return value ? textOf(*value) : "nothing";
-}
-
-/// What an entry says, without its time.
-inline std::string textOf(const layers::JournalEntry& entry) {
-    return std::to_string(entry.change) + " by " + entry.author + ": action " +
-           std::to_string(static_cast<int>(entry.action)) + " on " + entry.key + ", " +
-           textOf(entry.before) + " -> " + textOf(entry.after);
-}
-
 /// All that the journal of a source holds, oldest first.
-inline std::vector<layers::JournalEntry> journalOf(layers::SqliteSource& source) {
-    auto journal = source.history("", static_cast<std::size_t>(-1));
-    return {std::make_move_iterator(journal.rbegin()), std::make_move_iterator(journal.rend())};
-}
-
-/// The values that the journal leads to, or nothing when its entries contradict each other.
-inline std::optional<SpelledValues> replayed(const std::vector<layers::JournalEntry>& journal) {
-    SpelledValues values;
-    for (const auto& entry : journal) {
-        const auto present = values.find(entry.key);
-        if (textOf(entry.before) != (present == values.end() ? "nothing" : present->second)) {
-            return std::nullopt;
-        }
-        if (entry.after) {
-            values[entry.key] = textOf(*entry.after);
-        } else {
-            values.erase(entry.key);
-        }
-    }
-    return values;
+inline std::vector<std::string> journalOf(layers::SqliteSource& source) {
+    std::vector<std::string> texts = textsOf(source.history("", 100'000));
+    std::reverse(texts.begin(), texts.end());
+    return texts;
 }
 
 /// What a source is to hold.
@@ -62,7 +36,7 @@ class StateModel {
 public:
     using Value = configuration::ConfigurationValue;
     using Action = layers::JournalAction;
-    using Time = std::chrono::system_clock::time_point;
+    using Time = HandClock::Time;
 
     explicit StateModel(std::string writer) : author(std::move(writer)) {}
 
@@ -106,7 +80,7 @@ public:
 
     SpelledValues values() const {
         SpelledValues spelled;
-        for (const auto& [key, place] : held) spelled[key] = textOf(notes[place].entry.after);
+        for (const auto& [key, place] : held) spelled[key] = textOf(*notes[place].entry.after);
         return spelled;
     }
 
