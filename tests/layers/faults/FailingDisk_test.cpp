@@ -2,10 +2,10 @@
 
 #include <chrono>
 #include <cstddef>
-#include <ostream>
 #include <stdexcept>
 #include <string>
 #include <tuple>
+#include <vector>
 
 #include "tests/layers/faults/ScriptedWrites.hpp"
 #include "tests/layers/faults/SimulatedState.hpp"
@@ -101,6 +101,23 @@ private:
     }
 };
 
+/// All ways to fail, but that a disk which never syncs again loses its power: it may hold writes
+/// then that it has refused.
+std::vector<FailingDisk::ParamType> allWays() {
+    std::vector<FailingDisk::ParamType> ways;
+    for (const Kind& kind : kinds) {
+        for (const Duration duration : {Duration::once, Duration::lasting}) {
+            for (const End end : {End::close, End::kill, End::powerCut}) {
+                const bool neverSyncs =
+                    kind.operation == DiskOperation::sync && duration == Duration::lasting;
+                if (neverSyncs && end == End::powerCut) continue;
+                ways.emplace_back(kind, duration, end);
+            }
+        }
+    }
+    return ways;
+}
+
 std::string nameOf(const ::testing::TestParamInfo<FailingDisk::ParamType>& info) {
     const auto [kind, duration, end] = info.param;
     const std::string duringWhat = duration == Duration::once ? "Once" : "FromThenOn";
@@ -112,12 +129,7 @@ TEST_P(FailingDisk, LosesNothingAcknowledgedAndKeepsNothingRefused) {
     failEachOperation();
 }
 
-INSTANTIATE_TEST_SUITE_P(Operations, FailingDisk,
-                         ::testing::Combine(::testing::ValuesIn(kinds),
-                                            ::testing::Values(Duration::once, Duration::lasting),
-                                            ::testing::Values(End::close, End::kill,
-                                                              End::powerCut)),
-                         nameOf);
+INSTANTIATE_TEST_SUITE_P(Operations, FailingDisk, ::testing::ValuesIn(allWays()), nameOf);
 
 }  // namespace
 }  // namespace velkor::layers
