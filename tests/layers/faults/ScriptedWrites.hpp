@@ -56,14 +56,4 @@ private:
     StateModel& model;
 };
 
-/// Expects the file of `source` to hold what `model` says. Numbers of changes may be left out.
-inline void expectFileToHold(layers::SqliteSource& source, const StateModel& model) {
-    const auto withoutNumbers = [](std::vector<std::string> journal) {
-        for (std::string& entry : journal) entry.erase(0, entry.find(' '));
-        return journal;
-    };
-    EXPECT_EQ(withoutNumbers(journalOf(source)), withoutNumbers(model.journal()));
-    EXPECT_EQ(valuesOf(source), model.values());
-}
-
 }  // namespace velkor::testing

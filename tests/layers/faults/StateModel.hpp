@@ -1,5 +1,7 @@
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <algorithm>
 #include <chrono>
 #include <cstddef>
@@ -124,5 +126,15 @@ private:
     std::vector<Note> notes;
     std::map<std::string, std::size_t> held;  ///< The note of each key that has a value.
 };
+
+/// Expects the file of `source` to hold what `model` says. Numbers of changes may be left out.
+inline void expectFileToHold(layers::SqliteSource& source, const StateModel& model) {
+    const auto withoutNumbers = [](std::vector<std::string> journal) {
+        for (std::string& entry : journal) entry.erase(0, entry.find(' '));
+        return journal;
+    };
+    EXPECT_EQ(withoutNumbers(journalOf(source)), withoutNumbers(model.journal()));
+    EXPECT_EQ(valuesOf(source), model.values());
+}
 
 }  // namespace velkor::testing
