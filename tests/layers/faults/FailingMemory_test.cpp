@@ -111,7 +111,7 @@ TEST_P(FailingMemory, GivesAllOfTheHistoryOrNothing) {
                        [&] { EXPECT_EQ(history.size(), 2U); });
 }
 
-TEST_P(FailingMemory, LeavesTheFileAsItIsWhileOpening) {
+TEST_P(FailingMemory, OpensOrLeavesTheFileAsItIs) {
     {
         const auto source = open();
         source->set("key", 1);
@@ -125,7 +125,7 @@ TEST_P(FailingMemory, LeavesTheFileAsItIsWhileOpening) {
     failEachAllocation([&] { source = open(); },
                        [&] {
                            source->committed().get();
-                           EXPECT_EQ(valuesOf(*source), model.values());
+                           EXPECT_EQ(textOf(source->get("key")), "int 1");
                            source.reset();
                        });
     expectFileToHold(*open(), model);
@@ -134,36 +134,41 @@ TEST_P(FailingMemory, LeavesTheFileAsItIsWhileOpening) {
 /// Of the thread of a source.
 class FailingMemoryOfItsThread : public FailingMemory {
 protected:
-    /// Runs `write(n)` with the n-th allocation of the thread failing, until it needs no more of
-    /// them. Expects that the source holds what is on the disk, all that was acknowledged among it.
-    template <class Write>
-    void expectTableAndFileToAgree(Write write) {
-        std::shared_ptr<SqliteSource> source = open();
+    ~FailingMemoryOfItsThread() override { source.reset(); }
+
+    /// Runs `prepare` and `write(n)`, the n-th allocation of the thread failing from in between,
+    /// until it needs no more of them. Expects that the source holds what is on the disk, all that
+    /// was acknowledged among it.
+    template <class Prepare, class Write>
+    void expectTableAndFileToAgree(Prepare prepare, Write write) {
         bool hasFailed = true;
         for (int number = 0; hasFailed && !HasFailure(); ++number) {
             SCOPED_TRACE(number);
-            hasFailed = failOne(*source, number, write);
+            prepare();
+            hasFailed = failOne(number, write);
         }
         EXPECT_TRUE(source->committed().get());
         const auto values = valuesOf(*source);
         source.reset();
         source = open();
         EXPECT_EQ(valuesOf(*source), values);
-        EXPECT_EQ(replayed(*source), values);
+        EXPECT_EQ(replayed(), values);
         source->set("later", 1);
         EXPECT_TRUE(source->committed().get());
     }
 
+    std::shared_ptr<SqliteSource> source = open();
+
 private:
     /// Says whether the allocation was reached.
     template <class Write>
-    bool failOne(SqliteSource& source, int number, Write write) {
+    bool failOne(int number, Write write) {
         Latch answered;
         bool isAcknowledged = false;
         auto failure = std::make_unique<AllocationFailureElsewhere>(
             static_cast<std::size_t>(number), GetParam());
-        write(source, number);
-        const auto told = source.committed().then([&](Future<bool>&& answer) {
+        write(number);
+        const auto told = source->committed().then([&](Future<bool>&& answer) {
             isAcknowledged = succeeds(answer);
             answered.countDown();
             return true;
@@ -172,7 +177,9 @@ private:
         const bool hasFailed = failure->hasHappened();
         failure.reset();
         EXPECT_TRUE(answered.wait());
-        if (isAcknowledged) EXPECT_EQ(valuesOf(source), replayed(source));
+        if (isAcknowledged) {
+            EXPECT_EQ(valuesOf(*source), replayed());
+        }
         return hasFailed;
     }
 
@@ -185,9 +192,9 @@ private:
     }
 
     /// The values that the journal leads to. Its entries agree with each other.
-    static testing::SpelledValues replayed(SqliteSource& source) {
+    testing::SpelledValues replayed() {
         testing::SpelledValues values;
-        auto journal = source.history("", 10'000);
+        auto journal = source->history("", 10'000);
         std::reverse(journal.begin(), journal.end());
         for (const JournalEntry& entry : journal) {
             const auto present = values.find(entry.key);
@@ -204,20 +211,33 @@ private:
 };
 
 TEST_P(FailingMemoryOfItsThread, SetsOrKeepsTheOldValue) {
-    expectTableAndFileToAgree([](SqliteSource& source, int number) {
-        source.set("new" + std::to_string(number), number);
-        source.set("old", std::string(100, 'x'));
-    });
+    expectTableAndFileToAgree([] {},
+                              [&](int number) {
+                                  source->set("new" + std::to_string(number), number);
+                                  source->set("old", std::string(100, 'x'));
+                              });
 }
 
 TEST_P(FailingMemoryOfItsThread, UnsetsOrKeepsTheOldValue) {
-    expectTableAndFileToAgree([](SqliteSource& source, int number) {
-        source.set("key", number);
-        source.unset("key");
-        source.setFor("temporary", number, lifetime);
-        source.unset("temporary");
-        source.set("last", std::string(100, 'x'));
-    });
+    expectTableAndFileToAgree(
+        [&] {
+            source->set("key", 1);
+            source->setFor("temporary", 1, lifetime);
+            EXPECT_TRUE(source->committed().get());
+        },
+        [&](int number) {
+            source->unset("key");
+            source->unset("temporary");
+            source->setFor("temporary", number, lifetime);
+        });
+}
+
+TEST_P(FailingMemoryOfItsThread, BeginsWithoutMemory) {
+    expectTableAndFileToAgree([&] { source.reset(); },
+                              [&](int number) {
+                                  source = open();
+                                  source->set("key", number);
+                              });
 }
 
 std::string nameOf(const ::testing::TestParamInfo<Shortage>& info) {
