@@ -73,14 +73,15 @@ private:
     /// A few writes, then their acknowledgement. Now and then the first of them stands still at the
     /// disk until the others have been made, which are one batch then.
     void writeGroup(SqliteSource& source, Random& random) {
-        RandomWrites writes(random, model);
-        if (below(4, random) == 0) writes.undo(source);
+        RandomWrites writes(random, &source, model);
         if (below(2, random) == 0) {
             state.disk().hold();
-            if (writes.write(source, state.clock.now())) state.disk().waitUntilHolding();
-        }
-        for (std::size_t count = below(5, random); count > 0; --count) {
-            writes.write(source, state.clock.now());
+            if (writes.write(state.clock.now())) state.disk().waitUntilHolding();
+            for (std::size_t count = below(5, random); count > 0; --count) {
+                writes.write(state.clock.now());
+            }
+        } else {
+            writes.writeSome(state.clock.now());
         }
         state.disk().letGo();
         source.committed().get();

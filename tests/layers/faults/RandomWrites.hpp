@@ -1,7 +1,9 @@
 #pragma once
 
+#include <algorithm>
 #include <chrono>
 #include <cstddef>
+#include <string>
 
 #include "layers/sqlite/SqliteSource.hpp"
 #include "tests/layers/faults/RandomValues.hpp"
@@ -15,41 +17,49 @@ public:
     /// How long values live that don't stay for good.
     static constexpr std::chrono::hours lifetime{1};
 
-    RandomWrites(Random& generator, StateModel& expected)
-        : random(generator), values(generator), model(expected) {}
+    /// Without a source they are made in the model only. Refers to all.
+    RandomWrites(Random& generator, layers::SqliteSource* written, StateModel& expected)
+        : random(generator), values(generator), source(written), model(expected) {}
 
     /// A write that needs nothing from the disk: sets a key, for good or not, or unsets one. Says
     /// whether there was something to do.
-    bool write(layers::SqliteSource& source, StateModel::Time now) {
+    bool write(HandClock::Time now) {
         const std::string key = values.key();
         const std::size_t kind = below(8, random);
         if (kind == 0) {
-            source.unset(key);
+            if (source != nullptr) source->unset(key);
             return model.unset(key);
         }
         const auto value = values.value();
         if (kind == 1) {
-            source.setFor(key, value, lifetime);
+            if (source != nullptr) source->setFor(key, value, lifetime);
             model.set(key, value, now + lifetime);
         } else {
-            source.set(key, value);
+            if (source != nullptr) source->set(key, value);
             model.set(key, value);
         }
         return true;
     }
 
     /// Undoes one of the last changes, if there is one. Throws what `SqliteSource::undo` does.
-    void undo(layers::SqliteSource& source) {
+    void undo() {
         if (model.size() == 0) return;
-        const std::size_t place =
-            model.size() - 1 - below(std::min<std::size_t>(model.size(), 5), random);
-        source.undo(model.change(place));
+        const std::size_t lately = std::min<std::size_t>(model.size(), 5);
+        const std::size_t place = model.size() - 1 - below(lately, random);
+        if (source != nullptr) source->undo(model.change(place));
         model.undo(place);
+    }
+
+    /// A few of both.
+    void writeSome(HandClock::Time now) {
+        if (below(4, random) == 0) undo();
+        for (std::size_t count = below(5, random); count > 0; --count) write(now);
     }
 
 private:
     Random& random;
     RandomValues values;
+    layers::SqliteSource* const source;
     StateModel& model;
 };
 

@@ -40,7 +40,14 @@ public:
     using Action = layers::JournalAction;
     using Time = HandClock::Time;
 
-    explicit StateModel(std::string writer) : author(std::move(writer)) {}
+    /// One that holds what its author has written by now: all of a journal, newest first.
+    explicit StateModel(std::string writer, const std::vector<layers::JournalEntry>& written = {})
+        : author(std::move(writer)) {
+        for (auto entry = written.rbegin(); entry != written.rend(); ++entry) {
+            notes.push_back({*entry, {}});
+            hold(notes.size() - 1);
+        }
+    }
 
     void set(const std::string& key, const Value& value, std::optional<Time> expires = {}) {
         note(Action::set, key, value, expires);
