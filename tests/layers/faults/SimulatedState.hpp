@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <memory>
 #include <string>
 
@@ -16,8 +17,9 @@ public:
     static constexpr const char* author = "somebody";
 
     /// Throws as `SqliteSource::open`.
-    std::shared_ptr<layers::SqliteSource> open() {
-        layers::SqliteOptions options;
+    std::shared_ptr<layers::SqliteSource> open(std::size_t keepCount = 10'000) {
+        SqliteOptions options;
+        options.keepCount = keepCount;
         options.author = author;
         options.vfs = vfs.name();
         options.clock = clock.function();

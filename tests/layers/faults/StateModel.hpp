@@ -87,6 +87,19 @@ public:
         return texts;
     }
 
+    /// What `SqliteSource::history` gives while the journal keeps the last `kept` entries.
+    std::vector<std::string> history(const std::string& keyOrPrefix, std::size_t limit,
+                                     std::size_t kept) const {
+        const bool isPrefix = keyOrPrefix.empty() || keyOrPrefix.back() == '.';
+        std::vector<std::string> texts;
+        for (auto each = notes.rbegin(); each != notes.rend() && kept > 0; ++each, --kept) {
+            const std::string& key = each->entry.key;
+            const bool isMeant = isPrefix ? key.rfind(keyOrPrefix, 0) == 0 : key == keyOrPrefix;
+            if (isMeant && texts.size() < limit) texts.push_back(textOf(each->entry));
+        }
+        return texts;
+    }
+
     SpelledValues values() const {
         SpelledValues spelled;
         for (const auto& [key, place] : held) spelled[key] = textOf(*notes[place].entry.after);
