@@ -46,11 +46,13 @@ std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& pa
     auto shared = std::make_shared<Committer>(path, options, values);
     auto source = std::make_shared<SqliteSource>(Key(), shared, std::move(values));
     source->change([&](ValueTable& table) { return shared->expire(table); });
-    const auto changeTable = [weak = std::weak_ptr(source)](const Committer::Mutation& mutation) {
-        const auto alive = weak.lock();
-        if (alive) alive->change(mutation);
-        return alive != nullptr;
-    };
+    // Made here, since the thread has nobody to tell when it lacks the memory.
+    const Committer::ChangeTable changeTable =
+        [weak = std::weak_ptr(source)](const Committer::Mutation& mutation) {
+            const auto alive = weak.lock();
+            if (alive) alive->change(mutation);
+            return alive != nullptr;
+        };
     try {
         const SignalsBlocked blocked;
         source->thread.emplace([shared, changeTable] { shared->run(changeTable); });

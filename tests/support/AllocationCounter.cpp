@@ -1,7 +1,9 @@
 #include "tests/support/AllocationCounter.hpp"
 
+#include <atomic>
 #include <cstdlib>
 #include <limits>
+#include <mutex>
 #include <new>
 
 namespace velkor::testing {
@@ -16,8 +18,33 @@ thread_local std::size_t successesLeft = never;
 thread_local Shortage kind = Shortage::once;
 thread_local bool hasFailed = false;
 
+/// The shortage of all threads but one.
+struct ShortageElsewhere {
+    std::atomic<bool> isOn{false};
+    std::mutex mutex;  // guards all below
+    std::size_t successesLeft = never;
+    Shortage kind = Shortage::once;
+    bool hasFailed = false;
+};
+
+ShortageElsewhere elsewhere;
+thread_local bool isExempt = false;
+
+void countAllocationElsewhere() {
+    const std::lock_guard<std::mutex> lock(elsewhere.mutex);
+    if (elsewhere.successesLeft == never) return;
+    if (elsewhere.successesLeft > 0) {
+        --elsewhere.successesLeft;
+        return;
+    }
+    elsewhere.hasFailed = true;
+    if (elsewhere.kind == Shortage::once) elsewhere.successesLeft = never;
+    throw std::bad_alloc();
+}
+
 void countAllocation() {
     ++allocations;
+    if (elsewhere.isOn && !isExempt) countAllocationElsewhere();
     if (successesLeft == never) return;
     if (successesLeft > 0) {
         --successesLeft;
@@ -62,6 +89,28 @@ AllocationFailure::~AllocationFailure() {
 
 bool AllocationFailure::hasHappened() const noexcept {
     return hasFailed;
+}
+
+AllocationFailureElsewhere::AllocationFailureElsewhere(std::size_t successes,
+                                                       Shortage shortage) noexcept {
+    const std::lock_guard<std::mutex> lock(elsewhere.mutex);
+    elsewhere.successesLeft = successes;
+    elsewhere.kind = shortage;
+    elsewhere.hasFailed = false;
+    isExempt = true;
+    elsewhere.isOn = true;
+}
+
+AllocationFailureElsewhere::~AllocationFailureElsewhere() {
+    const std::lock_guard<std::mutex> lock(elsewhere.mutex);
+    elsewhere.successesLeft = never;
+    elsewhere.isOn = false;
+    isExempt = false;
+}
+
+bool AllocationFailureElsewhere::hasHappened() const noexcept {
+    const std::lock_guard<std::mutex> lock(elsewhere.mutex);
+    return elsewhere.hasFailed;
 }
 
 }  // namespace velkor::testing

@@ -42,4 +42,18 @@ public:
     bool hasHappened() const noexcept;
 };
 
+/// `AllocationFailure` for all threads but the one that makes it. One at a time.
+class AllocationFailureElsewhere {
+public:
+    explicit AllocationFailureElsewhere(std::size_t successes,
+                                        Shortage shortage = Shortage::once) noexcept;
+    ~AllocationFailureElsewhere();
+
+    AllocationFailureElsewhere(const AllocationFailureElsewhere&) = delete;
+    AllocationFailureElsewhere& operator=(const AllocationFailureElsewhere&) = delete;
+
+    /// Whether the allocation that was to fail first has been reached.
+    bool hasHappened() const noexcept;
+};
+
 }  // namespace velkor::testing

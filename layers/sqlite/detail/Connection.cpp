@@ -46,20 +46,38 @@ void Connection::fail() const {
     throw std::runtime_error(cause);
 }
 
+void Connection::writeOverRefused() noexcept {
+    try {
+        execute("PRAGMA user_version = " + std::to_string(number("PRAGMA user_version")));
+    } catch (const std::exception&) {
+        return;  // the next transaction does it
+    }
+}
+
 Transaction::Transaction(Connection& changed) : connection(changed) {
     connection.execute("BEGIN IMMEDIATE");
 }
 
 Transaction::~Transaction() {
-    // Some failures have taken all back already. Where this fails, the next one can't begin, and
-    // says why.
-    if (connection.inTransaction()) {
-        sqlite3_exec(connection.handle(), "ROLLBACK", nullptr, nullptr, nullptr);
-    }
+    takeBack();
 }
 
 void Transaction::commit() {
-    connection.execute("COMMIT");
+    try {
+        connection.execute("COMMIT");
+    } catch (...) {
+        takeBack();
+        connection.writeOverRefused();
+        throw;
+    }
+}
+
+// Some failures have taken all back already. Where this fails, the next one can't begin, and says
+// why.
+void Transaction::takeBack() noexcept {
+    if (connection.inTransaction()) {
+        sqlite3_exec(connection.handle(), "ROLLBACK", nullptr, nullptr, nullptr);
+    }
 }
 
 }  // namespace velkor::layers::detail

@@ -27,6 +27,11 @@ public:
     /// As above, as text.
     std::string text(const std::string& sql);
 
+    /// Writes over what a commit that failed has left in the log. When it was the sync that failed,
+    /// the log holds all of it, and whoever opened the file next would take it for done. Changes
+    /// nothing, and takes its chance if the disk goes on failing.
+    void writeOverRefused() noexcept;
+
     /// Whether a transaction is open.
     bool inTransaction() const noexcept { return sqlite3_get_autocommit(native.get()) == 0; }
 
@@ -53,10 +58,13 @@ public:
     Transaction(const Transaction&) = delete;
     Transaction& operator=(const Transaction&) = delete;
 
-    /// Returns when all of it is on the disk. Throws `std::runtime_error` with the cause.
+    /// Returns when all of it is on the disk. Throws `std::runtime_error` with the cause, and all is
+    /// taken back then.
     void commit();
 
 private:
+    void takeBack() noexcept;
+
     Connection& connection;
 };
 

@@ -1,0 +1,121 @@
+#include <gtest/gtest.h>
+
+#include <cstddef>
+#include <memory>
+#include <optional>
+#include <stdexcept>
+#include <string>
+
+#include "tests/layers/faults/RandomWrites.hpp"
+#include "tests/layers/faults/SimulatedState.hpp"
+#include "tests/layers/faults/StateModel.hpp"
+
+namespace velkor::layers {
+namespace {
+
+using velkor::testing::below;
+using velkor::testing::journalOf;
+using velkor::testing::Random;
+using velkor::testing::RandomWrites;
+using velkor::testing::SimulatedState;
+using velkor::testing::StateModel;
+using velkor::testing::valuesOf;
+
+/// How a life of the writer ends.
+enum class End { powerCut, kill };
+
+/// A source whose writer dies again and again, and what its file is to hold by then.
+class MortalSource {
+public:
+    /// One life, up to its end at any access to the disk. First looks at what the one before left.
+    void live(std::uint64_t seed, End end) {
+        Random random(seed);
+        state.disk().cutPowerAfter(below(100, random));
+        try {
+            const auto source = state.open();
+            look(*source);
+            while (state.disk().hasPower() && below(30, random) > 0) writeGroup(*source, random);
+        } catch (const std::runtime_error& error) {
+            EXPECT_FALSE(state.disk().hasPower()) << error.what();
+        }
+        if (end == End::kill) {
+            state.disk().restartAfterKill();
+        } else {
+            state.disk().restartAfterPowerCut(random);
+        }
+        if (below(3, random) == 0) state.clock.advance(2 * RandomWrites::lifetime);
+    }
+
+    /// Looks at what the last life left.
+    void look() { look(*state.open()); }
+
+private:
+    /// All that was acknowledged is there, and what follows it up to some write, with what has
+    /// expired meanwhile. The values are those that the journal leads to.
+    void look(SqliteSource& source) {
+        source.committed().get();
+        const auto journal = journalOf(source);
+        const auto values = valuesOf(source);
+        for (std::size_t kept = model.size() + 1; kept-- > acknowledged;) {
+            StateModel left = model;
+            left.keep(kept);
+            left.expire(state.clock.now());
+            if (left.journal() != journal) continue;
+            EXPECT_EQ(values, left.values());
+            model = left;
+            acknowledged = model.size();
+            return;
+        }
+        ADD_FAILURE() << "of " << model.size() << " writes, " << acknowledged
+                      << " acknowledged, the journal holds " << ::testing::PrintToString(journal);
+    }
+
+    /// A few writes, then their acknowledgement. Now and then the first of them stands still at the
+    /// disk until the others have been made, which are one batch then.
+    void writeGroup(SqliteSource& source, Random& random) {
+        RandomWrites writes(random, &source, model);
+        if (below(2, random) == 0) {
+            state.disk().hold();
+            if (writes.write(state.clock.now())) state.disk().waitUntilHolding();
+            for (std::size_t count = below(5, random); count > 0; --count) {
+                writes.write(state.clock.now());
+            }
+        } else {
+            writes.writeSome(state.clock.now());
+        }
+        state.disk().letGo();
+        source.committed().get();
+        acknowledged = model.size();
+    }
+
+    SimulatedState state;
+    StateModel model{SimulatedState::author};
+    std::size_t acknowledged = 0;
+};
+
+constexpr std::uint64_t livesOfOneFile = 25;
+
+/// Lives until `lives` have ended, `endOf(seed)` each. Begins with a new file now and then.
+template <class EndOf>
+void expectToSurvive(std::uint64_t lives, EndOf endOf) {
+    std::optional<MortalSource> source;
+    for (std::uint64_t seed = 0; seed < lives; ++seed) {
+        SCOPED_TRACE("seed " + std::to_string(seed));
+        if (seed % livesOfOneFile == 0) source.emplace();
+        source->live(seed, endOf(seed));
+        if (seed % livesOfOneFile == livesOfOneFile - 1) source->look();
+        if (::testing::Test::HasFailure()) return;
+    }
+}
+
+TEST(PowerCut, LeavesEveryAcknowledgedWriteAndNothingByHalves) {
+    expectToSurvive(1500, [](std::uint64_t) { return End::powerCut; });
+}
+
+TEST(PowerCut, LeavesWhatWasAcknowledgedAmidOtherDeathsOfTheWriter) {
+    expectToSurvive(500,
+                    [](std::uint64_t seed) { return seed % 4 == 0 ? End::powerCut : End::kill; });
+}
+
+}  // namespace
+}  // namespace velkor::layers
