@@ -4,7 +4,9 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <optional>
+#include <set>
 #include <utility>
 
 #include "configuration/admin/TypedText.hpp"
@@ -13,6 +15,7 @@
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Conversion.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -64,23 +67,31 @@ std::optional<std::string> optionBehind(std::size_t least, std::size_t most,
     return std::nullopt;
 }
 
+std::set<std::string> secretKeys(SessionStore& store) {
+    return settings::secretKeys(
+        std::static_pointer_cast<configuration::ConfigurationImpl>(store.getPtr()));
+}
+
 std::string effectiveText(SessionStore& store, const std::string& key) {
     const auto options = store.explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
-    return optionText(key, options.front().value) + " (" + options.front().source + ")";
+    const bool isSecret = secretKeys(store).count(key) != 0;
+    return optionText(key, options.front().value, isSecret) + " (" + options.front().source + ")";
 }
 
-std::string valueCell(const std::optional<ConfigurationValue>& value) {
-    return value ? valueText(*value) : "-";
+std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSecret) {
+    return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(const std::vector<StateChange>& changes) {
+std::string historyTable(SessionStore& store, const std::vector<StateChange>& changes) {
+    const auto secrets = secretKeys(store);
     std::vector<std::vector<std::string>> rows{
         {"CHANGE", "TIME", "WHO", "KEY", "ACTION", "BEFORE", "AFTER"}};
     for (const auto& change : changes) {
+        const bool isSecret = secrets.count(change.key) != 0;
         rows.push_back({std::to_string(change.number), timeText(change.when), change.author,
-                        change.key, change.action, valueCell(change.before),
-                        valueCell(change.after)});
+                        change.key, change.action, valueCell(change.before, isSecret),
+                        valueCell(change.after, isSecret)});
     }
     return formatTable(rows);
 }
@@ -114,8 +125,8 @@ std::string showHistory(SessionStore& store, const Arguments& arguments) {
     const auto limit =
         optionBehind(0, 1, arguments, "--limit", "What follows KEY is no --limit N.");
     const bool hasKey = arguments.size() == (limit ? 3 : 1);
-    return historyTable(stateOf(store).history(hasKey ? arguments.front() : "",
-                                               limit ? parseLimit(*limit) : usualLimit));
+    return historyTable(store, stateOf(store).history(hasKey ? arguments.front() : "",
+                                                      limit ? parseLimit(*limit) : usualLimit));
 }
 
 std::string undoChange(SessionStore& store, const Arguments& arguments) {
@@ -126,7 +137,7 @@ std::string undoChange(SessionStore& store, const Arguments& arguments) {
         if (!number) throw CommandError("N is no number of a change: " + arguments.front());
     }
     store.noteWrite();
-    return historyTable({state.undo(number)});
+    return historyTable(store, {state.undo(number)});
 }
 
 }  // namespace velkor::host

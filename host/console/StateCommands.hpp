@@ -17,12 +17,13 @@ namespace velkor::host {
 std::string putValue(SessionStore& store, const std::vector<std::string>& arguments);
 
 /// KEY: takes the key out of the source that `set` would write it to, and gives what is effective
-/// then: "KEY = VALUE (SOURCE)" or "No configuration option with key: KEY". Throws `CommandError`
-/// "Nothing to unset: " with that text when the key was not there.
+/// then, ••• for a secret: "KEY = VALUE (SOURCE)" or "No configuration option with key: KEY".
+/// Throws `CommandError` "Nothing to unset: " with that text when the key was not there.
 std::string unsetKey(SessionStore& store, const std::vector<std::string>& arguments);
 
 /// [KEY] [--limit N]: a table of the newest changes of the layer that lasts, the newest first, of
-/// KEY, of all keys that KEY with a "." at its end begins, or of all; at most N, or 20.
+/// KEY, of all keys that KEY with a "." at its end begins, or of all; at most N, or 20. It shows
+/// ••• for the values of secret keys.
 ///
 /// Throws `CommandError` "--limit N: a number from 1 on is needed", "What follows KEY is no --limit
 /// N." and, when there is no such layer, "Nothing lasts in this session; start it with --state FILE

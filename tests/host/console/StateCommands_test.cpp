@@ -11,6 +11,7 @@
 
 #include "host/console/Command.hpp"
 #include "host/console/ValueText.hpp"
+#include "settings/Setting.hpp"
 #include "tests/host/state/FakeState.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -169,6 +170,21 @@ TEST_F(StateCommandsTest, HistoryRefusesWhatIsNoLimitBehindTheKey) {
     for (const Words& arguments : {Words{"a", "--limit"}, Words{"a", "b"}, Words{"a", "b", "c"}}) {
         EXPECT_EQ(refusal(showHistory, arguments), "What follows KEY is no --limit N.");
     }
+}
+
+TEST_F(StateCommandsTest, HistoryShowsNoSecret) {
+    const settings::Setting<std::string> token(store, "token", "t", settings::secret());
+    state->changes = {{1, {}, "ann", "set", "token", std::string("old"), std::string("new")}};
+    EXPECT_EQ(showHistory(*store, {}),
+              "CHANGE  TIME                  WHO  KEY    ACTION  BEFORE  AFTER\n"
+              "1       1970-01-01T00:00:00Z  ann  token  set     •••     •••\n");
+}
+
+TEST_F(StateCommandsTest, UnsetShowsNoSecret) {
+    const settings::Setting<std::string> token(store, "token", "t", settings::secret());
+    store->set("token", "low", "default");
+    store->set("token", "high");
+    EXPECT_EQ(unsetKey(*store, {"token"}), "token = ••• (default)");
 }
 
 TEST_F(StateCommandsTest, UndoShowsTheChangeThatItMakes) {
