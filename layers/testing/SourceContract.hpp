@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <exception>
 #include <memory>
 #include <string>
 #include <type_traits>
@@ -30,9 +31,14 @@ protected:
     static void expect(void (*rule)(const detail::MakeSubject&)) {
         // Rules wait for one thing that doesn't come, and end.
         const auto limit = 4 * Subject().patience();
-        auto ended = detail::onOwnThread([rule] { rule(std::make_shared<Subject>); });
+        const auto ended = detail::onOwnThread([rule] {
+            try {
+                rule(std::make_shared<Subject>);
+            } catch (const std::exception& error) {
+                ADD_FAILURE() << "An exception was thrown: " << error.what();
+            }
+        });
         ASSERT_TRUE(detail::comes(ended, limit)) << "A call of the source doesn't return.";
-        ended.get();
     }
 };
 

@@ -113,15 +113,13 @@ inline void listenerCanBeReplaced(const MakeSubject& makeSubject) {
 inline ::testing::AssertionResult takesItsListenerBack(Trial& trial, Way way,
                                                        const SampleValues& value) {
     const auto former = trial.listen();
-    const bool isTold = trial.finish(way, "contract.first", value[1], *former);
+    if (auto told = trial.finish(way, "contract.first", value[1], *former); !told) return told;
     const auto calls = former->all();
     trial.source()->setChangeListener({});
     trial.begin(way, "contract.second", value[2]);
     // By the time of this change the one before has been made.
     const auto latter = trial.listen();
-    if (!isTold || !trial.finish(way, "contract.third", value[3], *latter)) {
-        return ::testing::AssertionFailure() << "A listener that was there was not called.";
-    }
+    if (auto told = trial.finish(way, "contract.third", value[3], *latter); !told) return told;
     if (former->all() == calls) return ::testing::AssertionSuccess();
     return ::testing::AssertionFailure() << "The listener that was taken back was called.";
 }

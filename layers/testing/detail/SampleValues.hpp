@@ -2,13 +2,16 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <boost/variant/apply_visitor.hpp>
+#include <boost/variant/get.hpp>
 #include <cmath>
 #include <cstddef>
 #include <limits>
 #include <stdexcept>
 #include <string>
 #include <type_traits>
+#include <utility>
 #include <vector>
 
 #include "configuration/ConfigurationValue.hpp"
@@ -31,6 +34,11 @@ bool isExactly(const T& actual, const T& expected) {
 inline bool isExactly(double actual, double expected) {
     if (std::isnan(expected)) return std::isnan(actual);
     return actual == expected && std::signbit(actual) == std::signbit(expected);
+}
+
+inline bool isExactly(const std::vector<double>& actual, const std::vector<double>& expected) {
+    const auto same = [](double one, double other) { return isExactly(one, other); };
+    return std::equal(actual.begin(), actual.end(), expected.begin(), expected.end(), same);
 }
 
 /// Whether `actual` is `expected`: of the same kind and with the same bits, but that one NaN is as

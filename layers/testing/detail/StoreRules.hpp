@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstddef>
 #include <memory>
 #include <optional>
 #include <string>
@@ -58,7 +59,9 @@ struct RegisteredTrial {
 
 inline void watcherEndsOnTheLastValue(const MakeSubject& makeSubject) {
     const SampleValues value(*makeSubject());
-    for (const Way way : RegisteredTrial(makeSubject, value).trial.ways()) {
+    const auto ways = RegisteredTrial(makeSubject, value).trial.ways();
+    if (ways.empty()) GTEST_SKIP() << "It never changes.";
+    for (const Way way : ways) {
         SCOPED_TRACE(way);
         RegisteredTrial registered(makeSubject, value);
         ASSERT_TRUE(registered.arrivesAt(value[0]));
@@ -78,18 +81,28 @@ inline void watcherEndsOnTheLastValue(const MakeSubject& makeSubject) {
 inline void removedSourceCanBeAddedAgain(const MakeSubject& makeSubject) {
     const SampleValues value(*makeSubject());
     RegisteredTrial registered(makeSubject, value);
+    ASSERT_TRUE(registered.arrivesAt(value[0]));
+    const auto seenBefore = registered.seen->all().size();
     registered.store->removeSource("trial").get();
     EXPECT_FALSE(registered.store->has(registered.key).get());
-    registered.store->set(registered.key, value[1], "default").get();
-    ASSERT_TRUE(registered.arrivesAt(value[1]));
+    std::size_t last = 0;
+    for (const Way way : registered.trial.ways()) {
+        registered.trial.begin(way, "contract.key", value[++last]);
+    }
+    const ConfigurationValue ofAnotherLayer = std::string("of another layer");
+    registered.store->set(registered.key, ofAnotherLayer, "default").get();
+    ASSERT_TRUE(registered.arrivesAt(ofAnotherLayer));
+    const auto seen = registered.seen->all();
+    for (std::size_t i = seenBefore; i < seen.size(); ++i) {
+        EXPECT_TRUE(isSame(seen[i], ofAnotherLayer)) << "after the source was removed";
+    }
 
     registered.add();
-    ASSERT_TRUE(registered.arrivesAt(value[0]));
+    ASSERT_TRUE(registered.arrivesAt(value[last])) << "what became of it meanwhile";
     for (const Way way : registered.trial.ways()) {
         SCOPED_TRACE(way);
-        const auto& next = way == Way::written ? value[2] : value[3];
-        registered.begin(way, next);
-        EXPECT_TRUE(registered.arrivesAt(next));
+        registered.begin(way, value[++last]);
+        EXPECT_TRUE(registered.arrivesAt(value[last]));
     }
 }
 

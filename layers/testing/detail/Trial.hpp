@@ -1,5 +1,7 @@
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <algorithm>
 #include <chrono>
 #include <cstddef>
@@ -103,17 +105,19 @@ public:
         }
     }
 
-    /// As above, and waits until a source that changes by itself has told `told` of `key` again;
-    /// gives whether it has.
-    [[nodiscard]] bool finish(Way way, const std::string& key,
-                              const std::optional<ConfigurationValue>& value,
-                              Noted<std::string>& told) {
+    /// As above, and waits until a source that changes by itself has told `told` of `key` again.
+    /// Fails when it hasn't.
+    ::testing::AssertionResult finish(Way way, const std::string& key,
+                                      const std::optional<ConfigurationValue>& value,
+                                      Noted<std::string>& told) {
         const auto former = static_cast<std::ptrdiff_t>(told.all().size());
         begin(way, key, value);
-        if (way == Way::written) return true;
-        return told.becomes(patience(), [&](const std::vector<std::string>& keys) {
+        if (way == Way::written) return ::testing::AssertionSuccess();
+        const auto isToldAgain = [&](const std::vector<std::string>& keys) {
             return std::find(keys.begin() + former, keys.end(), key) != keys.end();
-        });
+        };
+        if (told.becomes(patience(), isToldAgain)) return ::testing::AssertionSuccess();
+        return ::testing::AssertionFailure() << "The listener was not told of " << key << ".";
     }
 
     /// Installs a listener that notes the keys that it is told.

@@ -204,6 +204,10 @@ VELKOR_SOURCE_CONTRACT(WaitsForItself, WrongWhenItChanges<WaitsForItself>);
 class TellsOfOtherKeysOnly : public RightSource {
 public:
     using RightSource::RightSource;
+    void setChangeListener(ChangeListener newListener) override {
+        lastTold.clear();
+        RightSource::setChangeListener(std::move(newListener));
+    }
     void tell(const std::string& key) override {
         if (std::exchange(lastTold, key) != key) RightSource::tell(key);
     }
