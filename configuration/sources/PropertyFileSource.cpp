@@ -30,22 +30,7 @@ std::string readAll(std::istream& file) {
     return text;
 }
 
-ValueMap readProperties(const std::u16string& path) {
-    common::WidePathInputFileStream file(path);
-    if (!file) {
-        throw std::runtime_error(store_errors::fileNotOpened +
-                                 common::TextConversion("UTF-8").fromUtf16(path));
-    }
-    // A stream begins with the host's locale, which may convert what is read.
-    file.imbue(std::locale::classic());
-    const std::string text = readAll(file);
-    return parseProperties(PropertyText{text});
-}
-
-}  // namespace
-
-ValueMap parseProperties(PropertyText file) {
-    const std::string_view text = file.content;
+ValueMap parseProperties(std::string_view text) {
     ValueMap properties;
     // A table that need not grow is filled half again as fast. Most lines hold one property; the
     // limit keeps a file of nothing but line breaks from taking more memory than its own size.
@@ -57,11 +42,24 @@ ValueMap parseProperties(PropertyText file) {
     return properties;
 }
 
+ValueMap readProperties(const std::u16string& path) {
+    common::WidePathInputFileStream file(path);
+    if (!file) {
+        throw std::runtime_error(store_errors::fileNotOpened +
+                                 common::TextConversion("UTF-8").fromUtf16(path));
+    }
+    // A stream begins with the host's locale, which may convert what is read.
+    file.imbue(std::locale::classic());
+    return parseProperties(readAll(file));
+}
+
+}  // namespace
+
 PropertyFileSource::PropertyFileSource(const std::u16string& path)
     : TableSource(typeid(PropertyFileSource), readProperties(path), Origin::thisLibrary) {}
 
 PropertyFileSource::PropertyFileSource(PropertyText text)
-    : TableSource(typeid(PropertyFileSource), parseProperties(text), Origin::thisLibrary) {}
+    : TableSource(typeid(PropertyFileSource), parseProperties(text.content), Origin::thisLibrary) {}
 
 ConfigurationValue PropertyFileSource::set(const std::string&, ConfigurationValue) {
     throw std::runtime_error(store_errors::writingNotSupported);
