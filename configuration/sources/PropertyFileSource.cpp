@@ -42,16 +42,6 @@ TextTable readProperties(const std::u16string& path) {
 
 }  // namespace
 
-ValueMap parseProperties(PropertyText text) {
-    const TextTable properties = PropertyFileParser(std::string(text.content)).parse();
-    ValueMap values;
-    values.reserve(properties.size());
-    properties.forEach([&](std::string_view key, std::string_view value) {
-        values.emplace(key, std::string(value));
-    });
-    return values;
-}
-
 PropertyFileSource::PropertyFileSource(const std::u16string& path)
     : properties(readProperties(path)) {}
 

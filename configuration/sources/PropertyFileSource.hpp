@@ -16,9 +16,6 @@ struct PropertyText {
     std::string_view content;
 };
 
-/// The properties of `text`, all of them narrow text, for a source that reads files its own way.
-VELKOR_EXPORT ValueMap parseProperties(PropertyText text);
-
 /// A read-only layer that holds the properties of one file. The file is read once, in the
 /// constructor; later changes to it are not seen. Every value is narrow text (`std::string`), byte
 /// for byte as in the file after escapes. Made by `std::make_shared`. The store looks keys up in

@@ -41,19 +41,6 @@ public:
     /// The value of `key`; `std::out_of_range` "_Map_base::at" when there is none.
     std::string_view at(std::string_view key) const;
 
-    /// How many properties were read, those with the same key as a later one included.
-    std::size_t size() const noexcept { return properties.size() - 1; }
-
-    /// Calls `visit(key, value)` once for each key, in no order.
-    template <class Visit>
-    void forEach(Visit visit) const {
-        for (const Slot slot : slots) {
-            if (slot == emptySlot) continue;
-            const Property& property = propertyIn(slot);
-            visit(keyOf(property), valueOf(property));
-        }
-    }
-
     /// All keys, sorted byte by byte.
     std::set<std::string> keys() const;
 

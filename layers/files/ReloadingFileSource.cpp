@@ -18,6 +18,7 @@ namespace velkor::layers {
 using common::Mutex;
 using common::MutexLock;
 using configuration::ConfigurationValue;
+using configuration::PropertyFileSource;
 using configuration::ValueMap;
 using configuration::ValueTable;
 using detail::FileReading;
@@ -30,8 +31,11 @@ constexpr const char* writingNotSupported = "ReloadingFileSource does not suppor
 constexpr const char* noInterval = "A file has to be looked at in intervals.";
 
 ValueMap propertiesOf(const FileReading& reading) {
-    if (!reading.problem.empty()) return {};
-    return configuration::parseProperties(configuration::PropertyText{reading.text});
+    ValueMap properties;
+    if (!reading.problem.empty()) return properties;
+    PropertyFileSource parsed(configuration::PropertyText{reading.text});
+    for (const auto& key : parsed.keys()) properties.emplace(key, parsed.get(key));
+    return properties;
 }
 
 }  // namespace

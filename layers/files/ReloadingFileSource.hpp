@@ -41,7 +41,7 @@ struct FileStatus {
         std::chrono::system_clock::time_point since;
     };
 
-    /// When the values that the source has were read, or the same ones again; nothing if never.
+    /// When the file was read last; nothing if never.
     std::optional<std::chrono::system_clock::time_point> loaded{};
     std::optional<Problem> problem{};
 };

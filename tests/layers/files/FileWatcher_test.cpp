@@ -7,7 +7,6 @@
 #include <functional>
 #include <memory>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "tests/layers/files/FollowingStore.hpp"
@@ -38,17 +37,6 @@ std::ptrdiff_t inotifyCount() {
         if (fs::read_symlink(entry, gone) == "anon_inode:inotify") ++count;
     }
     return count;
-}
-
-// Waits for what must come about.
-template <class Condition>
-bool comesAbout(Condition condition) {
-    const auto end = std::chrono::steady_clock::now() + testing::patience;
-    while (!condition()) {
-        if (std::chrono::steady_clock::now() > end) return false;
-        std::this_thread::yield();
-    }
-    return true;
 }
 
 class FileWatcherTest : public ::testing::Test {

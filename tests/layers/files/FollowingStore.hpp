@@ -9,6 +9,7 @@
 #include <mutex>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
@@ -18,6 +19,17 @@
 #include "tests/support/BoundedWait.hpp"
 
 namespace velkor::layers {
+
+/// Waits for what nobody tells of, and says whether it came about.
+template <class Condition>
+[[nodiscard]] bool comesAbout(Condition condition) {
+    const auto end = std::chrono::steady_clock::now() + testing::patience;
+    while (!condition()) {
+        if (std::chrono::steady_clock::now() > end) return false;
+        std::this_thread::yield();
+    }
+    return true;
+}
 
 /// A store with files that are followed, and all that it tells of.
 class FollowingStore {

@@ -3,6 +3,7 @@
 #include <gmock/gmock.h>
 #include <sys/stat.h>
 
+#include <cerrno>
 #include <filesystem>
 #include <functional>
 #include <memory>
@@ -11,6 +12,7 @@
 #include <vector>
 
 #include "tests/layers/files/FollowingStore.hpp"
+#include "tests/layers/files/SystemHooks.hpp"
 #include "tests/support/LogCapture.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -27,6 +29,8 @@ using ::testing::IsEmpty;
 using testing::LogCapture;
 using ::testing::Not;
 using testing::OpenFile;
+using testing::Refusal;
+using testing::SystemHooks;
 using testing::thrownText;
 using ::testing::UnorderedElementsAre;
 
@@ -422,6 +426,24 @@ TEST_P(UnreadableFile, IsLoggedOnce) {
 
 INSTANTIATE_TEST_SUITE_P(Losses, UnreadableFile, ::testing::ValuesIn(losses),
                          [](const auto& loss) { return loss.param.name; });
+
+TEST_F(ReloadingFileSourceTest, NoticesWhetherItMayReadTheFile) {
+    FileFolder::write(path, "key=1\n");
+    const auto source = following.follow(path);
+    {
+        const Refusal forbidden(SystemHooks::accessRefused, EACCES);
+        ::chmod(path.c_str(), 0);
+        // Nothing else can be read meanwhile either, so no fence.
+        EXPECT_TRUE(comesAbout([&] { return !problemOf(*source).empty(); }));
+        EXPECT_EQ(problemOf(*source),
+                  "Property file could not be opened: " + path.string() + ": Permission denied");
+    }
+
+    ::chmod(path.c_str(), 0600);
+    following.passFence();
+
+    EXPECT_FALSE(source->status().problem);
+}
 
 TEST_F(ReloadingFileSourceTest, SaysSinceWhenSomethingIsWrong) {
     FileFolder::write(path, "key=1\n");

@@ -9,6 +9,7 @@ namespace velkor::testing {
 struct SystemHooks {
     static inline std::atomic<int> inotifyRefused{0};  ///< To `inotify_init1`.
     static inline std::atomic<int> watchRefused{0};    ///< To `inotify_add_watch`.
+    static inline std::atomic<int> accessRefused{0};   ///< To `open` of a file that may be a pipe.
 
     /// Runs before the status of an open file is taken, on the thread that has set it.
     static inline thread_local std::function<void()> beforeStatus;
