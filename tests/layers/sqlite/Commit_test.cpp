@@ -77,6 +77,7 @@ TEST_F(Commit, KeepsNoWriterAndNoReaderWaiting) {
         EXPECT_EQ(textOf(store->get("second").get()), "int 2");
     }));
     letGo();
+    store->removeSource("state");  // which the other thread may hold for a moment longer
 }
 
 TEST_F(Commit, MakesOneTransactionOfAllThatWaits) {
@@ -121,12 +122,12 @@ TEST_F(Commit, AnswersOneByOneInOrder) {
 }
 
 TEST_F(Commit, TakesWhatAStoreChangesTogetherTogether) {
+    Latch synced;
     const auto source = open();
     const auto between = std::make_shared<HookedSource>();
     const auto store = std::make_shared<ConfigurationImpl>();
     store->addSource("state", "", -1, false, source);
     store->addSource("between", "between", -2, false, between);
-    Latch synced;
     disk.beforeSync([&] {
         synced.countDown();
         return SQLITE_OK;
