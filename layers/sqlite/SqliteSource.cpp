@@ -1,6 +1,7 @@
 #include "layers/sqlite/SqliteSource.hpp"
 
 #include <stdexcept>
+#include <system_error>
 #include <utility>
 
 #include <pthread.h>
@@ -18,6 +19,27 @@ using configuration::ValueTable;
 using detail::Committer;
 using detail::PreparedWrite;
 
+namespace {
+
+/// Keeps signals from threads that are started while it lives: they are for those of the program.
+class SignalsBlocked {
+public:
+    SignalsBlocked() {
+        sigset_t all;
+        sigfillset(&all);
+        pthread_sigmask(SIG_SETMASK, &all, &before);
+    }
+    ~SignalsBlocked() { pthread_sigmask(SIG_SETMASK, &before, nullptr); }
+
+    SignalsBlocked(const SignalsBlocked&) = delete;
+    SignalsBlocked& operator=(const SignalsBlocked&) = delete;
+
+private:
+    sigset_t before{};
+};
+
+}  // namespace
+
 std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& path,
                                                  const SqliteOptions& options) {
     ValueMap values;
@@ -29,15 +51,29 @@ std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& pa
         if (alive) alive->change(mutation);
         return alive != nullptr;
     };
-    source->thread.emplace([shared, changeTable] { shared->run(changeTable); });
-    return source;
+    try {
+        const SignalsBlocked blocked;
+        source->thread.emplace([shared, changeTable] { shared->run(changeTable); });
+    } catch (const std::system_error& noThread) {
+        throw std::runtime_error(sqlite_errors::notOpened + path.string() + ": " + noThread.what());
+    }
+    // The last reference of others waits for the thread, which refers to the source itself.
+    return {source.get(), [source](SqliteSource*) mutable {
+                source->finish();
+                source.reset();
+            }};
 }
 
 SqliteSource::SqliteSource(Key, std::shared_ptr<Committer> shared, ValueMap&& initialValues)
     : LiveSource(typeid(SqliteSource), std::move(initialValues)), committer(std::move(shared)) {}
 
 SqliteSource::~SqliteSource() {
+    finish();
+}
+
+void SqliteSource::finish() {
     committer->queue().end();
+    thread.reset();
 }
 
 ConfigurationValue SqliteSource::set(const std::string& key, ConfigurationValue value) {

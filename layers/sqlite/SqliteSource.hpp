@@ -43,9 +43,9 @@ class PreparedWrite;
 /// Thread-safe. What waits for the disk says so; that isn't called with the mutex of the store
 /// held, which includes subscribers: the thread of the source may need it before it goes on.
 ///
-/// The destructor returns when all that was accepted is on the disk, or has been refused; on the
-/// thread of the source, where a subscriber may give up the last reference, it doesn't wait, and
-/// the file is closed soon afterwards.
+/// When the last reference to it is given up, all that was accepted is brought onto the disk, or
+/// has been refused, and the file is closed before that returns. On the thread of the source, where
+/// a subscriber may do it, it returns at once, and the thread does the rest soon afterwards.
 class VELKOR_EXPORT SqliteSource final : public LiveSource,
                                          public configuration::ForgettingSource,
                                          public configuration::DurableSource {
@@ -107,6 +107,7 @@ public:
     JournalEntry undo(std::optional<std::int64_t> change = {});
 
 private:
+    void finish();
     configuration::ConfigurationValue store(detail::PreparedWrite&& write);
 
     const std::shared_ptr<detail::Committer> committer;

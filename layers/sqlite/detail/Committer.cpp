@@ -17,11 +17,18 @@ using configuration::ValueTable;
 
 namespace {
 
-void report(const std::exception_ptr& refusal) {
+/// Notes in the log that writes were refused. What a sink of it throws is of no interest here.
+void report(const std::exception_ptr& reason) noexcept {
     try {
-        std::rethrow_exception(refusal);
+        std::rethrow_exception(reason);
     } catch (const std::exception& error) {
-        sqliteLogger.write(common::error, error.what());
+        try {
+            sqliteLogger.write(common::error, error.what());
+        } catch (...) {
+            return;
+        }
+    } catch (...) {
+        return;
     }
 }
 
@@ -140,7 +147,7 @@ void Committer::refuse(const ChangeTable& changeTable, std::exception_ptr reason
         if (!hasTable) writes.takeBack(nullptr, refusal);
         return refusal.isDone;
     });
-    for (auto& waiter : refusal.waiters) waiter.promise.setException(refusal.reason);
+    refusal.tell();
 }
 
 Committer::Keys Committer::expire(ValueTable& values) {

@@ -23,6 +23,8 @@ auto explained(const char* failure, const fs::path& path, Action action) {
         return action();
     } catch (const std::bad_alloc&) {
         throw;
+    } catch (const fs::filesystem_error& cause) {
+        throw std::runtime_error(failure + path.string() + ": " + cause.code().message());
     } catch (const std::exception& cause) {
         throw std::runtime_error(failure + path.string() + ": " + cause.what());
     }
@@ -73,15 +75,17 @@ void StateFile::Database::write(const Write& write) {
 }
 
 StateFile::StateFile(const fs::path& path, const SqliteOptions& options)
-    : file(resolved(path)), keepFor(options.keepFor), keepCount(options.keepCount) {
-    explained(sqlite_errors::notOpened, file, [&] { database.emplace(file, options); });
-}
+    : file(resolved(path)),
+      keepFor(options.keepFor),
+      keepCount(options.keepCount),
+      database(explained(sqlite_errors::notOpened, file,
+                         [&] { return std::make_unique<Database>(file, options); })) {}
 
 StateFile::Content StateFile::read() {
     const FairLock lock(mutex);
+    Execution query(database->reading);
     return explained(sqlite_errors::notOpened, file, [&] {
         Content content;
-        Execution query(database->reading);
         while (query.next()) {
             std::string key(query.bytes(0));
             auto value = decoded(query.bytes(1));
@@ -100,29 +104,32 @@ StateFile::Content StateFile::read() {
 
 void StateFile::commit(const Writes& writes, Time now) {
     const FairLock lock(mutex);
+    Database& used = *database;
     explained(sqlite_errors::notWritten, file, [&] {
-        Transaction transaction(database->connection);
-        for (const Write& write : writes) database->write(write);
-        database->journal.trim(writes.back().entry.change, keepCount, earlier(now, keepFor));
+        Transaction transaction(used.connection);
+        for (const Write& write : writes) used.write(write);
+        used.journal.trim(writes.back().entry.change, keepCount, earlier(now, keepFor));
         transaction.commit();
     });
 }
 
 std::int64_t StateFile::newestChange() {
     const FairLock lock(mutex);
-    return explained(sqlite_errors::notRead, file,
-                     [&] { return database->journal.newestChange(); });
+    Journal& journal = database->journal;
+    return explained(sqlite_errors::notRead, file, [&] { return journal.newestChange(); });
 }
 
 std::optional<JournalEntry> StateFile::find(std::int64_t change) {
     const FairLock lock(mutex);
-    return explained(sqlite_errors::notRead, file, [&] { return database->journal.find(change); });
+    Journal& journal = database->journal;
+    return explained(sqlite_errors::notRead, file, [&] { return journal.find(change); });
 }
 
 std::vector<JournalEntry> StateFile::history(const std::string& keyOrPrefix, std::size_t limit) {
     const FairLock lock(mutex);
+    Journal& journal = database->journal;
     return explained(sqlite_errors::notRead, file,
-                     [&] { return database->journal.read(keyOrPrefix, limit); });
+                     [&] { return journal.read(keyOrPrefix, limit); });
 }
 
 }  // namespace velkor::layers::detail

@@ -1,8 +1,10 @@
 #pragma once
 
+#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <filesystem>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
@@ -74,7 +76,7 @@ private:
     const std::chrono::hours keepFor;
     const std::size_t keepCount;
     FairMutex mutex;
-    std::optional<Database> database VELKOR_GUARDED_BY(mutex);
+    std::unique_ptr<Database> database VELKOR_GUARDED_BY(mutex);
 };
 
 }  // namespace velkor::layers::detail

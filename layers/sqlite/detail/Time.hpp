@@ -14,9 +14,9 @@ inline std::int64_t toFile(Time time) {
     return std::chrono::duration_cast<std::chrono::microseconds>(time.time_since_epoch()).count();
 }
 
-/// The time that stands in the file as `count`, or the first or last one there is.
+/// The time that stands in the file as `count`, or the nearest from 1970 to the last one there is.
 inline Time fromFile(std::int64_t count) {
-    const std::int64_t kept = std::clamp(count, toFile(Time::min()), toFile(Time::max()));
+    const std::int64_t kept = std::clamp(count, std::int64_t{0}, toFile(Time::max()));
     return Time(std::chrono::duration_cast<Time::duration>(std::chrono::microseconds(kept)));
 }
 

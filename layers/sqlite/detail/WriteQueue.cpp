@@ -39,16 +39,24 @@ WriteQueue::Keys keysOf(const Writes& writes) {
     return keys;
 }
 
-// Without memory for it the promise is broken, which is known to the one who waits.
-void tell(WriteQueue::Waiter& waiter) {
-    try {
-        waiter.promise.setValue(true);
-    } catch (const std::bad_alloc&) {
-        return;
+/// Runs `resolve` on each promise. One for which memory is short is broken, which its future tells
+/// as well.
+template <class Resolve>
+void tellAll(WriteQueue::Waiters& waiters, Resolve resolve) noexcept {
+    for (WriteQueue::Waiter& each : waiters) {
+        try {
+            resolve(each.promise);
+        } catch (...) {
+            continue;
+        }
     }
 }
 
 }  // namespace
+
+void WriteQueue::Refusal::tell() noexcept {
+    tellAll(waiters, [this](Promise<bool>& promise) { promise.setException(reason); });
+}
 
 WriteQueue::WriteQueue(std::int64_t newestChange, Deadlines::Map&& initialDeadlines)
     : lastChange(newestChange), deadlines(std::move(initialDeadlines)) {}
@@ -149,7 +157,7 @@ void WriteQueue::finish() {
                                       [upTo](const Waiter& each) { return each.upTo > upTo; });
         satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
     }
-    for (Waiter& each : satisfied) tell(each);
+    tellAll(satisfied, [](Promise<bool>& promise) { promise.setValue(true); });
 }
 
 WriteQueue::Keys WriteQueue::takeBack(ValueTable* values, Refusal& refusal) {

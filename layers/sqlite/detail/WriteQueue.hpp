@@ -50,6 +50,9 @@ public:
         std::exception_ptr reason;
         bool isDone = false;
         Waiters waiters{};
+
+        /// Fails what they wait for.
+        void tell() noexcept;
     };
 
     /// `newestChange` is the number of the last change on the disk.

@@ -3,7 +3,9 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <string>
+#include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "tests/layers/sqlite/StateTesting.hpp"
@@ -11,19 +13,58 @@
 namespace velkor::testing {
 namespace {
 
+using configuration::ConfigurationImpl;
 using ::testing::ElementsAre;
-
-SqliteOptions by(const std::string& author) {
-    SqliteOptions options;
-    options.author = author;
-    return options;
-}
 
 TEST(SqliteSource, ReadsAWriteAtOnce) {
     const StateFolder folder;
     const auto source = SqliteSource::open(folder.file());
     source->set("a.b", 1);
+    EXPECT_TRUE(source->has("a.b"));
     EXPECT_EQ(textOf(source->get("a.b")), "int 1");
+}
+
+TEST(SqliteSource, AnswersANewValueWithItself) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    EXPECT_EQ(textOf(source->set("a", 1)), "int 1");
+}
+
+TEST(SqliteSource, AnswersAReplacementWithTheFormerValue) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    source->set("a", 1);
+    EXPECT_EQ(textOf(source->set("a", 2)), "int 1");
+}
+
+TEST(SqliteSource, ForgetsAKey) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    source->set("a", 1);
+    EXPECT_EQ(textOf(source->unset("a").value()), "int 1");
+    EXPECT_FALSE(source->has("a"));
+}
+
+TEST(SqliteSource, ForgettingAnUnknownKeyDoesNothing) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    EXPECT_FALSE(source->unset("a").has_value());
+    source->committed().get();
+    EXPECT_THAT(historyOf(*source), ElementsAre());
+}
+
+TEST(SqliteSource, TellsItsListenerOfEachWriteWhenItCanBeRead) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    std::vector<std::string> told;
+    source->setChangeListener([&](const std::string& key) {
+        told.push_back(key + " " + (source->has(key) ? textOf(source->get(key)) : "gone"));
+    });
+    source->set("a", 1);
+    source->set("a", 2);
+    source->unset("a");
+    source->unset("a");
+    EXPECT_THAT(told, ElementsAre("a int 1", "a int 2", "a gone"));
 }
 
 TEST(SqliteSource, KeepsWhatWasCommitted) {
@@ -49,39 +90,38 @@ TEST(SqliteSource, CommitsWhatWaitsBeforeItEnds) {
     EXPECT_EQ(textOf(SqliteSource::open(folder.file())->get("a")), "int 1");
 }
 
-TEST(SqliteSource, JournalsEveryWrite) {
+TEST(SqliteSource, IsOnTheDiskWhenItSaysSo) {
     const StateFolder folder;
-    const auto source = SqliteSource::open(folder.file(), by("alice"));
-    source->set("a", 1);
-    source->set("a", 2);
-    source->unset("a");
-    source->unset("a");
-    source->committed().get();
-    EXPECT_THAT(historyOf(*source),
-                ElementsAre("3 alice unset a: int 2 -> none", "2 alice set a: int 1 -> int 2",
-                            "1 alice set a: none -> int 1"));
-}
-
-TEST(SqliteSource, UndoesTheLastChangeAsAWriteOfItsOwn) {
-    const StateFolder folder;
-    const auto source = SqliteSource::open(folder.file(), by("alice"));
-    source->set("a", 1);
-    source->set("a", 2);
-    EXPECT_EQ(textOf(source->undo()), "3 alice undo a: int 2 -> int 1");
-    EXPECT_EQ(textOf(source->get("a")), "int 1");
-    source->committed().get();
-    EXPECT_EQ(textOf(source->undo(1)), "4 alice undo a: int 1 -> none");
-    EXPECT_FALSE(source->has("a"));
-}
-
-TEST(SqliteSource, IsALayerOfAStore) {
-    const StateFolder folder;
-    const auto store = std::make_shared<configuration::ConfigurationImpl>();
     const auto source = SqliteSource::open(folder.file());
+    source->set("a", 1);
+    EXPECT_TRUE(source->committed().get());
+    EXPECT_EQ(OtherProgram(folder.file()).run("SELECT key, value FROM entries"), "a int:1 ");
+}
+
+TEST(SqliteSource, WithoutWritesEverythingIsOnTheDisk) {
+    const StateFolder folder;
+    EXPECT_TRUE(SqliteSource::open(folder.file())->committed().get());
+}
+
+TEST(SqliteSource, TakesTheWritesOfAStore) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    const auto store = std::make_shared<ConfigurationImpl>();
     store->addSource("state", "", -1, false, source);
     store->set("a", 1);
-    EXPECT_TRUE(source->committed().get());
     EXPECT_EQ(textOf(store->get("a").get()), "int 1");
+    EXPECT_EQ(textOf(source->get("a")), "int 1");
+    EXPECT_TRUE(store->unset("a").get());
+    EXPECT_FALSE(store->has("a").get());
+}
+
+TEST(SqliteSource, HoldsKeysWithoutItsGroup) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    const auto store = std::make_shared<ConfigurationImpl>();
+    store->addSource("state", "site", -1, false, source);
+    store->set("site.a", 1);
+    EXPECT_THAT(source->keys(), ElementsAre("a"));
 }
 
 }  // namespace

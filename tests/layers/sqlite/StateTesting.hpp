@@ -1,6 +1,7 @@
 #pragma once
 
 #include <gtest/gtest.h>
+#include <sqlite3.h>
 
 #include <atomic>
 #include <chrono>
@@ -45,6 +46,40 @@ public:
 
 private:
     std::filesystem::path folder;
+};
+
+/// The connection of another program to a state file.
+class OtherProgram {
+public:
+    explicit OtherProgram(const std::filesystem::path& file) {
+        if (sqlite3_open(file.c_str(), &connection) != SQLITE_OK) {
+            throw std::runtime_error("can't open " + file.string());
+        }
+    }
+
+    ~OtherProgram() { sqlite3_close(connection); }
+
+    OtherProgram(const OtherProgram&) = delete;
+    OtherProgram& operator=(const OtherProgram&) = delete;
+
+    /// Runs `sql` and gives the columns of all rows, each followed by a blank.
+    std::string run(const std::string& sql) {
+        std::string text;
+        const auto append = [](void* target, int count, char** columns, char**) {
+            for (int i = 0; i < count; ++i) {
+                *static_cast<std::string*>(target) += columns[i] == nullptr ? "none" : columns[i];
+                *static_cast<std::string*>(target) += ' ';
+            }
+            return 0;
+        };
+        if (sqlite3_exec(connection, sql.c_str(), append, &text, nullptr) != SQLITE_OK) {
+            throw std::runtime_error(sqlite3_errmsg(connection));
+        }
+        return text;
+    }
+
+private:
+    sqlite3* connection = nullptr;
 };
 
 /// A clock that stands still until it is set.
@@ -92,6 +127,12 @@ inline std::vector<std::string> textsOf(const std::vector<JournalEntry>& entries
     std::vector<std::string> texts;
     for (const auto& entry : entries) texts.push_back(textOf(entry));
     return texts;
+}
+
+inline SqliteOptions by(const std::string& author) {
+    SqliteOptions options;
+    options.author = author;
+    return options;
 }
 
 /// All of the journal, newest first.
