@@ -52,7 +52,9 @@ WatchedFile::WatchedFile(std::filesystem::path path, std::chrono::milliseconds l
 void WatchedFile::start(Inotify& notifications, TimePoint now) {
     nextLook = now + interval;
     arm(notifications);
-    if (identityOf(place) != last.identity) quietTime.changed(now);
+    if (identityOf(place) == last.identity) return;
+    quietTime.changed(now);
+    quietTime.written();  // maybe it still is
 }
 
 void WatchedFile::stop(Inotify& notifications) noexcept {
@@ -94,8 +96,8 @@ void WatchedFile::onNameEvent(std::uint32_t mask, const std::string& name, TimeP
     const bool created = (mask & IN_CREATE) != 0;
     if (created && isNewFile(name)) return quietTime.begun();
     quietTime.changed(now);
-    // What is in a new folder is probably being written; it would have been moved here otherwise.
-    if (created && (mask & IN_ISDIR) != 0) quietTime.written();
+    // What is in a new folder already may still be being written.
+    if (created && (mask & IN_ISDIR) != 0 && !chain.file().empty()) quietTime.written();
 }
 
 void WatchedFile::onTime(Inotify& notifications, TimePoint now) {

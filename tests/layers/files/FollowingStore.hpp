@@ -7,6 +7,7 @@
 #include <functional>
 #include <memory>
 #include <mutex>
+#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -21,24 +22,35 @@ namespace velkor::layers {
 /// A store with files that are followed, and all that it tells of.
 class FollowingStore {
 public:
-    FollowingStore()
+    explicit FollowingStore(const ReloadingFileOptions& options = {})
         : watching(reactive_streams::subscribe(
               *store->watchChanges(""),
-              {[this](configuration::OptionChange change) { note(change); }, {}, {}})) {}
+              {[this](const configuration::OptionChange& change) { note(change); }, {}, {}})) {
+        testing::FileFolder::write(fenceFolder / "fence", "fence=0\n");
+        add("fence", std::make_shared<ReloadingFileSource>(fenceFolder / "fence", options));
+    }
 
     /// Follows the file at `path`, which is the layer `name`.
     std::shared_ptr<ReloadingFileSource> follow(const std::filesystem::path& path,
                                                 const ReloadingFileOptions& options = {},
                                                 const std::string& name = "file") {
-        const auto source = std::make_shared<ReloadingFileSource>(path, options);
-        store->addSource(name, "", 5, true, source).get();
+        auto source = std::make_shared<ReloadingFileSource>(path, options);
+        add(name, source);
         return source;
+    }
+
+    /// Registers `source`; returns when its file is watched. Nothing of that counts as told.
+    void add(const std::string& name, std::shared_ptr<ReloadingFileSource> source) {
+        store->addSource(name, "", 5, true, std::move(source)).get();
+        passFenceOnce();
+        forgetTold();
     }
 
     /// Whether "KEY=TEXT", or "KEY" alone when it has gone, is told, or was.
     [[nodiscard]] bool isTold(const std::string& change) {
-        return waitUntil(
-            [&] { return std::find(changes.begin(), changes.end(), change) != changes.end(); });
+        return waitUntil(testing::patience, [&] {
+            return std::find(changes.begin(), changes.end(), change) != changes.end();
+        });
     }
 
     /// All that was told so far, in that order, but for the fences.
@@ -47,18 +59,17 @@ public:
         return changes;
     }
 
+    void forgetTold() {
+        const std::lock_guard<std::mutex> lock(mutex);
+        changes.clear();
+    }
+
     /// Returns when a change that is made now to another file has been read. What happened before
     /// to a followed file has had its time then.
     void passFence() {
-        const auto number = std::to_string(++fences);
-        if (fence == nullptr) {
-            testing::FileFolder::write(fenceFolder / "fence", "fence=0\n");
-            fence = follow(fenceFolder / "fence", {}, "fence");
-        }
-        testing::FileFolder::replace(fenceFolder / "fence", "fence=" + number + "\n");
-        if (!waitUntil([&] { return fencePassed == number; })) {
-            throw std::runtime_error("the fence was not read");
-        }
+        // What is due together with the first one is done before the second one is.
+        passFenceOnce();
+        passFenceOnce();
     }
 
     std::string valueOf(const std::string& key) const {
@@ -69,10 +80,20 @@ public:
         std::make_shared<configuration::ConfigurationImpl>();
 
 private:
+    void passFenceOnce() {
+        const auto number = std::to_string(++fences);
+        const auto end = std::chrono::steady_clock::now() + testing::patience;
+        do {
+            if (std::chrono::steady_clock::now() > end) throw std::runtime_error("no fence passed");
+            testing::FileFolder::replace(fenceFolder / "fence", "fence=" + number + "\n");
+            // A change at the very moment at which the watch begins is taken for an unfinished one.
+        } while (!waitUntil(std::chrono::milliseconds(200), [&] { return fencePassed == number; }));
+    }
+
     template <class Condition>
-    bool waitUntil(Condition condition) {
+    bool waitUntil(std::chrono::milliseconds limit, Condition condition) {
         std::unique_lock<std::mutex> lock(mutex);
-        return noted.wait_for(lock, testing::patience, condition);
+        return noted.wait_for(lock, limit, condition);
     }
 
     void note(const configuration::OptionChange& change) {
@@ -92,7 +113,6 @@ private:
     std::string fencePassed;           // guarded by mutex
     int fences = 0;
     testing::FileFolder fenceFolder;
-    std::shared_ptr<ReloadingFileSource> fence;
     reactive_streams::SubscriptionHandle watching;
 };
 
