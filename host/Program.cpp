@@ -26,13 +26,17 @@
 #include "host/console/HostCommands.hpp"
 #include "host/console/LineEditor.hpp"
 #include "host/console/LineReader.hpp"
+#include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
+#include "host/console/SettingsCommand.hpp"
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
 #include "host/messages/MessageService.hpp"
 #include "host/sources/SourceLoader.hpp"
 #include "host/state/StateLayer.hpp"
+#include "settings/Describe.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -58,7 +62,7 @@ public:
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output, [this] { store->acknowledge(); }),
           service(store),
-          storeCommands(store, registry),
+          storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
           hostCommands({store, std::make_shared<Watches>(store, showValue()),
                         service.dispatcherFor(allRequestTypes()), [this] { console.quit(); },
                         [this](const auto& name) { return problemOf(name); }},
@@ -98,6 +102,12 @@ public:
         return loaded.failures.empty();
     }
 
+    /// Declares settings, and lists them by a command if there are any.
+    void declareSettings(const DeclareSettings& declare) {
+        if (declare) declared = declare(store);
+        if (!settings::describe(store).empty()) settingsCommand.emplace(store, registry);
+    }
+
     /// Carries out the given lines or, when there are none, those that are typed or read.
     bool run(const std::vector<std::string>& lines) {
         const auto source = makeLineSource(lines);
@@ -106,8 +116,11 @@ public:
 
 private:
     Watches::Show showValue() const {
-        return [announcements = announcements](const auto& key, const auto& value) {
-            announcements->announce(optionText(key, value));
+        return [announcements = announcements, watched = std::weak_ptr(store)](const auto& key,
+                                                                               const auto& value) {
+            const auto open = watched.lock();
+            const bool isSecret = open != nullptr && settings::secretKeys(open).count(key) != 0;
+            announcements->announce(optionText(key, value, isSecret));
         };
     }
 
@@ -140,6 +153,8 @@ private:
     MessageService service;
     configuration::ConfigurationCommandProvider storeCommands;
     HostCommands hostCommands;
+    std::shared_ptr<const void> declared;
+    std::optional<SettingsCommand> settingsCommand;
 };
 
 /// A reader that has gone away is no failure; a full disk is.
@@ -155,7 +170,7 @@ std::vector<SourceRequest> watched(std::vector<SourceRequest> sources, bool watc
     return sources;
 }
 
-ExitCode runSession(const Options& options, Output& output) {
+ExitCode runSession(const Options& options, const DeclareSettings& declare, Output& output) {
     std::optional<LogSink> logSink;
     if (!options.logs.empty()) logSink.emplace(std::cerr);
     for (const auto& log : options.logs) {
@@ -169,6 +184,7 @@ ExitCode runSession(const Options& options, Output& output) {
     session.assign(options.assignments);
     const bool watches = options.watchesFiles.value_or(isInteractive(options.lines));
     const bool allLoaded = session.load(watched(options.sources, watches));
+    session.declareSettings(declare);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
@@ -176,7 +192,7 @@ ExitCode runSession(const Options& options, Output& output) {
 
 }  // namespace
 
-ExitCode runProgram(const std::vector<std::string>& arguments) {
+ExitCode runProgram(const std::vector<std::string>& arguments, const DeclareSettings& declare) {
     DescriptorBuffer standardOutput(STDOUT_FILENO);
     std::ostream answers(&standardOutput);
     Output output(answers,
@@ -186,7 +202,7 @@ ExitCode runProgram(const std::vector<std::string>& arguments) {
     try {
         const Options options = parseOptions(arguments);
         output.answer(options.information);
-        if (options.information.empty()) exitCode = runSession(options, output);
+        if (options.information.empty()) exitCode = runSession(options, declare, output);
     } catch (const UsageError& error) {
         output.message(error.what());
         return ExitCode::badUsage;

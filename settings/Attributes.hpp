@@ -35,7 +35,9 @@ inline Attribute description(std::string text) {
     return Attribute(std::move(text));
 }
 
-/// The value is shown as ••• wherever this library shows it.
+/// The value is shown as ••• wherever this library shows it: in errors and log records of this
+/// setting, and to whoever lists the settings of the store. Consoles ask `secretKeys`. Of several
+/// settings of one key each says so.
 inline Attribute secret() {
     return Attribute([](detail::Declared& declared) { declared.secret = true; });
 }

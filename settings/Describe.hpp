@@ -14,14 +14,17 @@ namespace velkor::settings {
 struct Description {
     std::string key;
     std::string type;                          ///< "int", "duration in milliseconds"
-    std::optional<std::string> defaultText{};  ///< ••• if the setting is secret.
+    std::optional<std::string> defaultText{};  ///< ••• if it is secret.
     std::optional<std::string> value{};  ///< ••• if it is secret; nothing if there is none.
     std::string source;                  ///< Empty: the default.
     std::string constraint;              ///< "between 1 and 65535"; empty if there is none.
     std::string description;
-    bool secret = false;
+    bool secret = false;  ///< By this setting or by another one of the key; see `secretKeys`.
     bool needsRestart = false;
-    std::optional<std::string> error{};  ///< As in `Status`, of a struct that of the whole.
+
+    /// As in `Status`, of a struct that of the whole. ••• if it may repeat a value that is secret
+    /// by another setting.
+    std::optional<std::string> error{};
 };
 
 /// All settings of `store` that there are now, by key; those of the same key in no order. Calls no

@@ -8,6 +8,7 @@
 #include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -35,11 +36,12 @@ std::string showSources(const Context& context, const Arguments&) {
 std::string explain(const Context& context, const Arguments& arguments) {
     const auto options = context.services.store->explain(arguments.at(0)).get();
     if (options.empty()) return "No configuration option with key: " + arguments.at(0);
+    const bool isSecret = settings::secretKeys(context.services.store).count(arguments.at(0)) != 0;
     std::vector<std::vector<std::string>> rows;
     rows.reserve(options.size());
     for (const auto& option : options) {
-        rows.push_back(
-            {rows.empty() ? "effective" : "overridden", option.source, valueText(option.value)});
+        rows.push_back({rows.empty() ? "effective" : "overridden", option.source,
+                        valueText(option.value, isSecret)});
     }
     return formatTable(rows);
 }
@@ -85,7 +87,8 @@ std::string quit(const Context& context, const Arguments&) {
 }
 
 std::string send(const Context& context, const Arguments& arguments) {
-    return sendMessage(*context.services.messages, arguments);
+    const auto secrets = settings::secretKeys(context.services.store);
+    return sendMessage(*context.services.messages, arguments, secrets);
 }
 
 std::vector<std::string> suggestCommands(const Context& context) {

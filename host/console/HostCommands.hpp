@@ -36,6 +36,8 @@ struct HostServices {
 ///   of the line as it was typed.
 /// - help [COMMAND], quit.
 ///
+/// Values of secret keys, see `settings::secretKeys`, are shown as •••.
+///
 /// Handlers share the services, so they may run after this object is gone. Called with too few
 /// arguments they throw `std::out_of_range`.
 class HostCommands final : public administration::CommandProvider {

@@ -4,6 +4,8 @@
 
 #include "configuration/service/MessageTypes.hpp"
 #include "host/console/Command.hpp"
+#include "host/messages/JsonText.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -14,15 +16,28 @@ std::string fullTypeName(const std::string& type) {
     return std::string(configuration::messageTypePrefix).append(type);
 }
 
+// The content of `reply` as an operator may see it.
+std::string shownContent(const JsonMessage& reply, const std::set<std::string>& secret) {
+    using configuration::ConfigurationOptionResponse;
+    const bool hasValue =
+        reply.type == configuration::messageTypeOf<ConfigurationOptionResponse>.name();
+    if (secret.empty() || !hasValue) return reply.json;
+    const auto content = parseJsonObject(reply.json);
+    if (secret.count(content->optValue<std::string>("key", "")) == 0) return reply.json;
+    content->getObject("value")->set("value", std::string(settings::secretMark));
+    return renderJson(*content);
+}
+
 }  // namespace
 
 std::string sendMessage(const MessageDispatcher& dispatcher,
-                        const std::vector<std::string>& arguments) {
+                        const std::vector<std::string>& arguments,
+                        const std::set<std::string>& secret) {
     const std::string json = arguments.size() > 1 ? arguments[1] : "{}";
     const auto result = dispatcher.dispatch({fullTypeName(arguments.at(0)), json});
     if (const auto* error = std::get_if<DispatchError>(&result)) throw CommandError(error->text);
     const auto& reply = std::get<JsonMessage>(result);
-    return reply.type + ' ' + reply.json;
+    return reply.type + ' ' + shownContent(reply, secret);
 }
 
 std::vector<std::string> requestTypes() {

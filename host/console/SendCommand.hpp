@@ -1,5 +1,6 @@
 #pragma once
 
+#include <set>
 #include <string>
 #include <vector>
 
@@ -12,9 +13,10 @@ namespace velkor::host {
 ///
 /// TYPE is the name of a message type, or its last word; JSON is {} when there is none. A request
 /// without a reply throws `CommandError` with the dispatcher's text; one without a TYPE
-/// `std::out_of_range`.
+/// `std::out_of_range`. The reply shows the values of the `secret` keys as •••.
 std::string sendMessage(const MessageDispatcher& dispatcher,
-                        const std::vector<std::string>& arguments);
+                        const std::vector<std::string>& arguments,
+                        const std::set<std::string>& secret);
 
 /// The last words of the types that can be sent.
 std::vector<std::string> requestTypes();

@@ -9,6 +9,7 @@
 #include "framework/common/DiagnosticLogger.hpp"
 #include "framework/common/Export.hpp"
 #include "settings/Converted.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::settings::detail {
 
@@ -24,7 +25,7 @@ struct Declared {
     bool orDefault = false;
 
     /// `text`, or ••• in the place of a secret.
-    std::string shown(const std::string& text) const { return secret ? "•••" : text; }
+    std::string shown(const std::string& text) const { return masked(secret, text); }
 };
 
 /// The value of one key, and where it comes from.

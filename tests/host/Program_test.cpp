@@ -54,6 +54,11 @@ TEST(Program, ListsItsSources) {
               "default   -      2147483647  writable\n");
 }
 
+TEST(Program, HasNoCommandForSettingsWhereThereAreNone) {
+    EXPECT_EQ(runProgram({"-c", "settings"}).err, "velkor-config: Unknown command: settings\n");
+    EXPECT_EQ(runProgram({"-c", "help"}).out.find("settings"), std::string::npos);
+}
+
 TEST(Program, TakesValuesFromTheEnvironmentAndTheCommandLine) {
     ::setenv("PROGRAM_TEST_SERVER__PORT", "1", 1);
     ::setenv("PROGRAM_TEST_SERVER__BACKLOG", "2", 1);

@@ -3,19 +3,25 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <atomic>
+#include <memory>
 #include <optional>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "settings/Bound.hpp"
+#include "settings/Secrets.hpp"
 #include "settings/Setting.hpp"
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/BoundedWait.hpp"
 
 namespace velkor::settings::testing {
 namespace {
 
 using ::testing::ElementsAre;
 using ::testing::Optional;
+using ::testing::UnorderedElementsAre;
 
 struct Server {
     int port = 0;
@@ -87,10 +93,69 @@ TEST_F(DescribeTest, HidesSecrets) {
     EXPECT_THAT(setting.value, Optional(std::string("•••")));
 }
 
+TEST_F(DescribeTest, HidesWhatAnyOfItsSettingsDeclaresSecret) {
+    const Setting<std::string> open(store, "password", "verysecret");
+    const Setting<std::string> hidden(store, "password", "verysecret", secret());
+    for (const Description& setting : describe(store)) {
+        EXPECT_TRUE(setting.secret);
+        EXPECT_THAT(setting.defaultText, Optional(std::string("•••")));
+        EXPECT_THAT(setting.value, Optional(std::string("•••")));
+    }
+}
+
+TEST_F(DescribeTest, HidesErrorsThatRepeatWhatAnotherSettingDeclaresSecret) {
+    const Setting<int> open(store, "pin", 1);
+    const Setting<std::string> hidden(store, "pin", "1", secret());
+    store->set("pin", "verysecret");
+    std::vector<std::optional<std::string>> errors;
+    for (const Description& setting : describe(store)) errors.push_back(setting.error);
+    EXPECT_THAT(errors, UnorderedElementsAre(Optional(std::string("•••")), std::nullopt));
+}
+
+TEST_F(DescribeTest, ShowsErrorsOfASecretThatSaysSoItself) {
+    const Setting<int> pin(store, "pin", 1, secret());
+    store->set("pin", "verysecret");
+    EXPECT_THAT(describe(store).front().error,
+                Optional(std::string("pin: ••• from source \"override\" is no int: not a whole "
+                                     "number in plain digits")));
+}
+
 TEST_F(DescribeTest, TellsOfErrors) {
     const Setting<int> limit(store, "limit", 1);
     store->set("limit", "many");
     EXPECT_EQ(describe(store).front().error, limit.status().error);
+}
+
+TEST_F(DescribeTest, WaitsForNoCallback) {
+    Setting<int> limit(store, "limit", 1, secret());
+    bool listed = false;
+    const auto handle = limit.onChange([&](int, int) {
+        listed = velkor::testing::completes([this] {
+            describe(store);
+            secretKeys(store);
+        });
+    });
+    store->set("limit", 2);
+    EXPECT_TRUE(listed);
+}
+
+TEST_F(DescribeTest, ListsWhileSettingsComeAndGo) {
+    const Setting<int> limit(store, "limit", 1);
+    std::atomic<bool> ended{false};
+    std::thread other([&] {
+        for (int i = 0; i < 300; ++i) {
+            const Setting<std::string> password(store, "password", "verysecret", secret());
+        }
+        ended = true;
+    });
+    while (!ended) {
+        for (const Description& setting : describe(store)) {
+            EXPECT_NE(setting.value, std::optional<std::string>("verysecret"));
+        }
+        EXPECT_EQ(secretKeys(store).count("limit"), 0U);
+    }
+    other.join();
+    EXPECT_THAT(keys(), ElementsAre("limit"));
 }
 
 TEST_F(DescribeTest, ListsKeysThatNobodyDeclared) {

@@ -9,6 +9,7 @@
 
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "host/console/ValueText.hpp"
+#include "settings/Setting.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
@@ -114,6 +115,21 @@ TEST_F(HostCommandsTest, ExplainShowsTheEffectiveValueFirst) {
 
 TEST_F(HostCommandsTest, ExplainSaysWhenNoSourceHoldsTheKey) {
     EXPECT_EQ(run("explain", {"a"}), "No configuration option with key: a");
+}
+
+TEST_F(HostCommandsTest, ExplainHidesWhatIsSecretInEverySource) {
+    const settings::Setting<int> pin(store, "pin", 1, settings::secret());
+    store->set("pin", 4711);
+    store->set("pin", "verysecret", "default");
+    EXPECT_EQ(run("explain", {"pin"}),
+              "effective   override  •••\n"
+              "overridden  default   •••\n");
+}
+
+TEST_F(HostCommandsTest, ExplainShowsWhatIsNoSecretBesideSecrets) {
+    const settings::Setting<int> pin(store, "pin", 1, settings::secret());
+    store->set("pine", 1);
+    EXPECT_EQ(run("explain", {"pine"}), "effective  override  1\n");
 }
 
 TEST_F(HostCommandsTest, WatchShowsValuesUntilUnwatch) {

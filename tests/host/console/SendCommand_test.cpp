@@ -10,6 +10,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "host/console/HostCommands.hpp"
 #include "host/messages/MessageService.hpp"
+#include "settings/Setting.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
@@ -50,6 +51,29 @@ TEST_F(SendCommandTest, NeedsNoContent) {
 TEST_F(SendCommandTest, ChangesTheStore) {
     send({"ConfigurationSet", R"({"key":"a","value":{"type":"string","value":"it's"}})"});
     EXPECT_EQ(boost::get<std::string>(store->get("a").get()), "it's");
+}
+
+TEST_F(SendCommandTest, HidesSecretsInReplies) {
+    const settings::Setting<std::string> token(store, "token", "t", settings::secret());
+    store->set("token", "verysecret");
+    EXPECT_EQ(send({"ConfigurationGet", R"({"key":"token"})"}),
+              "velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"token","source":"override","value":{"type":"string","value":"•••"}})");
+    EXPECT_EQ(send({"ConfigurationSet", R"({"key":"token","value":{"type":"int","value":4711}})"}),
+              "velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"token","source":"","value":{"type":"string","value":"•••"}})");
+}
+
+TEST_F(SendCommandTest, ShowsWhatIsNoSecretBesideSecrets) {
+    const settings::Setting<std::string> token(store, "token", "t", settings::secret());
+    store->set("a", "visible");
+    EXPECT_EQ(send({"ConfigurationGet", R"({"key":"a"})"}),
+              "velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"a","source":"override","value":{"type":"string","value":"visible"}})");
+    EXPECT_EQ(send({"ConfigurationGet", R"({"key":"token"})"}),
+              "velkor/configuration/ConfigurationOptionResponse {}");
+    EXPECT_EQ(send({"ConfigurationKeys"}),
+              R"(velkor/configuration/ConfigurationKeysResponse {"keys":["a"]})");
 }
 
 TEST_F(SendCommandTest, RefusesAnUnknownType) {

@@ -48,6 +48,12 @@ INSTANTIATE_TEST_SUITE_P(Values, ValueTextTest,
                                            ValueCase{"EmptyArray", std::vector<std::string>{}}),
                          [](const auto& tested) { return std::string(tested.param.name); });
 
+TEST(ValueText, SaysNothingOfASecret) {
+    const ConfigurationValue value(std::string("verysecret"));
+    EXPECT_EQ(valueText(value, true), "•••");
+    EXPECT_EQ(optionText("key", value, true), "key = •••");
+}
+
 TEST(ValueText, WritesNumbersInTheCLocale) {
     const velkor::testing::ScopedGlobalLocale comma(
         std::locale(std::locale::classic(), new velkor::testing::CommaNumbers));

@@ -1,0 +1,75 @@
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "tests/host/ChildProcess.hpp"
+#include "tests/support/TemporaryFile.hpp"
+
+namespace velkor::host {
+namespace {
+
+using velkor::testing::TemporaryFile;
+
+class SettingsConsoleTest : public ::testing::Test {
+protected:
+    ChildResult run(const std::string& commands) const {
+        return runProgram({"--source", "site=" + file.path().string()}, commands);
+    }
+
+    const TemporaryFile file{"server.port=8443\nserver.password=verysecret\nserver.prot=1\n"};
+};
+
+TEST_F(SettingsConsoleTest, ShowsASecretByNoCommand) {
+    const auto result = run(
+        "get server.password\n"
+        "explain server.password\n"
+        "watch server.password\n"
+        "set server.password othersecret\n"
+        "list\n"
+        "settings\n"
+        "send ConfigurationGet {\"key\":\"server.password\"}\n"
+        "send ConfigurationSet {\"key\":\"server.password\",\"value\":{\"type\":\"string\"}}\n");
+    EXPECT_EQ(result.out.substr(0, result.out.find("KEY")),
+              "•••\n"
+              "effective  site  •••\n"
+              "server.password = •••\n"
+              "server.password = •••\n"
+              "server.password = •••\n"
+              "server.port = '8443'\n"
+              "server.prot = '1'\n");
+    EXPECT_EQ(result.out.find("verysecret"), std::string::npos);
+    EXPECT_EQ(result.out.find("othersecret"), std::string::npos);
+    EXPECT_EQ(result.err, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST_F(SettingsConsoleTest, ShowsASecretInNoRecord) {
+    const auto result = runProgram({"--source", "site=" + file.path().string(), "--log",
+                                    "velkor::configuration=31", "--log", "velkor::settings=31"},
+                                   "set server.password othersecret\nset server.port none\n");
+    EXPECT_NE(result.err.find("debug velkor::configuration: set: server.password@override\n"),
+              std::string::npos);
+    EXPECT_NE(result.err.find("error velkor::settings: server.port: 'none' from source"),
+              std::string::npos);
+    EXPECT_EQ(result.err.find("verysecret"), std::string::npos);
+    EXPECT_EQ(result.err.find("othersecret"), std::string::npos);
+}
+
+TEST_F(SettingsConsoleTest, NamesTheCommandAmongTheOthers) {
+    EXPECT_NE(run("help\n").out.find("settings                   [--undeclared] [KEY-PREFIX]  List "
+                                     "the settings"),
+              std::string::npos);
+    EXPECT_EQ(run("help settings\n").out,
+              "settings ([--undeclared] [KEY-PREFIX])\n"
+              "List the settings that are declared, or the keys that are not.\n");
+}
+
+TEST(SettingsConsole, EndsBeforeTheFirstCommandWhenSettingsDoNotFit) {
+    const auto result = runProgram({}, "list\n");
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err, "server.password: no value, and no default\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+}  // namespace
+}  // namespace velkor::host
