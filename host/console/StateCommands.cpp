@@ -13,6 +13,7 @@
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Conversion.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -20,6 +21,7 @@ namespace {
 
 using configuration::ConfigurationValue;
 using Arguments = std::vector<std::string>;
+using StorePtr = std::shared_ptr<SessionStore>;
 using std::chrono::milliseconds;
 
 constexpr std::size_t usualLimit = 20;
@@ -64,69 +66,72 @@ std::optional<std::string> optionBehind(std::size_t least, std::size_t most,
     return std::nullopt;
 }
 
-std::string effectiveText(SessionStore& store, const std::string& key) {
-    const auto options = store.explain(key).get();
+std::string effectiveText(const StorePtr& store, const std::string& key) {
+    const auto options = store->explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
-    return optionText(key, options.front().value) + " (" + options.front().source + ")";
+    const bool isSecret = settings::secretKeys(store).count(key) != 0;
+    return optionText(key, options.front().value, isSecret) + " (" + options.front().source + ")";
 }
 
-std::string valueCell(const std::optional<ConfigurationValue>& value) {
-    return value ? valueText(*value) : "-";
+std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSecret) {
+    return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(const std::vector<StateChange>& changes) {
+std::string historyTable(const StorePtr& store, const std::vector<StateChange>& changes) {
+    const auto secrets = settings::secretKeys(store);
     std::vector<std::vector<std::string>> rows{
         {"CHANGE", "TIME", "WHO", "KEY", "ACTION", "BEFORE", "AFTER"}};
     for (const auto& change : changes) {
+        const bool isSecret = secrets.count(change.key) != 0;
         rows.push_back({std::to_string(change.number), timeText(change.when), change.author,
-                        change.key, change.action, valueCell(change.before),
-                        valueCell(change.after)});
+                        change.key, change.action, valueCell(change.before, isSecret),
+                        valueCell(change.after, isSecret)});
     }
     return formatTable(rows);
 }
 
 }  // namespace
 
-std::string putValue(SessionStore& store, const Arguments& arguments) {
+std::string putValue(const StorePtr& store, const Arguments& arguments) {
     const auto lifetime =
         optionBehind(2, 2, arguments, "--for", "What follows VALUE is no --for TIME.");
     ConfigurationValue value = configuration::typedText(arguments.at(1));
     if (!lifetime) {
-        store.set(arguments.at(0), std::move(value)).get();
+        store->set(arguments.at(0), std::move(value)).get();
         return "";
     }
-    StateLayer& state = stateOf(store);
+    StateLayer& state = stateOf(*store);
     const auto parsed = parseLifetime(*lifetime);
-    store.noteWrite();
+    store->noteWrite();
     state.setFor(arguments.at(0), std::move(value), parsed);
     return "";
 }
 
-std::string unsetKey(SessionStore& store, const Arguments& arguments) {
+std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
     const std::string& key = arguments.at(0);
-    store.noteWrite();
-    const bool wasThere = store.unset(key).get();
+    store->noteWrite();
+    const bool wasThere = store->unset(key).get();
     if (!wasThere) throw CommandError("Nothing to unset: " + effectiveText(store, key));
     return effectiveText(store, key);
 }
 
-std::string showHistory(SessionStore& store, const Arguments& arguments) {
+std::string showHistory(const StorePtr& store, const Arguments& arguments) {
     const auto limit =
         optionBehind(0, 1, arguments, "--limit", "What follows KEY is no --limit N.");
     const bool hasKey = arguments.size() == (limit ? 3 : 1);
-    return historyTable(stateOf(store).history(hasKey ? arguments.front() : "",
-                                               limit ? parseLimit(*limit) : usualLimit));
+    return historyTable(store, stateOf(*store).history(hasKey ? arguments.front() : "",
+                                                       limit ? parseLimit(*limit) : usualLimit));
 }
 
-std::string undoChange(SessionStore& store, const Arguments& arguments) {
-    StateLayer& state = stateOf(store);
+std::string undoChange(const StorePtr& store, const Arguments& arguments) {
+    StateLayer& state = stateOf(*store);
     std::optional<std::int64_t> number;
     if (!arguments.empty()) {
         number = parseNumber<std::int64_t>(arguments.front());
         if (!number) throw CommandError("N is no number of a change: " + arguments.front());
     }
-    store.noteWrite();
-    return historyTable({state.undo(number)});
+    store->noteWrite();
+    return historyTable(store, {state.undo(number)});
 }
 
 }  // namespace velkor::host
