@@ -57,9 +57,9 @@ std::string unwatch(const Context& context, const Arguments& arguments) {
 }
 
 /// A command on nothing but the session's store.
-template <std::string (*run)(SessionStore&, const Arguments&)>
+template <std::string (*run)(const std::shared_ptr<SessionStore>&, const Arguments&)>
 std::string onStore(const Context& context, const Arguments& arguments) {
-    return run(*context.services.store, arguments);
+    return run(context.services.store, arguments);
 }
 
 std::string helpFor(const Command& command) {

@@ -4,9 +4,7 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
-#include <memory>
 #include <optional>
-#include <set>
 #include <utility>
 
 #include "configuration/admin/TypedText.hpp"
@@ -23,6 +21,7 @@ namespace {
 
 using configuration::ConfigurationValue;
 using Arguments = std::vector<std::string>;
+using StorePtr = std::shared_ptr<SessionStore>;
 using std::chrono::milliseconds;
 
 constexpr std::size_t usualLimit = 20;
@@ -67,15 +66,10 @@ std::optional<std::string> optionBehind(std::size_t least, std::size_t most,
     return std::nullopt;
 }
 
-std::set<std::string> secretKeys(SessionStore& store) {
-    return settings::secretKeys(
-        std::static_pointer_cast<configuration::ConfigurationImpl>(store.getPtr()));
-}
-
-std::string effectiveText(SessionStore& store, const std::string& key) {
-    const auto options = store.explain(key).get();
+std::string effectiveText(const StorePtr& store, const std::string& key) {
+    const auto options = store->explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
-    const bool isSecret = secretKeys(store).count(key) != 0;
+    const bool isSecret = settings::secretKeys(store).count(key) != 0;
     return optionText(key, options.front().value, isSecret) + " (" + options.front().source + ")";
 }
 
@@ -83,8 +77,8 @@ std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSec
     return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(SessionStore& store, const std::vector<StateChange>& changes) {
-    const auto secrets = secretKeys(store);
+std::string historyTable(const StorePtr& store, const std::vector<StateChange>& changes) {
+    const auto secrets = settings::secretKeys(store);
     std::vector<std::vector<std::string>> rows{
         {"CHANGE", "TIME", "WHO", "KEY", "ACTION", "BEFORE", "AFTER"}};
     for (const auto& change : changes) {
@@ -98,45 +92,45 @@ std::string historyTable(SessionStore& store, const std::vector<StateChange>& ch
 
 }  // namespace
 
-std::string putValue(SessionStore& store, const Arguments& arguments) {
+std::string putValue(const StorePtr& store, const Arguments& arguments) {
     const auto lifetime =
         optionBehind(2, 2, arguments, "--for", "What follows VALUE is no --for TIME.");
     ConfigurationValue value = configuration::typedText(arguments.at(1));
     if (!lifetime) {
-        store.set(arguments.at(0), std::move(value)).get();
+        store->set(arguments.at(0), std::move(value)).get();
         return "";
     }
-    StateLayer& state = stateOf(store);
+    StateLayer& state = stateOf(*store);
     const auto parsed = parseLifetime(*lifetime);
-    store.noteWrite();
+    store->noteWrite();
     state.setFor(arguments.at(0), std::move(value), parsed);
     return "";
 }
 
-std::string unsetKey(SessionStore& store, const Arguments& arguments) {
+std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
     const std::string& key = arguments.at(0);
-    store.noteWrite();
-    const bool wasThere = store.unset(key).get();
+    store->noteWrite();
+    const bool wasThere = store->unset(key).get();
     if (!wasThere) throw CommandError("Nothing to unset: " + effectiveText(store, key));
     return effectiveText(store, key);
 }
 
-std::string showHistory(SessionStore& store, const Arguments& arguments) {
+std::string showHistory(const StorePtr& store, const Arguments& arguments) {
     const auto limit =
         optionBehind(0, 1, arguments, "--limit", "What follows KEY is no --limit N.");
     const bool hasKey = arguments.size() == (limit ? 3 : 1);
-    return historyTable(store, stateOf(store).history(hasKey ? arguments.front() : "",
-                                                      limit ? parseLimit(*limit) : usualLimit));
+    return historyTable(store, stateOf(*store).history(hasKey ? arguments.front() : "",
+                                                       limit ? parseLimit(*limit) : usualLimit));
 }
 
-std::string undoChange(SessionStore& store, const Arguments& arguments) {
-    StateLayer& state = stateOf(store);
+std::string undoChange(const StorePtr& store, const Arguments& arguments) {
+    StateLayer& state = stateOf(*store);
     std::optional<std::int64_t> number;
     if (!arguments.empty()) {
         number = parseNumber<std::int64_t>(arguments.front());
         if (!number) throw CommandError("N is no number of a change: " + arguments.front());
     }
-    store.noteWrite();
+    store->noteWrite();
     return historyTable(store, {state.undo(number)});
 }
 
