@@ -6,6 +6,8 @@
 #include <stdexcept>
 #include <string>
 
+#include <sqlite3.h>
+
 #include "tests/layers/faults/RandomWrites.hpp"
 #include "tests/layers/faults/SimulatedState.hpp"
 #include "tests/layers/faults/StateModel.hpp"
@@ -20,6 +22,27 @@ using velkor::testing::RandomWrites;
 using velkor::testing::SimulatedState;
 using velkor::testing::StateModel;
 using velkor::testing::valuesOf;
+
+/// Lets connections that are opened while it lives take their log into the database much more often
+/// than usual, with all that belongs to it.
+class FrequentCheckpoints {
+public:
+    FrequentCheckpoints() { sqlite3_auto_extension(beginning()); }
+    ~FrequentCheckpoints() { sqlite3_cancel_auto_extension(beginning()); }
+
+    FrequentCheckpoints(const FrequentCheckpoints&) = delete;
+    FrequentCheckpoints& operator=(const FrequentCheckpoints&) = delete;
+
+private:
+    using Beginning = void (*)();
+
+    static int begin(sqlite3* connection, const char**, const sqlite3_api_routines*) {
+        return sqlite3_wal_autocheckpoint(connection, 20);
+    }
+
+    /// What SQLite calls with the arguments above.
+    static Beginning beginning() { return reinterpret_cast<Beginning>(begin); }
+};
 
 /// How a life of the writer ends.
 enum class End { powerCut, kill };
@@ -102,9 +125,14 @@ constexpr std::uint64_t livesOfOneFile = 25;
 template <class EndOf>
 void expectToSurvive(std::uint64_t lives, EndOf endOf) {
     std::optional<MortalSource> source;
+    std::optional<FrequentCheckpoints> checkpoints;
     for (std::uint64_t seed = 0; seed < lives; ++seed) {
         SCOPED_TRACE("seed " + std::to_string(seed));
-        if (seed % livesOfOneFile == 0) source.emplace();
+        if (seed % livesOfOneFile == 0) {
+            source.emplace();
+            checkpoints.reset();
+            if (seed / livesOfOneFile % 2 == 0) checkpoints.emplace();
+        }
         source->live(seed, endOf(seed));
         if (seed % livesOfOneFile == livesOfOneFile - 1) source->look();
         if (::testing::Test::HasFailure()) return;
