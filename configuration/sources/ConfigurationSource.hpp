@@ -19,7 +19,8 @@ using ChangeListener = std::function<void(const std::string&)>;
 /// needs no lock. A source may call back into the store. `TableSource` is a base for sources that
 /// keep their values in a table.
 ///
-/// A source that changes by itself, on a thread of its own,
+/// A source that changes by itself, on a thread of its own (`layers/LiveSource.hpp` is a base that
+/// keeps these rules),
 /// - guards its values by a mutex of its own, since its thread changes them without the store's;
 /// - doesn't hold that mutex while it calls the listener: the listener takes the store's mutex, and
 ///   the store calls the source with that mutex held;

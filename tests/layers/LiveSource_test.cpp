@@ -18,7 +18,6 @@ namespace {
 
 using configuration::ConfigurationImpl;
 using configuration::ConfigurationValue;
-using configuration::OptionChange;
 using configuration::ValueMap;
 using ::testing::ElementsAre;
 using ::testing::IsEmpty;

@@ -23,6 +23,8 @@ auto explained(const char* failure, const fs::path& path, Action action) {
         return action();
     } catch (const std::bad_alloc&) {
         throw;
+    } catch (const fs::filesystem_error& cause) {
+        throw std::runtime_error(failure + path.string() + ": " + cause.code().message());
     } catch (const std::exception& cause) {
         throw std::runtime_error(failure + path.string() + ": " + cause.what());
     }

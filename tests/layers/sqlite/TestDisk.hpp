@@ -22,6 +22,8 @@ public:
         vfs = *usual;
         vfs.zName = name();
         vfs.xOpen = open;
+        vfs.szOsFile += static_cast<int>(sizeof(Methods));
+        usualSize = usual->szOsFile;
         openUsual = usual->xOpen;
         current = this;
         sqlite3_vfs_register(&vfs, 0);
@@ -38,8 +40,9 @@ public:
     /// What writing answers from now on: an SQLite error, or SQLITE_OK to write.
     void answerWrites(int answer) { writeAnswer = answer; }
 
-    /// Called before each sync of the log from now on, by the thread that commits.
-    void beforeSync(std::function<void()> action) {
+    /// Called before each sync of the log from now on, by the thread that commits. The sync fails
+    /// with what it gives, unless that is SQLITE_OK.
+    void beforeSync(std::function<int()> action) {
         const std::lock_guard<std::mutex> lock(mutex);
         syncAction = std::move(action);
     }
@@ -48,50 +51,55 @@ public:
     int logSyncs() const { return syncs; }
 
 private:
-    // The usual VFS makes a file, and its methods are replaced by ones that ask this first. Those
-    // of the log are told from others by a table of their own.
+    // Behind each file of the usual VFS: its methods, and ours in their place.
+    struct Methods {
+        const sqlite3_io_methods* usual;
+        sqlite3_io_methods own;
+    };
+
+    static Methods& methodsOf(sqlite3_file* file) {
+        return *reinterpret_cast<Methods*>(reinterpret_cast<char*>(file) + current->usualSize);
+    }
+
     static int open(sqlite3_vfs* self, const char* path, sqlite3_file* file, int flags,
                     int* outFlags) {
         const int result = current->openUsual(self, path, file, flags, outFlags);
         if (file->pMethods == nullptr) return result;
-        if (usualMethods == nullptr) {
-            usualMethods = file->pMethods;
-            methods = *usualMethods;
-            methods.xWrite = write;
-            logMethods = methods;
-            logMethods.xSync = syncLog;
-        }
-        file->pMethods = (flags & SQLITE_OPEN_WAL) != 0 ? &logMethods : &methods;
+        Methods& methods = methodsOf(file);
+        methods.usual = file->pMethods;
+        methods.own = *file->pMethods;
+        methods.own.xWrite = write;
+        if ((flags & SQLITE_OPEN_WAL) != 0) methods.own.xSync = syncLog;
+        file->pMethods = &methods.own;
         return result;
     }
 
     static int write(sqlite3_file* file, const void* bytes, int size, sqlite3_int64 offset) {
         const int answer = current->writeAnswer;
-        return answer == SQLITE_OK ? usualMethods->xWrite(file, bytes, size, offset) : answer;
+        if (answer != SQLITE_OK) return answer;
+        return methodsOf(file).usual->xWrite(file, bytes, size, offset);
     }
 
     static int syncLog(sqlite3_file* file, int flags) {
-        std::function<void()> action;
+        std::function<int()> action;
         {
             const std::lock_guard<std::mutex> lock(current->mutex);
             action = current->syncAction;
         }
-        if (action) action();
         ++current->syncs;
-        return usualMethods->xSync(file, flags);
+        const int answer = action ? action() : SQLITE_OK;
+        return answer == SQLITE_OK ? methodsOf(file).usual->xSync(file, flags) : answer;
     }
 
     inline static TestDisk* current = nullptr;
-    inline static const sqlite3_io_methods* usualMethods = nullptr;
-    inline static sqlite3_io_methods methods{};
-    inline static sqlite3_io_methods logMethods{};
 
     sqlite3_vfs vfs{};
+    int usualSize = 0;
     int (*openUsual)(sqlite3_vfs*, const char*, sqlite3_file*, int, int*) = nullptr;
     std::atomic<int> writeAnswer{SQLITE_OK};
     std::atomic<int> syncs{0};
     std::mutex mutex;
-    std::function<void()> syncAction;  // guarded by mutex
+    std::function<int()> syncAction;  // guarded by mutex
 };
 
 }  // namespace velkor::testing
