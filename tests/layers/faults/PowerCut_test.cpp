@@ -36,8 +36,14 @@ public:
 private:
     using Beginning = void (*)();
 
+    // The limit is set with the first commit, since opening sets the usual one at its end.
     static int begin(sqlite3* connection, const char**, const sqlite3_api_routines*) {
-        return sqlite3_wal_autocheckpoint(connection, 20);
+        sqlite3_commit_hook(connection, limitLog, connection);
+        return SQLITE_OK;
+    }
+
+    static int limitLog(void* connection) {
+        return sqlite3_wal_autocheckpoint(static_cast<sqlite3*>(connection), 20);
     }
 
     /// What SQLite calls with the arguments above.
