@@ -63,43 +63,10 @@ protected:
         }
     }
 
-    /// Expects that `write`, wherever memory fails it, is either done, and noted by `note`, or
-    /// leaves everything as it was.
-    template <class Write, class Note>
-    void expectAllOrNothing(Write write, Note note) {
-        std::shared_ptr<SqliteSource> source = open();
-        source->set("key", 1);
-        model.set("key", 1);
-        failEachAllocation([&] { write(*source); }, note);
-        EXPECT_EQ(valuesOf(*source), model.values());
-        EXPECT_TRUE(source->committed().get());
-        source.reset();
-        expectFileToHold(*open(), model);
-    }
-
     StateFolder folder;
     HandClock clock;
     StateModel model{author};
 };
-
-TEST_P(FailingMemory, SetsOrKeepsTheOldValue) {
-    expectAllOrNothing([](SqliteSource& source) { source.set("new", std::string(100, 'x')); },
-                       [&] { model.set("new", std::string(100, 'x')); });
-}
-
-TEST_P(FailingMemory, SetsForATimeOrKeepsTheOldValue) {
-    expectAllOrNothing([](SqliteSource& source) { source.setFor("key", 2, lifetime); },
-                       [&] { model.set("key", 2, clock.now() + lifetime); });
-}
-
-TEST_P(FailingMemory, UnsetsOrKeepsTheOldValue) {
-    expectAllOrNothing([](SqliteSource& source) { source.unset("key"); },
-                       [&] { model.unset("key"); });
-}
-
-TEST_P(FailingMemory, UndoesOrKeepsTheOldValue) {
-    expectAllOrNothing([](SqliteSource& source) { source.undo(1); }, [&] { model.undo(0); });
-}
 
 TEST_P(FailingMemory, GivesAllOfTheHistoryOrNothing) {
     const auto source = open();

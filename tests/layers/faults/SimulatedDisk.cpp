@@ -61,7 +61,7 @@ DiskAnswer SimulatedDisk::sync(OpenFile& which) {
     std::unique_lock<std::mutex> lock(mutex);
     const DiskAnswer answer = admit(lock, DiskOperation::sync, which.session);
     if (answer != DiskAnswer::done) {
-        which.file->failToSync();
+        if (isPowered && which.session == session) which.file->failToSync();
         return answer;
     }
     which.file->sync();

@@ -133,6 +133,17 @@ TEST_F(SimulatedDiskTest, KeepsEverythingWhenItsProgramsDie) {
     EXPECT_EQ(contentOf(opened()), "text");
 }
 
+TEST_F(SimulatedDiskTest, SyncsWhatADeadProgramHasWritten) {
+    const auto left = leftAfter([this](SimulatedDisk::OpenFile& file) {
+        write(file, sectors('b', 'b'));
+        disk.restartAfterKill();
+        disk.sync(file);
+        SimulatedDisk::OpenFile again = opened();
+        disk.sync(again);
+    });
+    EXPECT_EQ(left, std::set<std::string>{sectors('b', 'b')});
+}
+
 TEST_F(SimulatedDiskTest, AnswersNothingOpenedBeforeAStart) {
     const SimulatedDisk::OpenFile file = opened();
     disk.restartAfterKill();
