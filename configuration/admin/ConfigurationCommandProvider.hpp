@@ -11,7 +11,8 @@ namespace velkor::configuration {
 
 /// Keeps the operator commands of a store registered while it lives.
 ///
-/// - "velkor.configuration.set" KEY TEXT: stores what `typedText` makes of the text; the text itself
+/// - "velkor.configuration.set" KEY TEXT: stores what `typedText` makes of the text; the text
+/// itself
 ///   where a number is refused. Answers nothing; a refused write is not reported.
 /// - "velkor.configuration.get" KEY: the value, or "No configuration option with key: " and KEY.
 /// - "velkor.configuration.list": a line "KEY = VALUE" for each key, in byte order.
