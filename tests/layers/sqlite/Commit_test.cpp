@@ -10,6 +10,9 @@
 #include <thread>
 #include <vector>
 
+#include <pthread.h>
+#include <signal.h>
+
 #include "configuration/ConfigurationImpl.hpp"
 #include "layers/sqlite/SqliteSource.hpp"
 #include "tests/layers/sqlite/StateTesting.hpp"
@@ -135,6 +138,21 @@ TEST_F(Commit, TakesWhatAStoreChangesTogetherTogether) {
     between->whenSet = [&] { EXPECT_FALSE(synced.waitFor(std::chrono::milliseconds(50))); };
     store->apply({{"a", 1}, {"between.x", 1}, {"b", 2}});
     EXPECT_TRUE(source->committed().get());
+}
+
+TEST_F(Commit, IsMadeOnAThreadThatTakesNoSignals) {
+    sigset_t blocked;
+    sigemptyset(&blocked);
+    disk.beforeSync([&] {
+        pthread_sigmask(SIG_BLOCK, nullptr, &blocked);
+        return SQLITE_OK;
+    });
+    const auto source = open();
+    source->set("a", 1);
+    source->committed().get();
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGWINCH}) {
+        EXPECT_EQ(sigismember(&blocked, signal), 1) << signal;
+    }
 }
 
 TEST_F(Commit, ThatIsRefusedSaysWhy) {
