@@ -4,6 +4,7 @@
 #include <sys/stat.h>
 
 #include <cerrno>
+#include <chrono>
 #include <filesystem>
 #include <functional>
 #include <memory>
@@ -253,7 +254,9 @@ TEST_F(ReloadingFileSourceTest, WaitsForASlowWriterOfANewFileToClose) {
     {
         const OpenFile file(path, O_CREAT);
         file.write("a=2\n");
-        following.passFence();
+        // For longer than anything is put off.
+        const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(1200);
+        while (std::chrono::steady_clock::now() < end) following.passFence();
         file.write("b=2\n");
         EXPECT_THAT(following.told(), Not(Contains("a=2")));
     }
