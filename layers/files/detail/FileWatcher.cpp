@@ -80,6 +80,7 @@ int millisecondsUntil(QuietTime::TimePoint time, QuietTime::TimePoint now) {
 class FileWatcher::Work {
 public:
     void run() {
+        ::pthread_setname_np(::pthread_self(), "velkor-files");
         while (takeOrders()) {
             waitForEvents();
             notifications.read([this](const Inotify::Event& event) {
