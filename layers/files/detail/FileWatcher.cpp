@@ -12,9 +12,9 @@
 #include <csignal>
 #include <cstdint>
 #include <limits>
+#include <list>
 #include <system_error>
 #include <utility>
-#include <vector>
 
 #include "framework/common/Mutex.hpp"
 #include "layers/files/Loggers.hpp"
@@ -80,6 +80,7 @@ int millisecondsUntil(QuietTime::TimePoint time, QuietTime::TimePoint now) {
 class FileWatcher::Work {
 public:
     void run() {
+        ::pthread_setname_np(::pthread_self(), "velkor-files");
         while (takeOrders()) {
             waitForEvents();
             notifications.read([this](const Inotify::Event& event) {
@@ -104,7 +105,8 @@ public:
     void ring() const noexcept { bell.ring(); }
 
 private:
-    using Files = std::vector<std::shared_ptr<WatchedFile>>;
+    // Grows where a file is added: the thread itself has nobody to tell that there is no memory.
+    using Files = std::list<std::shared_ptr<WatchedFile>>;
 
     static QuietTime::TimePoint now() { return std::chrono::steady_clock::now(); }
 
@@ -117,14 +119,15 @@ private:
             if (ended) return false;
             arrived.swap(added);
         }
-        const auto left = std::partition(files.begin(), files.end(),
-                                         [](const auto& file) { return !file->hasEnded(); });
-        std::for_each(left, files.end(), [this](const auto& file) { file->stop(notifications); });
-        files.erase(left, files.end());
-        for (auto& file : arrived) {
-            files.push_back(file);
+        files.remove_if([this](const auto& file) {
+            const bool hasEnded = file->hasEnded();  // may change at any moment
+            if (hasEnded) file->stop(notifications);
+            return hasEnded;
+        });
+        for (const auto& file : arrived) {
             guarded(*file, [&] { file->start(notifications, now()); });
         }
+        files.splice(files.end(), arrived);
         return true;
     }
 
