@@ -70,8 +70,8 @@ private:
 };
 
 LiveSource::LiveSource(const std::type_info& answeringClass,
-                       configuration::ValueMap&& initialValues)
-    : TableSource(answeringClass, std::move(initialValues)) {}
+                       configuration::ValueMap&& initialValues, Code calledCode)
+    : TableSource(answeringClass, std::move(initialValues), calledCode) {}
 
 LiveSource::~LiveSource() = default;
 

@@ -67,7 +67,8 @@ protected:
 
     /// Takes over `initialValues`, which is left empty. `answeringClass` is the `typeid` of the
     /// deriving class, whose `has` and `get` are those of this base.
-    LiveSource(const std::type_info& answeringClass, configuration::ValueMap&& initialValues);
+    LiveSource(const std::type_info& answeringClass, configuration::ValueMap&& initialValues,
+               Code calledCode = Code::foreign);
     ~LiveSource() override;
 
     /// Calls `mutation` once with the table, then the listener for each key that it gives. What

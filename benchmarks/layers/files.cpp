@@ -84,27 +84,23 @@ void measureReloads() {
     }).elsewhere();
 }
 
-// Looks up keys of a file that `makeSource` makes a source of. A store keeps itself alive during a
-// read where a watcher, or a source that is not its own, may drop it.
+// Looks up keys of a file that `makeSource` makes a source of.
 template <class MakeSource>
-void measureGet(const std::string& contender, bool watched, MakeSource makeSource) {
-    measure("get/file/keys:10000/" + contender, [watched, makeSource] {
+void measureGet(const std::string& contender, MakeSource makeSource) {
+    measure("get/file/keys:10000/" + contender, [makeSource] {
         auto file = std::make_shared<TemporaryFile>(propertyText(many));
         Store store = emptyStore();
         store->addSource("file", "", 0, true, makeSource(*file)).get();
-        if (watched) store->watchOption(keyNumber(0));
         return
             [file, store, keys = KeyCycle(many)]() mutable { keep(store->get(keys.next()).get()); };
     }).counted(1024);
 }
 
 void measureReading() {
-    const auto plain = [](const TemporaryFile& file) {
+    measureGet("plain", [](const TemporaryFile& file) {
         return std::make_shared<PropertyFileSource>(file.widePath());
-    };
-    measureGet("plain", false, plain);
-    measureGet("plain-watched", true, plain);
-    measureGet("velkor", false, [](const TemporaryFile& file) {
+    });
+    measureGet("velkor", [](const TemporaryFile& file) {
         return std::make_shared<ReloadingFileSource>(file.path());
     });
 }

@@ -32,7 +32,7 @@ RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
       foreign(true) {
     if (const auto* const answering = dynamic_cast<const TableSource*>(source.get())) {
         table = answering->table();
-        foreign = !answering->isBuiltIn();
+        foreign = !answering->runsOwnCodeOnly();
     } else if (const auto* const file = dynamic_cast<const PropertyFileSource*>(source.get())) {
         texts = file->table();
         foreign = texts == nullptr;

@@ -5,7 +5,7 @@
 namespace velkor::configuration {
 
 InMemorySource::InMemorySource(ValueMap&& initialValues)
-    : TableSource(typeid(InMemorySource), std::move(initialValues), Origin::thisLibrary) {}
+    : TableSource(typeid(InMemorySource), std::move(initialValues), Code::own) {}
 
 ConfigurationValue InMemorySource::set(const std::string& key, ConfigurationValue value) {
     if (ConfigurationValue* present = values.find(key)) {

@@ -4,14 +4,9 @@
 
 namespace velkor::configuration {
 
-TableSource::TableSource(const std::type_info& answeringClass, ValueMap&& initialValues)
-    : TableSource(answeringClass, std::move(initialValues), Origin::others) {}
-
 TableSource::TableSource(const std::type_info& answeringClass, ValueMap&& initialValues,
-                         Origin origin)
-    : values(std::move(initialValues)),
-      answering(answeringClass),
-      builtIn(origin == Origin::thisLibrary) {}
+                         Code calledCode)
+    : values(std::move(initialValues)), answering(answeringClass), code(calledCode) {}
 
 TableSource::~TableSource() = default;
 

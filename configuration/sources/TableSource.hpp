@@ -32,13 +32,19 @@ public:
         return typeid(*this) == answering ? &values : nullptr;
     }
 
-    /// Whether this is exactly one of the classes of this library, which run no code of others.
-    bool isBuiltIn() const noexcept { return builtIn && table() != nullptr; }
+    /// Whether calls of this run no code that could give up the store.
+    bool runsOwnCodeOnly() const noexcept { return code == Code::own && table() != nullptr; }
 
 protected:
+    /// Whose code the calls of a class run: its own, or also that of others, callbacks for example,
+    /// who could give up the last reference to the store. With those the store takes care of itself
+    /// in each of its operations.
+    enum class Code { own, foreign };
+
     /// Takes over `initialValues`, which is left empty. Starts without a listener. `answeringClass`
     /// is the `typeid` of the deriving class, whose `has` and `get` are those of this base.
-    TableSource(const std::type_info& answeringClass, ValueMap&& initialValues);
+    TableSource(const std::type_info& answeringClass, ValueMap&& initialValues,
+                Code calledCode = Code::foreign);
 
     ~TableSource() override;
 
@@ -48,14 +54,8 @@ protected:
     ValueTable values;
 
 private:
-    friend class InMemorySource;
-
-    enum class Origin { thisLibrary, others };
-
-    TableSource(const std::type_info& answeringClass, ValueMap&& initialValues, Origin origin);
-
     const std::type_info& answering;
-    const bool builtIn;
+    const Code code;
     ChangeListener listener;
 };
 

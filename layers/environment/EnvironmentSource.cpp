@@ -25,7 +25,7 @@ configuration::ValueMap readVariables(const EnvironmentNames& names, const char*
 }  // namespace
 
 EnvironmentSource::EnvironmentSource(const EnvironmentNames& names, const char* const* variables)
-    : TableSource(typeid(EnvironmentSource), readVariables(names, variables)) {}
+    : TableSource(typeid(EnvironmentSource), readVariables(names, variables), Code::own) {}
 
 ConfigurationValue EnvironmentSource::set(const std::string&, ConfigurationValue) {
     throw std::runtime_error("EnvironmentSource does not support writing");

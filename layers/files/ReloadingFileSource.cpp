@@ -186,7 +186,8 @@ ReloadingFileSource::ReloadingFileSource(const std::filesystem::path& path,
     : ReloadingFileSource(std::make_unique<File>(path, options)) {}
 
 ReloadingFileSource::ReloadingFileSource(std::unique_ptr<File> read)
-    : LiveSource(typeid(ReloadingFileSource), std::move(read->initial)), file(std::move(read)) {}
+    : LiveSource(typeid(ReloadingFileSource), std::move(read->initial), Code::own),
+      file(std::move(read)) {}
 
 ReloadingFileSource::~ReloadingFileSource() {
     file->leave();

@@ -67,7 +67,8 @@ std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& pa
 }
 
 SqliteSource::SqliteSource(Key, std::shared_ptr<Committer> shared, ValueMap&& initialValues)
-    : LiveSource(typeid(SqliteSource), std::move(initialValues)), committer(std::move(shared)) {}
+    : LiveSource(typeid(SqliteSource), std::move(initialValues), Code::own),
+      committer(std::move(shared)) {}
 
 SqliteSource::~SqliteSource() {
     finish();
