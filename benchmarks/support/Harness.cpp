@@ -52,7 +52,19 @@ void time(const Operation& operation, benchmark::State& state) {
     }
 }
 
+void registerStated(const Operation& operation) {
+    benchmark::RegisterBenchmark(operation.name.c_str(),
+                                 [&operation](benchmark::State& state) {
+                                     const Stated run = operation.stated();
+                                     while (state.KeepRunning()) state.SetIterationTime(run());
+                                     state.counters["items"] = 1;
+                                 })
+        ->UseManualTime()
+        ->Iterations(1);
+}
+
 void registerForTiming(const Operation& operation) {
+    if (operation.stated) return registerStated(operation);
     auto* const registered = benchmark::RegisterBenchmark(
         operation.name.c_str(), [&operation](benchmark::State& state) { time(operation, state); });
     if (operation.realTime) registered->UseRealTime();
@@ -118,6 +130,12 @@ Operation& add(std::string name, std::function<Repeat()> prepare) {
     added.name = std::move(name);
     added.prepare = std::move(prepare);
     return added;
+}
+
+Operation& addStated(std::string name, std::function<Stated()> prepare) {
+    Operation& added = add(std::move(name), nullptr);
+    added.stated = std::move(prepare);
+    return added.elsewhere();
 }
 
 }  // namespace velkor::benchmarks

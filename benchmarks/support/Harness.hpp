@@ -13,11 +13,15 @@ namespace velkor::benchmarks {
 /// Runs one operation as often as asked.
 using Repeat = std::function<void(std::uint64_t times)>;
 
+/// Runs one operation and gives the seconds that it stands for, a percentile for example.
+using Stated = std::function<double()>;
+
 /// One measured operation. The program runs it in two ways: timed by Google Benchmark, or a fixed
 /// number of times with its allocations and, under callgrind, its instructions counted.
 struct Operation {
     std::string name;                  ///< "area/case/contender".
     std::function<Repeat()> prepare;   ///< Called once for every measurement.
+    std::function<Stated()> stated;    ///< In its place for what states its time.
     std::uint64_t items = 1;           ///< How many things one run handles; results are per thing.
     std::uint64_t countedRuns = 1000;  ///< 0 for what has no repeatable count.
     bool realTime = false;
@@ -52,6 +56,9 @@ Operation& measure(std::string name, Prepare prepare) {
         };
     });
 }
+
+/// Adds the operation `name`, which states its time and is run once for every measurement.
+Operation& addStated(std::string name, std::function<Stated()> prepare);
 
 /// Keeps the compiler from dropping `value`.
 template <class T>

@@ -40,8 +40,8 @@ class PreparedWrite;
 /// program writes into it isn't noticed. Values of kinds, and tables, that only a newer version
 /// knows stay in the file.
 ///
-/// Thread-safe. What waits for the disk says so; that isn't called with the mutex of the store
-/// held, which includes subscribers: the thread of the source may need it before it goes on.
+/// Thread-safe. Nobody waits for `committed` with the mutex of the store held or on the thread of
+/// the source, which includes all subscribers: that thread could not go on.
 ///
 /// When the last reference to it is given up, all that was accepted is brought onto the disk, or
 /// has been refused, and the file is closed before that returns. On the thread of the source, where
@@ -88,7 +88,7 @@ public:
     /// Resolves with true when all writes that were accepted before this call are on the disk.
     /// Fails with `std::runtime_error` "State file could not be written: ", the path, ": " and the
     /// cause when some of them are refused, or when some were that this thread wrote since it last
-    /// asked. Resolved on the thread of the source, with no mutex held.
+    /// asked. Resolved on the thread of the source, with no mutex held; a continuation runs there.
     Future<bool> committed() override;
 
     /// At most `limit` writes that are on the disk, newest first: those of one key; with a prefix

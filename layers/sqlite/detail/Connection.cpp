@@ -8,6 +8,12 @@
 
 namespace velkor::layers::detail {
 
+namespace {
+
+constexpr int patienceWithOthers = 5000;  // milliseconds
+
+}  // namespace
+
 Connection::Connection(const std::filesystem::path& path, const std::string& vfs) {
     constexpr int flags =
         SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE;
@@ -17,6 +23,7 @@ Connection::Connection(const std::filesystem::path& path, const std::string& vfs
     native.reset(opened);
     if (opened == nullptr) throw std::bad_alloc();
     if (result != SQLITE_OK) fail();
+    sqlite3_busy_timeout(opened, patienceWithOthers);
     if (sqlite3_db_readonly(opened, "main") == 1) throw std::runtime_error("it is read-only");
 }
 

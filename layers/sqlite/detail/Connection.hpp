@@ -9,7 +9,8 @@
 
 namespace velkor::layers::detail {
 
-/// A connection to one database. One thread at a time uses it and its statements.
+/// A connection to one database. One thread at a time uses it and its statements. What other
+/// programs lock is waited for, 5 s at most.
 class Connection {
 public:
     /// Opens the file for writing by the SQLite VFS named `vfs` (empty: the usual one); makes an

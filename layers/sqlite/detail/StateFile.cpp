@@ -33,7 +33,13 @@ auto explained(const char* failure, const fs::path& path, Action action) {
 /// One name for each file, however it is reached.
 fs::path resolved(const fs::path& path) {
     return explained(sqlite_errors::notOpened, path, [&] {
+        if (path.native().find('\0') != std::string::npos)
+            throw std::runtime_error("it is no file");
         fs::path file = fs::weakly_canonical(fs::absolute(path));
+        // Only a link to a file that isn't there yet is left.
+        while (fs::is_symlink(file)) {
+            file = fs::weakly_canonical(file.parent_path() / fs::read_symlink(file));
+        }
         if (fs::exists(file) && !fs::is_regular_file(file)) {
             throw std::runtime_error(fs::is_directory(file) ? "it is a folder" : "it is no file");
         }

@@ -10,6 +10,9 @@
 #include <thread>
 #include <vector>
 
+#include <pthread.h>
+#include <signal.h>
+
 #include "configuration/ConfigurationImpl.hpp"
 #include "layers/sqlite/SqliteSource.hpp"
 #include "tests/layers/sqlite/StateTesting.hpp"
@@ -77,6 +80,7 @@ TEST_F(Commit, KeepsNoWriterAndNoReaderWaiting) {
         EXPECT_EQ(textOf(store->get("second").get()), "int 2");
     }));
     letGo();
+    store->removeSource("state");  // which the other thread may hold for a moment longer
 }
 
 TEST_F(Commit, MakesOneTransactionOfAllThatWaits) {
@@ -121,12 +125,12 @@ TEST_F(Commit, AnswersOneByOneInOrder) {
 }
 
 TEST_F(Commit, TakesWhatAStoreChangesTogetherTogether) {
+    Latch synced;
     const auto source = open();
     const auto between = std::make_shared<HookedSource>();
     const auto store = std::make_shared<ConfigurationImpl>();
     store->addSource("state", "", -1, false, source);
     store->addSource("between", "between", -2, false, between);
-    Latch synced;
     disk.beforeSync([&] {
         synced.countDown();
         return SQLITE_OK;
@@ -134,6 +138,21 @@ TEST_F(Commit, TakesWhatAStoreChangesTogetherTogether) {
     between->whenSet = [&] { EXPECT_FALSE(synced.waitFor(std::chrono::milliseconds(50))); };
     store->apply({{"a", 1}, {"between.x", 1}, {"b", 2}});
     EXPECT_TRUE(source->committed().get());
+}
+
+TEST_F(Commit, IsMadeOnAThreadThatTakesNoSignals) {
+    sigset_t blocked;
+    sigemptyset(&blocked);
+    disk.beforeSync([&] {
+        pthread_sigmask(SIG_BLOCK, nullptr, &blocked);
+        return SQLITE_OK;
+    });
+    const auto source = open();
+    source->set("a", 1);
+    source->committed().get();
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGWINCH}) {
+        EXPECT_EQ(sigismember(&blocked, signal), 1) << signal;
+    }
 }
 
 TEST_F(Commit, ThatIsRefusedSaysWhy) {

@@ -162,6 +162,40 @@ TEST(StateFile, IsOneFileByAllItsPaths) {
                 StartsWith(textOfRefusal(folder.file(), "process ")));
 }
 
+TEST(StateFile, IsOneFileByALinkToNothing) {
+    const StateFolder folder;
+    const fs::path link = folder.path() / "link";
+    fs::create_symlink("state.db", link);
+    const auto source = SqliteSource::open(link);
+    EXPECT_TRUE(fs::exists(folder.file()));
+    EXPECT_THAT(refusalOf(link), StartsWith(textOfRefusal(folder.file(), "process ")));
+}
+
+TEST(StateFile, ThatIsALinkToItselfIsRefused) {
+    const StateFolder folder;
+    fs::create_symlink("state.db", folder.file());
+    EXPECT_EQ(refusalOf(folder.file()),
+              textOfRefusal(folder.file(), "Too many levels of symbolic links"));
+}
+
+TEST(StateFile, HasNoZeroInItsPath) {
+    const StateFolder folder;
+    const fs::path path = folder.file().string() + std::string("\0", 1);
+    EXPECT_EQ(refusalOf(path), textOfRefusal(path, "it is no file").c_str());
+    EXPECT_FALSE(fs::exists(folder.file()));
+}
+
+TEST(StateFile, IsWaitedForWhileAnotherProgramWritesIt) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file());
+    OtherProgram other(folder.file());
+    other.run("BEGIN IMMEDIATE");
+    source->set("a", 1);
+    auto committed = source->committed();
+    other.run("ROLLBACK");
+    EXPECT_TRUE(committed.get());
+}
+
 TEST(StateFile, IsWrittenByOneProcess) {
     const StateFolder folder;
     const Holder holder(folder.file());
