@@ -59,8 +59,8 @@ public:
     Transaction(const Transaction&) = delete;
     Transaction& operator=(const Transaction&) = delete;
 
-    /// Returns when all of it is on the disk. Throws `std::runtime_error` with the cause, and all is
-    /// taken back then.
+    /// Returns when all of it is on the disk. Throws `std::runtime_error` with the cause, and all
+    /// is taken back then.
     void commit();
 
 private:

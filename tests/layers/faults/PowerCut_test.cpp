@@ -125,7 +125,7 @@ private:
     bool wasKilled = false;
 };
 
-constexpr std::uint64_t livesOfOneFile = 25;
+constexpr std::uint64_t livesOfOneFile = 10;
 
 /// Lives until `lives` have ended, `endOf(seed)` each. Begins with a new file now and then.
 template <class EndOf>

@@ -23,7 +23,7 @@ public:
         constexpr std::chrono::hours lifetime{1};
         set("server.port", 1);
         set("server.port", 2);
-        set("text", std::string(20'000, 'x'));
+        set("text", std::string(9'000, 'x'));
         attempt([&] { source.unset("server.port"); }, [&] { model.unset("server.port"); });
         undo();
         attempt([&] { source.setFor("temporary", true, lifetime); },
