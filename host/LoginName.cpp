@@ -27,7 +27,7 @@ std::string nameOfUser(uid_t user) {
 
 std::string loginName() {
     const uid_t user = geteuid();
-    const std::string name = nameOfUser(user);
+    std::string name = nameOfUser(user);
     if (!name.empty()) return name;
     const char* const given = std::getenv("LOGNAME");
     return given != nullptr && *given != '\0' ? given : std::to_string(user);
