@@ -43,8 +43,9 @@ public:
     /// Called before each sync of the log from now on, by the thread that commits. The sync fails
     /// with what it gives, unless that is SQLITE_OK.
     void beforeSync(std::function<int()> action) {
+        auto shared = std::make_shared<const std::function<int()>>(std::move(action));
         const std::lock_guard<std::mutex> lock(mutex);
-        syncAction = std::move(action);
+        syncAction.swap(shared);
     }
 
     /// How often the log was synchronised.
@@ -81,13 +82,13 @@ private:
     }
 
     static int syncLog(sqlite3_file* file, int flags) {
-        std::function<int()> action;
+        std::shared_ptr<const std::function<int()>> action;  // takes no memory, which may be short
         {
             const std::lock_guard<std::mutex> lock(current->mutex);
             action = current->syncAction;
         }
         ++current->syncs;
-        const int answer = action ? action() : SQLITE_OK;
+        const int answer = action != nullptr ? (*action)() : SQLITE_OK;
         return answer == SQLITE_OK ? methodsOf(file).usual->xSync(file, flags) : answer;
     }
 
@@ -99,7 +100,7 @@ private:
     std::atomic<int> writeAnswer{SQLITE_OK};
     std::atomic<int> syncs{0};
     std::mutex mutex;
-    std::function<int()> syncAction;  // guarded by mutex
+    std::shared_ptr<const std::function<int()>> syncAction;  // guarded by mutex
 };
 
 }  // namespace velkor::testing
