@@ -39,13 +39,13 @@ WriteQueue::Keys keysOf(const Writes& writes) {
     return keys;
 }
 
-/// Runs `resolve` on each promise. One for which memory is short is broken, which its future tells
-/// as well.
+/// Runs `resolve` on each waiter. A promise for which memory is short is broken, which its future
+/// tells as well.
 template <class Resolve>
 void tellAll(WriteQueue::Waiters& waiters, Resolve resolve) noexcept {
     for (WriteQueue::Waiter& each : waiters) {
         try {
-            resolve(each.promise);
+            resolve(each);
         } catch (...) {
             continue;
         }
@@ -55,7 +55,7 @@ void tellAll(WriteQueue::Waiters& waiters, Resolve resolve) noexcept {
 }  // namespace
 
 void WriteQueue::Refusal::tell() noexcept {
-    tellAll(waiters, [this](Promise<bool>& promise) { promise.setException(reason); });
+    tellAll(waiters, [this](Waiter& each) { each.promise.setException(reason); });
 }
 
 WriteQueue::WriteQueue(std::int64_t newestChange, Deadlines::Map&& initialDeadlines)
@@ -89,7 +89,9 @@ Future<bool> WriteQueue::committed() {
         if (mine != untold.end()) {
             refused = mine->second;
             untold.erase(mine);
-        } else if (!waiting.empty() || !committing.empty()) {
+        }
+        if (!waiting.empty() || !committing.empty()) {
+            waiter.front().refused = refused;
             waiter.front().upTo = lastChange;
             waiter.front().thread = thread;
             waiters.splice(waiters.end(), waiter);
@@ -157,7 +159,10 @@ void WriteQueue::finish() {
                                       [upTo](const Waiter& each) { return each.upTo > upTo; });
         satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
     }
-    tellAll(satisfied, [](Promise<bool>& promise) { promise.setValue(true); });
+    tellAll(satisfied, [](Waiter& each) {
+        if (each.refused) return each.promise.setException(each.refused);
+        each.promise.setValue(true);
+    });
 }
 
 WriteQueue::Keys WriteQueue::takeBack(ValueTable* values, Refusal& refusal) {

@@ -42,6 +42,7 @@ public:
         Promise<bool> promise{};
         std::int64_t upTo = 0;
         std::thread::id thread{};
+        std::exception_ptr refused{};  ///< Why a write of its thread was before that, if one was.
     };
     using Waiters = std::list<Waiter>;
 
@@ -65,7 +66,8 @@ public:
     std::int64_t accept(PreparedWrite&& write) noexcept VELKOR_EXCLUDES(mutex);
 
     /// Resolves with true when all that waits is on the disk. Fails when some of it is refused, or
-    /// when something was that this thread wrote since it last asked.
+    /// when something was that this thread wrote since it last asked; in each case when nothing of
+    /// it waits any more.
     Future<bool> committed() VELKOR_EXCLUDES(mutex);
 
     /// The change of that number, or the last one, if it waits.

@@ -1,6 +1,8 @@
 #include <gtest/gtest.h>
 
 #include <cstddef>
+#include <cstdint>
+#include <cstdlib>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -125,6 +127,12 @@ private:
     bool wasKilled = false;
 };
 
+/// How often the power is cut: VELKOR_POWER_CUTS, or 1500 when that is not set.
+std::uint64_t powerCuts() {
+    const char* const number = std::getenv("VELKOR_POWER_CUTS");
+    return number == nullptr ? 1500 : std::stoull(number);
+}
+
 constexpr std::uint64_t livesOfOneFile = 10;
 
 /// Lives until `lives` have ended, `endOf(seed)` each. Begins with a new file now and then.
@@ -146,11 +154,11 @@ void expectToSurvive(std::uint64_t lives, EndOf endOf) {
 }
 
 TEST(PowerCut, LeavesEveryAcknowledgedWriteAndNothingByHalves) {
-    expectToSurvive(1500, [](std::uint64_t) { return End::powerCut; });
+    expectToSurvive(powerCuts(), [](std::uint64_t) { return End::powerCut; });
 }
 
 TEST(PowerCut, LeavesWhatWasAcknowledgedAmidOtherDeathsOfTheWriter) {
-    expectToSurvive(500,
+    expectToSurvive(powerCuts() / 3,
                     [](std::uint64_t seed) { return seed % 4 == 0 ? End::powerCut : End::kill; });
 }
 

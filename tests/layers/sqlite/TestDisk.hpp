@@ -9,7 +9,6 @@
 #include <mutex>
 #include <stdexcept>
 #include <string>
-#include <utility>
 
 namespace velkor::testing {
 
@@ -44,9 +43,9 @@ public:
     /// Called before each sync of the log from now on, by the thread that commits. The sync fails
     /// with what it gives, unless that is SQLITE_OK.
     void beforeSync(std::function<int()> action) {
-        auto next = std::make_shared<const std::function<int()>>(std::move(action));
+        auto shared = std::make_shared<const std::function<int()>>(std::move(action));
         const std::lock_guard<std::mutex> lock(mutex);
-        syncAction.swap(next);
+        syncAction.swap(shared);
     }
 
     /// How often the log was synchronised.
@@ -83,8 +82,7 @@ private:
     }
 
     static int syncLog(sqlite3_file* file, int flags) {
-        // Not copied, which needs memory: no exception may pass through SQLite.
-        std::shared_ptr<const std::function<int()>> action;
+        std::shared_ptr<const std::function<int()>> action;  // takes no memory, which may be short
         {
             const std::lock_guard<std::mutex> lock(current->mutex);
             action = current->syncAction;
