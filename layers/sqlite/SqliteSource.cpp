@@ -9,6 +9,7 @@
 
 #include "layers/sqlite/SqliteErrors.hpp"
 #include "layers/sqlite/detail/Committer.hpp"
+#include "layers/sqlite/detail/Endings.hpp"
 #include "layers/sqlite/detail/TableWrite.hpp"
 
 namespace velkor::layers {
@@ -17,6 +18,7 @@ using configuration::ConfigurationValue;
 using configuration::ValueMap;
 using configuration::ValueTable;
 using detail::Committer;
+using detail::Endings;
 using detail::PreparedWrite;
 
 namespace {
@@ -55,7 +57,12 @@ std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& pa
         };
     try {
         const SignalsBlocked blocked;
-        source->thread.emplace([shared, changeTable] { shared->run(changeTable); });
+        source->thread.emplace([shared, changeTable]() mutable {
+            shared->run(changeTable);
+            const bool isAlone = shared->isAlone();
+            shared.reset();
+            if (isAlone) Endings::ofAll().remove();
+        });
     } catch (const std::system_error& noThread) {
         throw std::runtime_error(sqlite_errors::notOpened + path.string() + ": " + noThread.what());
     }
@@ -75,6 +82,10 @@ SqliteSource::~SqliteSource() {
 }
 
 void SqliteSource::finish() {
+    if (thread && committer->runsHere()) {
+        committer->goOnAlone();
+        Endings::ofAll().add();
+    }
     committer->queue().end();
     thread.reset();
 }

@@ -45,7 +45,8 @@ class PreparedWrite;
 ///
 /// When the last reference to it is given up, all that was accepted is brought onto the disk, or
 /// has been refused, and the file is closed before that returns. On the thread of the source, where
-/// a subscriber may do it, it returns at once, and the thread does the rest soon afterwards.
+/// a subscriber may give up the last one, or where the store ends that it has held for a moment, it
+/// returns at once, and the thread does the rest soon afterwards: the end of the process waits.
 class VELKOR_EXPORT SqliteSource final : public LiveSource,
                                          public configuration::ForgettingSource,
                                          public configuration::DurableSource {

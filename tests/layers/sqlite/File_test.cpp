@@ -212,6 +212,15 @@ TEST(StateFile, OfAKilledProcessHasWhatWasCommittedAndCanBeWritten) {
     EXPECT_TRUE(source->committed().get());
 }
 
+TEST(StateFile, OfAProcessThatEndsHasAllThatWasWritten) {
+    for (int round = 0; round < 20; ++round) {
+        const StateFolder folder;
+        const std::string command = VELKOR_STATE_WRITER " '" + folder.file().string() + "'";
+        ASSERT_EQ(std::system(command.c_str()), 0);
+        EXPECT_TRUE(SqliteSource::open(folder.file())->has("written"));
+    }
+}
+
 TEST(StateFile, IsWrittenAgainWhenItsWriterHasGone) {
     const StateFolder folder;
     SqliteSource::open(folder.file());

@@ -22,19 +22,6 @@ using configuration::ConfigurationImpl;
 using configuration::ConfigurationValue;
 using namespace std::chrono_literals;
 
-/// Opens a file whose source is about to end on its own thread.
-std::shared_ptr<SqliteSource> openAgain(const std::filesystem::path& file) {
-    const auto end = std::chrono::steady_clock::now() + patience;
-    for (;;) {
-        try {
-            return SqliteSource::open(file);
-        } catch (const std::runtime_error&) {
-            if (std::chrono::steady_clock::now() > end) throw;
-        }
-        std::this_thread::yield();
-    }
-}
-
 TEST(Lifetime, OfASourceMayBeLongerThanThatOfItsStore) {
     const StateFolder folder;
     const auto source = SqliteSource::open(folder.file());
@@ -62,7 +49,7 @@ TEST(Lifetime, InAStoreEndsWithTheStore) {
     store->addSource("state", "", -1, false, SqliteSource::open(folder.file()));
     store->set("a", 1);
     store.reset();
-    EXPECT_EQ(textOf(SqliteSource::open(folder.file())->get("a")), "int 1");
+    EXPECT_EQ(textOf(openAgain(folder.file())->get("a")), "int 1");
 }
 
 TEST(Lifetime, OfARemovedSourceTellsTheStoreNothing) {
@@ -173,32 +160,6 @@ TEST_F(LastReferences, MayBeGivenUpByTheWriter) {
         }});
     store.get()->set("a", 2);
     expectTheirEnd();
-}
-
-TEST(Race, BetweenWritesExpiryRemovalAndTheEndOfTheStoreHarmsNothing) {
-    const StateFolder folder;
-    for (int round = 0; round < 30; ++round) {
-        auto source = SqliteSource::open(folder.file());
-        auto store = std::make_shared<ConfigurationImpl>();
-        store->addSource("state", "", -1, false, source);
-        Latch start(3);
-        std::thread writer([&start, store] {
-            EXPECT_TRUE(start.arriveAndWait());
-            for (int i = 0; i < 50; ++i) store->set("a", i);
-        });
-        std::thread expiring([&start, source] {
-            EXPECT_TRUE(start.arriveAndWait());
-            for (int i = 0; i < 50; ++i) source->setFor(std::to_string(i % 5), i, 1ms);
-            source->committed().get();
-        });
-        EXPECT_TRUE(start.arriveAndWait());
-        if (round % 2 == 0) store->removeSource("state");
-        store.reset();
-        source.reset();
-        writer.join();
-        expiring.join();
-    }
-    EXPECT_GT(SqliteSource::open(folder.file())->history("", 1).at(0).change, 0);
 }
 
 }  // namespace

@@ -12,9 +12,11 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "layers/sqlite/SqliteSource.hpp"
+#include "tests/support/BoundedWait.hpp"
 #include "tests/support/ValueText.hpp"
 
 namespace velkor::testing {
@@ -99,6 +101,19 @@ private:
     std::shared_ptr<std::atomic<std::int64_t>> micros =
         std::make_shared<std::atomic<std::int64_t>>(1'700'000'000'000'000);
 };
+
+/// Opens a file whose source may be about to end on its own thread.
+inline std::shared_ptr<SqliteSource> openAgain(const std::filesystem::path& file) {
+    const auto end = std::chrono::steady_clock::now() + patience;
+    for (;;) {
+        try {
+            return SqliteSource::open(file);
+        } catch (const std::runtime_error&) {
+            if (std::chrono::steady_clock::now() > end) throw;
+        }
+        std::this_thread::yield();
+    }
+}
 
 inline std::string nameOf(JournalAction action) {
     switch (action) {

@@ -1,0 +1,28 @@
+// Writes to the state file that it is given on the thread of its source, gives up the last
+// references there, and ends at once.
+
+#include <chrono>
+#include <future>
+#include <memory>
+
+#include <unistd.h>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "layers/sqlite/SqliteSource.hpp"
+
+int main(int, char** arguments) {
+    ::alarm(60);  // should it hang
+    auto source = velkor::layers::SqliteSource::open(arguments[1]);
+    std::promise<void> begun;
+    std::promise<void> written;
+    source->setChangeListener([&](const std::string& key) {
+        if (key != "tick" || source->has("tick")) return;
+        begun.get_future().wait();
+        source->set("written", 1);
+        source.reset();
+        written.set_value();
+    });
+    source->setFor("tick", 1, std::chrono::milliseconds(1));
+    begun.set_value();
+    written.get_future().wait();
+}
