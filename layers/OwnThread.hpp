@@ -17,7 +17,7 @@ class OwnThread {
 public:
     /// Starts a thread that runs `function`. Throws `std::system_error` when the system refuses.
     template <class F>
-    explicit OwnThread(F&& function) : OwnThread(SignalsBlocked(), std::forward<F>(function)) {}
+    explicit OwnThread(F function) : OwnThread(SignalsBlocked(), std::move(function)) {}
 
     ~OwnThread() {
         if (thread.get_id() == std::this_thread::get_id()) {

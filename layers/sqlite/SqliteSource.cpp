@@ -4,9 +4,6 @@
 #include <system_error>
 #include <utility>
 
-#include <pthread.h>
-#include <signal.h>
-
 #include "layers/sqlite/SqliteErrors.hpp"
 #include "layers/sqlite/detail/Committer.hpp"
 #include "layers/sqlite/detail/Endings.hpp"
@@ -20,27 +17,6 @@ using configuration::ValueTable;
 using detail::Committer;
 using detail::Endings;
 using detail::PreparedWrite;
-
-namespace {
-
-/// Keeps signals from threads that are started while it lives: they are for those of the program.
-class SignalsBlocked {
-public:
-    SignalsBlocked() {
-        sigset_t all;
-        sigfillset(&all);
-        pthread_sigmask(SIG_SETMASK, &all, &before);
-    }
-    ~SignalsBlocked() { pthread_sigmask(SIG_SETMASK, &before, nullptr); }
-
-    SignalsBlocked(const SignalsBlocked&) = delete;
-    SignalsBlocked& operator=(const SignalsBlocked&) = delete;
-
-private:
-    sigset_t before{};
-};
-
-}  // namespace
 
 std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& path,
                                                  const SqliteOptions& options) {
@@ -56,7 +32,6 @@ std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& pa
             return alive != nullptr;
         };
     try {
-        const SignalsBlocked blocked;
         source->thread.emplace([shared, changeTable]() mutable {
             shared->run(changeTable);
             const bool isAlone = shared->isAlone();
