@@ -38,7 +38,7 @@ protected:
                 ADD_FAILURE() << "An exception was thrown: " << error.what();
             }
         });
-        ASSERT_TRUE(detail::comes(ended, limit)) << "A call of the source doesn't return.";
+        ASSERT_TRUE(ended.comes(limit)) << "A call of the source doesn't return.";
     }
 };
 

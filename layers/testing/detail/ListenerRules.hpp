@@ -88,7 +88,7 @@ inline void toldWithoutALockOfTheSource(const MakeSubject& makeSubject) {
                     if (asked->has(key)) asked->get(key);
                     asked->keys();
                 });
-                reads->note(comes(read, patience));
+                reads->note(read.comes(patience));
             });
         trial->begin(way, "contract.first", value[1]);
         ASSERT_TRUE(reads->begins(2 * trial->patience())) << "The listener was not called.";
@@ -158,12 +158,12 @@ inline void detachingWaitsForTheListener(const MakeSubject& makeSubject) {
                 trial->source()->setChangeListener({});
                 return call->isRunning.load();
             });
-            std::ignore = comes(ranAfterwards, grace);
+            std::ignore = ranAfterwards.comes(grace);
             call->mayEnd.note(true);
-            ASSERT_TRUE(comes(ranAfterwards, trial->patience())) << "It waits for no call.";
+            ASSERT_TRUE(ranAfterwards.comes(trial->patience())) << "It waits for no call.";
             EXPECT_FALSE(ranAfterwards.get())
                 << "The listener was still running when it had been taken back.";
-            EXPECT_TRUE(comes(change, trial->patience()));
+            EXPECT_TRUE(change.comes(trial->patience()));
         });
 }
 
@@ -181,7 +181,7 @@ inline void listenerMayDetachItself(const MakeSubject& makeSubject) {
                 [trial, way, other = value[1]] { trial->begin(way, "contract.first", other); });
             ASSERT_TRUE(detached->begins(trial->patience()))
                 << "The source waits for the listener that calls it.";
-            ASSERT_TRUE(comes(change, trial->patience()));
+            ASSERT_TRUE(change.comes(trial->patience()));
             const auto latter = trial->listen();
             EXPECT_TRUE(trial->finish(way, "contract.second", value[2], *latter));
         });

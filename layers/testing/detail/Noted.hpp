@@ -51,19 +51,51 @@ private:
     std::vector<T> things VELKOR_GUARDED_BY(mutex);
 };
 
-/// Calls `function` on a thread of its own, which is left behind if nobody waits for its answer.
+/// What a function answers that runs on a thread of its own. That is waited for at the end when it
+/// has answered, and left behind otherwise.
+template <class T>
+class Answer {
+public:
+    /// Calls `function` on a new thread.
+    template <class Function>
+    static Answer of(Function function) {
+        std::packaged_task<T()> task(std::move(function));
+        auto future = task.get_future();
+        return {std::move(future), std::thread(std::move(task))};
+    }
+
+    Answer(Answer&&) noexcept = default;
+    Answer& operator=(Answer&&) = delete;
+
+    ~Answer() {
+        if (!thread.joinable()) return;
+        if (!future.valid() || comes({})) {
+            thread.join();
+        } else {
+            thread.detach();
+        }
+    }
+
+    /// Whether it is there within `limit`.
+    [[nodiscard]] bool comes(std::chrono::milliseconds limit) const {
+        return future.wait_for(limit) == std::future_status::ready;
+    }
+
+    /// Waits for it; what the function has thrown is thrown. To be called once.
+    T get() { return future.get(); }
+
+private:
+    Answer(std::future<T> given, std::thread answering)
+        : future(std::move(given)), thread(std::move(answering)) {}
+
+    std::future<T> future;
+    std::thread thread;
+};
+
+/// Calls `function` on a thread of its own.
 template <class Function>
 auto onOwnThread(Function function) {
-    std::packaged_task<decltype(function())()> task(std::move(function));
-    auto answer = task.get_future();
-    std::thread(std::move(task)).detach();
-    return answer;
-}
-
-/// Whether `answer` is there within `limit`.
-template <class T>
-[[nodiscard]] bool comes(const std::future<T>& answer, std::chrono::milliseconds limit) {
-    return answer.wait_for(limit) == std::future_status::ready;
+    return Answer<decltype(function())>::of(std::move(function));
 }
 
 }  // namespace velkor::layers::testing::detail
