@@ -1,5 +1,6 @@
 #include "layers/LiveSource.hpp"
 
+#include <exception>
 #include <stdexcept>
 #include <thread>
 #include <utility>
@@ -93,7 +94,7 @@ std::set<std::string> LiveSource::keys() {
 void LiveSource::setChangeListener(ChangeListener newListener) {
     ListenerPtr former;
     if (newListener) former = std::make_shared<const ChangeListener>(std::move(newListener));
-    Keys toTell;
+    std::list<Keys> toTell;
     {
         MutexLock lock(mutex);
         listener.swap(former);
@@ -104,7 +105,7 @@ void LiveSource::setChangeListener(ChangeListener newListener) {
             while (Call::isRunning(calls, former)) lock.wait(callEnded);
         }
     }
-    tell(toTell);
+    for (const Keys& changed : toTell) tell(changed);
 }
 
 void LiveSource::attach(std::weak_ptr<configuration::SourceHost> newHost) {
@@ -159,28 +160,35 @@ LiveSource::Attachment LiveSource::attachment() const {
 // Gives false when the source was attached or removed meanwhile: another mutex is to be held then.
 bool LiveSource::tryChange(const Attachment& expected,
                            const std::function<Keys(ValueTable&)>& mutation) {
-    Keys changed;
+    // Made before the change, after which nothing may fail that keeps it from being told.
+    std::list<Keys> changed(1);
     {
         const MutexLock lock(mutex);
         if (attachmentNumber != expected.number) return false;
-        changed = mutation(values);
+        changed.front() = mutation(values);
         const bool storeIsGoing = isAttached(attachmentNumber) && expected.host == nullptr;
         if (storeIsGoing) return true;
         if (listener == nullptr && isAttached(attachmentNumber)) {
-            untold.insert(untold.end(), changed.begin(), changed.end());
+            untold.splice(untold.end(), changed);
             return true;
         }
     }
-    tell(changed);
+    tell(changed.front());
     return true;
 }
 
 void LiveSource::tell(const Keys& changed) {
+    std::exception_ptr failure;
     for (const auto& key : changed) {
         const Call listenerCall(*this);
-        if (!listenerCall) return;
-        listenerCall(key);
+        if (!listenerCall) break;
+        try {
+            listenerCall(key);
+        } catch (...) {
+            if (!failure) failure = std::current_exception();
+        }
     }
+    if (failure) std::rethrow_exception(failure);
 }
 
 }  // namespace velkor::layers

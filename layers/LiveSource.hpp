@@ -3,6 +3,7 @@
 #include <condition_variable>
 #include <cstdint>
 #include <functional>
+#include <list>
 #include <memory>
 #include <set>
 #include <string>
@@ -73,8 +74,8 @@ protected:
 
     /// Calls `mutation` once with the table, then the listener for each key that it gives. What
     /// `mutation` throws passes on, and nobody is told; it has to leave the table as it was. What
-    /// the listener throws passes on as well; the table is changed by then. From any thread, with
-    /// or without the mutex of the store.
+    /// the listener throws passes on as well, the first of it, when it has been called for all
+    /// keys. From any thread, with or without the mutex of the store.
     void change(const std::function<Keys(configuration::ValueTable&)>& mutation);
 
     /// Called when a store is about to register the source, with the store's mutex held. What it
@@ -111,7 +112,7 @@ private:
     std::weak_ptr<configuration::SourceHost> host VELKOR_GUARDED_BY(mutex);
     std::uint64_t attachmentNumber VELKOR_GUARDED_BY(mutex) = 0;
     // What changed after the store had attached this and before it gave its listener.
-    Keys untold VELKOR_GUARDED_BY(mutex);
+    std::list<Keys> untold VELKOR_GUARDED_BY(mutex);
 };
 
 }  // namespace velkor::layers

@@ -8,7 +8,6 @@ namespace velkor::host {
 
 namespace {
 
-using layers::JournalAction;
 using layers::JournalEntry;
 
 layers::SqliteOptions optionsFor(const std::string& author) {
@@ -17,25 +16,13 @@ layers::SqliteOptions optionsFor(const std::string& author) {
     return options;
 }
 
-const char* nameOf(JournalAction action) {
-    switch (action) {
-        case JournalAction::set:
-            return "set";
-        case JournalAction::unset:
-            return "unset";
-        case JournalAction::undo:
-            return "undo";
-        case JournalAction::expired:
-            return "expired";
-        case JournalAction::other:
-            break;
-    }
-    return "other";
-}
-
 StateChange changeOf(JournalEntry&& entry) {
-    return {entry.change,          entry.when,           std::move(entry.author),
-            nameOf(entry.action),  std::move(entry.key), std::move(entry.before),
+    return {entry.change,
+            entry.when,
+            std::move(entry.author),
+            std::string(nameOf(entry.action)),
+            std::move(entry.key),
+            std::move(entry.before),
             std::move(entry.after)};
 }
 

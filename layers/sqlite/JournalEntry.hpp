@@ -1,9 +1,12 @@
 #pragma once
 
+#include <array>
 #include <chrono>
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
+#include <utility>
 
 #include "configuration/ConfigurationValue.hpp"
 
@@ -17,6 +20,23 @@ enum class JournalAction {
     expired,  ///< The time of the value was over.
     other,    ///< In a way that this version doesn't know.
 };
+
+/// The names of the actions, which are those in the file.
+inline constexpr std::array<std::pair<JournalAction, std::string_view>, 5> journalActions{{
+    {JournalAction::set, "set"},
+    {JournalAction::unset, "unset"},
+    {JournalAction::undo, "undo"},
+    {JournalAction::expired, "expired"},
+    {JournalAction::other, "other"},
+}};
+
+/// The name of `action`.
+constexpr std::string_view nameOf(JournalAction action) noexcept {
+    for (const auto& named : journalActions) {
+        if (named.first == action) return named.second;
+    }
+    return "other";
+}
 
 /// One write of a `SqliteSource`.
 struct JournalEntry {

@@ -159,6 +159,22 @@ TEST_F(LiveSourceTest, WhatAListenerThrowsPassesOnWhenTheValueIsChanged) {
     EXPECT_EQ(textOf(source->get("a")), "2");
 }
 
+TEST_F(LiveSourceTest, AListenerThatThrowsIsToldOfTheOtherKeys) {
+    std::vector<std::string> calls;
+    source->setChangeListener([&](const std::string& key) {
+        calls.push_back(key);
+        throw std::runtime_error(key);
+    });
+
+    EXPECT_THAT(
+        [&] {
+            source->tick({{"a", "2"}, {"b", "3"}});
+        },
+        ::testing::ThrowsMessage<std::runtime_error>("a"));
+
+    EXPECT_THAT(calls, ElementsAre("a", "b"));
+}
+
 TEST_F(LiveSourceTest, IsStartedByRegistrationAndStoppedByRemoval) {
     add();
     EXPECT_EQ(source->startedCount, 1);

@@ -9,7 +9,6 @@
 #include <array>
 #include <cerrno>
 #include <chrono>
-#include <csignal>
 #include <cstdint>
 #include <limits>
 #include <list>
@@ -25,23 +24,6 @@ using common::Mutex;
 using common::MutexLock;
 
 namespace {
-
-// Held back from the thread that is started meanwhile: signals of the process are for others.
-class SignalsBlocked {
-public:
-    SignalsBlocked() {
-        sigset_t all;
-        ::sigfillset(&all);
-        ::pthread_sigmask(SIG_SETMASK, &all, &before);
-    }
-    ~SignalsBlocked() { ::pthread_sigmask(SIG_SETMASK, &before, nullptr); }
-
-    SignalsBlocked(const SignalsBlocked&) = delete;
-    SignalsBlocked& operator=(const SignalsBlocked&) = delete;
-
-private:
-    sigset_t before{};
-};
 
 // Wakes the thread.
 class Bell {
@@ -189,7 +171,6 @@ std::shared_ptr<FileWatcher> FileWatcher::ofProcess() {
 }
 
 FileWatcher::FileWatcher() : work(std::make_shared<Work>()) {
-    const SignalsBlocked duringTheStart;
     thread.emplace([work = work] { work->run(); });
 }
 

@@ -1,7 +1,6 @@
 #include "layers/sqlite/detail/Journal.hpp"
 
 #include <algorithm>
-#include <array>
 #include <limits>
 #include <string_view>
 #include <utility>
@@ -14,22 +13,8 @@ namespace {
 
 using configuration::ConfigurationValue;
 
-constexpr std::array<std::pair<JournalAction, std::string_view>, 4> actionNames{{
-    {JournalAction::set, "set"},
-    {JournalAction::unset, "unset"},
-    {JournalAction::undo, "undo"},
-    {JournalAction::expired, "expired"},
-}};
-
-std::string_view nameOf(JournalAction action) {
-    for (const auto& named : actionNames) {
-        if (named.first == action) return named.second;
-    }
-    return "other";
-}
-
 JournalAction actionNamed(std::string_view name) {
-    for (const auto& named : actionNames) {
+    for (const auto& named : journalActions) {
         if (named.second == name) return named.first;
     }
     return JournalAction::other;

@@ -23,7 +23,7 @@ namespace velkor::layers::detail {
 
 /// The writes that stand in the table of a source and not yet on the disk, and who waits for them.
 ///
-/// Thread-safe. `tryAccept`, `begin` and `takeBack` are called with the own mutex of the source
+/// Thread-safe. `accept`, `begin` and `takeBack` are called with the own mutex of the source
 /// held, so that the order here is that of the table; the mutex of this is taken after it.
 class WriteQueue {
 public:

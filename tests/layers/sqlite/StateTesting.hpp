@@ -115,26 +115,11 @@ inline std::shared_ptr<SqliteSource> openAgain(const std::filesystem::path& file
     }
 }
 
-inline std::string nameOf(JournalAction action) {
-    switch (action) {
-        case JournalAction::set:
-            return "set";
-        case JournalAction::unset:
-            return "unset";
-        case JournalAction::undo:
-            return "undo";
-        case JournalAction::expired:
-            return "expired";
-        case JournalAction::other:
-            break;
-    }
-    return "other";
-}
-
 /// "1 alice set key: int 1 -> int 2".
 inline std::string textOf(const JournalEntry& entry) {
-    return std::to_string(entry.change) + " " + entry.author + " " + nameOf(entry.action) + " " +
-           entry.key + ": " + (entry.before ? textOf(*entry.before) : "none") + " -> " +
+    return std::to_string(entry.change) + " " + entry.author + " " +
+           std::string(nameOf(entry.action)) + " " + entry.key + ": " +
+           (entry.before ? textOf(*entry.before) : "none") + " -> " +
            (entry.after ? textOf(*entry.after) : "none");
 }
 
