@@ -95,6 +95,10 @@ public:
     /// All sources in order of precedence.
     Future<std::vector<SourceDescription>> describeSources();
 
+    /// The source that is registered under `name`; null when there is none. Its groups and order
+    /// are the store's: its keys are without the group.
+    Future<std::shared_ptr<ConfigurationSource>> findSource(const std::string& name);
+
     /// Every source that holds `key` with the value it gives, in order of precedence: the first is
     /// the effective one. Empty when there is none.
     Future<std::vector<Option>> explain(const std::string& key);

@@ -61,6 +61,13 @@ Future<std::vector<SourceDescription>> ConfigurationImpl::describeSources() {
     return makeReadyFuture(sources.describe());
 }
 
+Future<std::shared_ptr<ConfigurationSource>> ConfigurationImpl::findSource(
+    const std::string& name) {
+    const Operation operation(*this);
+    const auto* const found = sources.find(name);
+    return makeReadyFuture(found == nullptr ? nullptr : found->source);
+}
+
 Future<std::vector<Option>> ConfigurationImpl::explain(const std::string& key) {
     const Operation operation(*this);
     return makeReadyFuture(sources.holders(key));

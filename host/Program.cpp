@@ -32,9 +32,9 @@
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
-#include "host/messages/MessageService.hpp"
 #include "host/sources/SourceLoader.hpp"
 #include "host/state/StateLayer.hpp"
+#include "messages/MessageService.hpp"
 #include "settings/Describe.hpp"
 #include "settings/Secrets.hpp"
 
@@ -63,10 +63,11 @@ public:
           console(registry, output, [this] { store->acknowledge(); }),
           service(store),
           storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
-          hostCommands({store, std::make_shared<Watches>(store, showValue()),
-                        service.dispatcherFor(allRequestTypes()), [this] { console.quit(); },
-                        [this](const auto& name) { return problemOf(name); }},
-                       registry) {}
+          hostCommands(
+              {store, std::make_shared<Watches>(store, showValue()),
+               service.dispatcherFor(messages::allRequestTypes()), [this] { console.quit(); },
+               [this](const auto& name) { return problemOf(name); }},
+              registry) {}
 
     // Threads of sources may be about to announce something still.
     ~Session() { announcements->close(); }
@@ -150,7 +151,7 @@ private:
     std::shared_ptr<SessionStore> store;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
-    MessageService service;
+    messages::MessageService service;
     configuration::ConfigurationCommandProvider storeCommands;
     HostCommands hostCommands;
     std::shared_ptr<const void> declared;

@@ -8,7 +8,7 @@
 #include "host/SessionStore.hpp"
 #include "host/console/CommandRegistration.hpp"
 #include "host/console/Watches.hpp"
-#include "host/messages/MessageDispatcher.hpp"
+#include "messages/MessageDispatcher.hpp"
 
 namespace velkor::host {
 
@@ -16,7 +16,7 @@ namespace velkor::host {
 struct HostServices {
     std::shared_ptr<SessionStore> store;
     std::shared_ptr<Watches> watches;
-    std::shared_ptr<const MessageDispatcher> messages;
+    std::shared_ptr<const messages::MessageDispatcher> dispatcher;
     std::function<void()> quit;  ///< Ends the session.
     /// What is the matter with the source of that name; empty when nothing is.
     std::function<std::string(const std::string& name)> problemOf = [](const auto&) {

@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "host/messages/MessageDispatcher.hpp"
+#include "messages/MessageDispatcher.hpp"
 
 namespace velkor::host {
 
@@ -14,7 +14,7 @@ namespace velkor::host {
 /// TYPE is the name of a message type, or its last word; JSON is {} when there is none. A request
 /// without a reply throws `CommandError` with the dispatcher's text; one without a TYPE
 /// `std::out_of_range`. The reply shows the values of the `secret` keys as •••.
-std::string sendMessage(const MessageDispatcher& dispatcher,
+std::string sendMessage(const messages::MessageDispatcher& dispatcher,
                         const std::vector<std::string>& arguments,
                         const std::set<std::string>& secret);
 

@@ -77,7 +77,8 @@ std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSec
     return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(const StorePtr& store, const std::vector<StateChange>& changes) {
+std::string historyTable(const StorePtr& store,
+                         const std::vector<configuration::RecordedChange>& changes) {
     const auto secrets = settings::secretKeys(store);
     std::vector<std::vector<std::string>> rows{
         {"CHANGE", "TIME", "WHO", "KEY", "ACTION", "BEFORE", "AFTER"}};

@@ -1,29 +1,17 @@
 #include "host/state/SqliteState.hpp"
 
-#include <algorithm>
-#include <iterator>
 #include <utility>
 
 namespace velkor::host {
 
-namespace {
+using configuration::RecordedChange;
 
-using layers::JournalEntry;
+namespace {
 
 layers::SqliteOptions optionsFor(const std::string& author) {
     layers::SqliteOptions options;
     options.author = author;
     return options;
-}
-
-StateChange changeOf(JournalEntry&& entry) {
-    return {entry.change,
-            entry.when,
-            std::move(entry.author),
-            std::string(nameOf(entry.action)),
-            std::move(entry.key),
-            std::move(entry.before),
-            std::move(entry.after)};
 }
 
 }  // namespace
@@ -44,17 +32,13 @@ Future<bool> SqliteState::committed() {
     return layer->committed();
 }
 
-std::vector<StateChange> SqliteState::history(const std::string& keyOrPrefix, std::size_t limit) {
-    auto entries = layer->history(keyOrPrefix, limit);
-    std::vector<StateChange> changes;
-    changes.reserve(entries.size());
-    std::transform(std::make_move_iterator(entries.begin()), std::make_move_iterator(entries.end()),
-                   std::back_inserter(changes), changeOf);
-    return changes;
+std::vector<RecordedChange> SqliteState::history(const std::string& keyOrPrefix,
+                                                 std::size_t limit) {
+    return layer->changes(keyOrPrefix, limit);
 }
 
-StateChange SqliteState::undo(std::optional<std::int64_t> number) {
-    return changeOf(layer->undo(number));
+RecordedChange SqliteState::undo(std::optional<std::int64_t> number) {
+    return recorded(layer->undo(number));
 }
 
 }  // namespace velkor::host

@@ -18,8 +18,9 @@ public:
     void setFor(const std::string& key, configuration::ConfigurationValue value,
                 std::chrono::milliseconds lifetime) override;
     Future<bool> committed() override;
-    std::vector<StateChange> history(const std::string& keyOrPrefix, std::size_t limit) override;
-    StateChange undo(std::optional<std::int64_t> number) override;
+    std::vector<configuration::RecordedChange> history(const std::string& keyOrPrefix,
+                                                       std::size_t limit) override;
+    configuration::RecordedChange undo(std::optional<std::int64_t> number) override;
 
 private:
     const std::shared_ptr<layers::SqliteSource> layer;

@@ -10,20 +10,10 @@
 
 #include "configuration/ConfigurationValue.hpp"
 #include "configuration/sources/ConfigurationSource.hpp"
+#include "configuration/sources/JournaledSource.hpp"
 #include "framework/Future.hpp"
 
 namespace velkor::host {
-
-/// One change of the layer that lasts, as its journal has it.
-struct StateChange {
-    std::int64_t number = 0;
-    std::chrono::system_clock::time_point when{};
-    std::string author{};
-    std::string action{};  ///< set, unset, undo, expired, or other.
-    std::string key{};
-    std::optional<configuration::ConfigurationValue> before{};
-    std::optional<configuration::ConfigurationValue> after{};
-};
 
 /// The layer of a session that outlasts it. Thread-safe. What an operation throws names the place
 /// and the reason in one line.
@@ -41,13 +31,13 @@ public:
     /// Resolves when all that was written before is on disk; fails with the reason when it is not.
     virtual Future<bool> committed() = 0;
 
-    /// The newest changes, at most `limit`, of a key, of all keys that a prefix with "." at its end
-    /// begins, or, where that is empty, of all keys. The newest comes first.
-    virtual std::vector<StateChange> history(const std::string& keyOrPrefix, std::size_t limit) = 0;
+    /// As `configuration::JournaledSource::changes`.
+    virtual std::vector<configuration::RecordedChange> history(const std::string& keyOrPrefix,
+                                                               std::size_t limit) = 0;
 
     /// Takes back the change with that number, or the newest one, by a change of its own, which it
     /// gives.
-    virtual StateChange undo(std::optional<std::int64_t> number) = 0;
+    virtual configuration::RecordedChange undo(std::optional<std::int64_t> number) = 0;
 };
 
 /// The layer in the file at `path`, which is made when it is missing. Changes are by `author`.

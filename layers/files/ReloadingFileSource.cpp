@@ -201,6 +201,18 @@ FileStatus ReloadingFileSource::status() const {
     return file->status();
 }
 
+configuration::SourceState ReloadingFileSource::state() const {
+    auto [loaded, problem] = status();
+    configuration::SourceState state;
+    state.isWell = !problem;
+    state.updated = loaded;
+    if (problem) {
+        state.since = problem->since;
+        state.lastError = std::move(problem->text);
+    }
+    return state;
+}
+
 const std::filesystem::path& ReloadingFileSource::path() const noexcept {
     return file->place;
 }

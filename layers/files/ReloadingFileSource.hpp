@@ -8,6 +8,7 @@
 #include <string>
 
 #include "configuration/ConfigurationValue.hpp"
+#include "configuration/sources/MonitoredSource.hpp"
 #include "framework/common/Export.hpp"
 #include "layers/LiveSource.hpp"
 
@@ -70,6 +71,7 @@ struct FileStatus {
 /// Watchers are called on it: what they wait for, all the files do. Reading doesn't wait for files.
 class VELKOR_EXPORT ReloadingFileSource final
     : public LiveSource,
+      public configuration::MonitoredSource,
       public std::enable_shared_from_this<ReloadingFileSource> {
 public:
     /// Reads the file at `path`, which stands for the same place from now on if it is relative.
@@ -90,6 +92,9 @@ public:
 
     /// From any thread.
     FileStatus status() const;
+
+    /// `status` as of any source: well while there is no problem.
+    configuration::SourceState state() const override;
 
     /// The absolute path.
     const std::filesystem::path& path() const noexcept;

@@ -9,6 +9,8 @@
 #include <utility>
 
 #include "configuration/ConfigurationValue.hpp"
+#include "configuration/sources/JournaledSource.hpp"
+#include "framework/common/Export.hpp"
 
 namespace velkor::layers {
 
@@ -52,5 +54,8 @@ struct JournalEntry {
     /// then, the bytes that are in the file.
     bool known = true;
 };
+
+/// `entry` as a change of any source.
+VELKOR_EXPORT configuration::RecordedChange recorded(JournalEntry&& entry);
 
 }  // namespace velkor::layers

@@ -110,6 +110,15 @@ std::vector<JournalEntry> SqliteSource::history(const std::string& keyOrPrefix, 
     return committer->stateFile().history(keyOrPrefix, limit);
 }
 
+std::vector<configuration::RecordedChange> SqliteSource::changes(const std::string& keyOrPrefix,
+                                                                 std::size_t limit) {
+    auto entries = history(keyOrPrefix, limit);
+    std::vector<configuration::RecordedChange> changes;
+    changes.reserve(entries.size());
+    for (auto& entry : entries) changes.push_back(recorded(std::move(entry)));
+    return changes;
+}
+
 JournalEntry SqliteSource::undo(std::optional<std::int64_t> change) {
     JournalEntry undone = committer->find(change);
     if (!undone.known) {

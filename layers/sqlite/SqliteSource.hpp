@@ -11,6 +11,7 @@
 
 #include "configuration/sources/DurableSource.hpp"
 #include "configuration/sources/ForgettingSource.hpp"
+#include "configuration/sources/JournaledSource.hpp"
 #include "framework/Future.hpp"
 #include "framework/common/Export.hpp"
 #include "layers/LiveSource.hpp"
@@ -49,7 +50,8 @@ class PreparedWrite;
 /// returns at once, and the thread does the rest soon afterwards: the end of the process waits.
 class VELKOR_EXPORT SqliteSource final : public LiveSource,
                                          public configuration::ForgettingSource,
-                                         public configuration::DurableSource {
+                                         public configuration::DurableSource,
+                                         public configuration::JournaledSource {
     struct Key {};
 
 public:
@@ -97,6 +99,10 @@ public:
     /// disk. Throws `std::runtime_error` "State file could not be read: ", the path, ": " and the
     /// cause.
     std::vector<JournalEntry> history(const std::string& keyOrPrefix, std::size_t limit);
+
+    /// `history` as of any source.
+    std::vector<configuration::RecordedChange> changes(const std::string& keyOrPrefix,
+                                                       std::size_t limit) override;
 
     /// Gives the key of a change, the last one unless its number is given, the value that it had
     /// before, for good, or unsets it; a write of its own, which is returned and can be undone as

@@ -1,9 +1,12 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <memory>
 #include <string>
 #include <vector>
 
+#include "configuration/ConfigurationImpl.hpp"
+#include "configuration/sources/InMemorySource.hpp"
 #include "tests/configuration/StoreTesting.hpp"
 
 namespace velkor::configuration {
@@ -85,6 +88,18 @@ TEST_F(SourceExplanation, DescriptionFollowsChanges) {
     EXPECT_THAT(names(), ElementsAre("override", "extra", "default"));
     store->removeSource("override");
     EXPECT_THAT(names(), ElementsAre("extra", "default"));
+}
+
+TEST(FindSource, GivesTheOneThatIsRegisteredUnderTheName) {
+    const auto store = std::make_shared<ConfigurationImpl>();
+    const auto source = std::make_shared<InMemorySource>(ValueMap{{"a", 1}});
+    store->addSource("mine", "net", 5, false, source);
+    EXPECT_EQ(store->findSource("mine").get(), source);
+}
+
+TEST(FindSource, GivesNullForANameThatNoSourceHas) {
+    const auto store = std::make_shared<ConfigurationImpl>();
+    EXPECT_EQ(store->findSource("mine").get(), nullptr);
 }
 
 }  // namespace

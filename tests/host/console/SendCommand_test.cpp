@@ -9,7 +9,7 @@
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "host/console/HostCommands.hpp"
-#include "host/messages/MessageService.hpp"
+#include "messages/MessageService.hpp"
 #include "settings/Setting.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -24,10 +24,10 @@ protected:
     std::string send(Words arguments) { return registry->find("send")->run(std::move(arguments)); }
 
     std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
-    MessageService service{store};
+    messages::MessageService service{store};
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     HostCommands commands{{store, std::make_shared<Watches>(store, [](const auto&, const auto&) {}),
-                           service.dispatcherFor(allRequestTypes()), [] {}},
+                           service.dispatcherFor(messages::allRequestTypes()), [] {}},
                           registry};
 };
 

@@ -33,19 +33,20 @@ public:
         return commit();
     }
 
-    std::vector<StateChange> history(const std::string& keyOrPrefix, std::size_t limit) override {
+    std::vector<configuration::RecordedChange> history(const std::string& keyOrPrefix,
+                                                       std::size_t limit) override {
         calls.push_back("history '" + keyOrPrefix + "' " + std::to_string(limit));
         return changes;
     }
 
-    StateChange undo(std::optional<std::int64_t> number) override {
+    configuration::RecordedChange undo(std::optional<std::int64_t> number) override {
         calls.push_back("undo " + (number ? std::to_string(*number) : "the newest"));
         return changes.at(0);
     }
 
     const std::shared_ptr<configuration::InMemorySource> values =
         std::make_shared<configuration::InMemorySource>(configuration::ValueMap());
-    std::vector<StateChange> changes;
+    std::vector<configuration::RecordedChange> changes;
     std::vector<std::string> calls;
     std::function<Future<bool>()> commit = [] { return makeReadyFuture(true); };
 };

@@ -80,6 +80,25 @@ TEST_F(ReloadingFileSourceTest, HoldsThePropertiesOfTheFile) {
     EXPECT_FALSE(source.status().problem);
 }
 
+TEST_F(ReloadingFileSourceTest, IsWellWhileItsFileCanBeRead) {
+    FileFolder::write(path, "a = 1\n");
+
+    const ReloadingFileSource source(path);
+
+    EXPECT_TRUE(source.state().isWell);
+    EXPECT_EQ(source.state().updated, source.status().loaded);
+    EXPECT_EQ(source.state().lastError, "");
+}
+
+TEST_F(ReloadingFileSourceTest, TellsItsProblemAsAnySourceDoes) {
+    const ReloadingFileSource source(path, mayBeUnreadable());
+
+    EXPECT_FALSE(source.state().isWell);
+    EXPECT_EQ(source.state().since, source.status().problem->since);
+    EXPECT_EQ(source.state().lastError, problemOf(source));
+    EXPECT_EQ(source.state().updated, std::nullopt);
+}
+
 TEST_F(ReloadingFileSourceTest, RefusesToBeWritten) {
     FileFolder::write(path, "a=1\n");
     ReloadingFileSource source(path);

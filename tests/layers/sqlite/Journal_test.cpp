@@ -38,6 +38,24 @@ TEST(Journal, SaysWhen) {
     EXPECT_EQ(source->history("a", 1).at(0).when, clock.now());
 }
 
+TEST(Journal, CanBeReadAsThatOfAnySource) {
+    const StateFolder folder;
+    const auto source = SqliteSource::open(folder.file(), by("alice"));
+    source->set("a", 1);
+    source->unset("a");
+
+    const auto changes = source->changes("a", 1);
+
+    ASSERT_EQ(changes.size(), 1U);
+    const auto& last = changes.front();
+    EXPECT_EQ(last.number, 2);
+    EXPECT_EQ(last.author, "alice");
+    EXPECT_EQ(last.action, "unset");
+    EXPECT_EQ(last.key, "a");
+    EXPECT_EQ(last.before, configuration::ConfigurationValue(1));
+    EXPECT_EQ(last.after, std::nullopt);
+}
+
 TEST(Journal, GoesOnWhereItEnded) {
     const StateFolder folder;
     SqliteSource::open(folder.file(), by("alice"))->set("a", 1);

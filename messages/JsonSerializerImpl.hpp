@@ -8,10 +8,12 @@
 #include <unordered_map>
 
 #include "framework/Message.hpp"
+#include "framework/common/Export.hpp"
 #include "framework/common/Mutex.hpp"
 #include "framework/json/JsonSerializer.hpp"
+#include "messages/JsonText.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 /// A message as it travels.
 struct JsonMessage {
@@ -20,19 +22,20 @@ struct JsonMessage {
 };
 
 /// A message type that is not registered.
-class UnknownMessageType : public std::invalid_argument {
+class VELKOR_EXPORT UnknownMessageType : public std::invalid_argument {
 public:
     using std::invalid_argument::invalid_argument;
 };
 
-/// The host's registry of message types, and the way from messages to text and back.
+/// The registry of message types, and the way from messages to text and back.
 ///
 /// Thread-safe. Registered functions run on the calling thread with no lock held; withdrawing a
 /// type doesn't wait for those that still run.
-class JsonSerializerImpl : public json::JsonSerializer {
+class VELKOR_EXPORT JsonSerializerImpl : public json::JsonSerializer {
 public:
     /// Knows one type already: "velkor/Message", the acknowledgement without content, `{}`.
-    JsonSerializerImpl();
+    /// Texts beyond `textLimits` are not decoded.
+    explicit JsonSerializerImpl(const JsonLimits& textLimits = {});
 
     /// Throws `std::invalid_argument` "Message type already registered: " and `name` when there is
     /// that name or `type` already; nothing has changed then.
@@ -64,10 +67,11 @@ private:
     std::shared_ptr<const Form> formOf(const std::type_info& type) const VELKOR_EXCLUDES(mutex);
     std::shared_ptr<const Form> formOf(const std::string& name) const VELKOR_EXCLUDES(mutex);
 
+    const JsonLimits limits;
     mutable common::Mutex mutex;
     std::unordered_map<std::type_index, std::shared_ptr<const Form>> byType
         VELKOR_GUARDED_BY(mutex);
     std::unordered_map<std::string, std::shared_ptr<const Form>> byName VELKOR_GUARDED_BY(mutex);
 };
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

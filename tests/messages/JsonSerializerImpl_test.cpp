@@ -1,4 +1,4 @@
-#include "host/messages/JsonSerializerImpl.hpp"
+#include "messages/JsonSerializerImpl.hpp"
 
 #include <Poco/JSON/Object.h>
 #include <gtest/gtest.h>
@@ -11,10 +11,10 @@
 #include <utility>
 #include <vector>
 
-#include "host/messages/JsonText.hpp"
+#include "messages/JsonText.hpp"
 #include "tests/support/BoundedWait.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 namespace {
 
 using velkor::testing::completesWithin;
@@ -195,4 +195,4 @@ TEST_F(Registry, IsSafeForConcurrentUse) {
 }
 
 }  // namespace
-}  // namespace velkor::host
+}  // namespace velkor::messages

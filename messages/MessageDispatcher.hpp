@@ -7,9 +7,10 @@
 
 #include "framework/Message.hpp"
 #include "framework/ServiceProvider.hpp"
-#include "host/messages/JsonSerializerImpl.hpp"
+#include "framework/common/Export.hpp"
+#include "messages/JsonSerializerImpl.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 /// Why a request got no reply.
 enum class DispatchFailure {
@@ -38,8 +39,8 @@ using DispatchResult = std::variant<JsonMessage, DispatchError>;
 using MessageTypeNames = std::set<std::string>;
 
 /// Answers the requests of one front end, which come as JSON text. Immutable: safe for concurrent
-/// use as far as the service is. Shares the registry and the service with the rest of the host.
-class MessageDispatcher {
+/// use as far as the service is. Shares the registry and the service with its other users.
+class VELKOR_EXPORT MessageDispatcher {
 public:
     /// Requests of the `allowed` types are built by `serializer` and delivered to `service`;
     /// neither is null.
@@ -63,4 +64,4 @@ private:
     MessageTypeNames allowedTypes;
 };
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

@@ -9,8 +9,8 @@
 #include "configuration/service/ConfigurationJsonSerialization.hpp"
 #include "configuration/service/ConfigurationServiceProviderImpl.hpp"
 #include "configuration/service/MessageTypes.hpp"
-#include "host/messages/JsonSerializerImpl.hpp"
-#include "host/messages/MessageDispatcher.hpp"
+#include "messages/JsonSerializerImpl.hpp"
+#include "messages/MessageDispatcher.hpp"
 
 namespace velkor::testing {
 
@@ -20,7 +20,7 @@ public:
     RunningService() { provider->setRunning(true); }
 
     /// Sends a message; `type` is the name of its class in the configuration.
-    host::DispatchResult send(const std::string& type, const std::string& json) const {
+    messages::DispatchResult send(const std::string& type, const std::string& json) const {
         return dispatcher.dispatch({"velkor/configuration/" + type, json});
     }
 
@@ -28,52 +28,52 @@ public:
         std::make_shared<configuration::ConfigurationImpl>();
     std::shared_ptr<configuration::ConfigurationServiceProviderImpl> provider =
         std::make_shared<configuration::ConfigurationServiceProviderImpl>(store);
-    std::shared_ptr<host::JsonSerializerImpl> serializer =
-        std::make_shared<host::JsonSerializerImpl>();
+    std::shared_ptr<messages::JsonSerializerImpl> serializer =
+        std::make_shared<messages::JsonSerializerImpl>();
     configuration::ConfigurationJsonSerialization serialization{serializer};
-    host::MessageDispatcher dispatcher{serializer, provider, everyType()};
+    messages::MessageDispatcher dispatcher{serializer, provider, everyType()};
 
 private:
-    static host::MessageTypeNames everyType() {
-        host::MessageTypeNames names{"velkor/Message"};
+    static messages::MessageTypeNames everyType() {
+        messages::MessageTypeNames names{"velkor/Message"};
         configuration::forEachMessageType([&](const auto& type) { names.insert(type.name()); });
         return names;
     }
 };
 
 /// The name of a failure, for readable comparisons.
-inline std::string nameOf(host::DispatchFailure failure) {
+inline std::string nameOf(messages::DispatchFailure failure) {
     switch (failure) {
-        case host::DispatchFailure::unknownType:
+        case messages::DispatchFailure::unknownType:
             return "unknown type";
-        case host::DispatchFailure::forbiddenType:
+        case messages::DispatchFailure::forbiddenType:
             return "forbidden type";
-        case host::DispatchFailure::noJsonObject:
+        case messages::DispatchFailure::noJsonObject:
             return "no JSON object";
-        case host::DispatchFailure::notRunning:
+        case messages::DispatchFailure::notRunning:
             return "not running";
-        case host::DispatchFailure::misrouted:
+        case messages::DispatchFailure::misrouted:
             return "misrouted";
-        case host::DispatchFailure::missingOption:
+        case messages::DispatchFailure::missingOption:
             return "missing option";
-        case host::DispatchFailure::notWritable:
+        case messages::DispatchFailure::notWritable:
             return "not writable";
-        case host::DispatchFailure::duplicateSource:
+        case messages::DispatchFailure::duplicateSource:
             return "duplicate source";
-        case host::DispatchFailure::fileNotOpened:
+        case messages::DispatchFailure::fileNotOpened:
             return "file not opened";
-        case host::DispatchFailure::other:
+        case messages::DispatchFailure::other:
             return "other";
     }
     return "no such failure";
 }
 
 /// "reply TYPE JSON" or "failure KIND".
-inline std::string outcomeOf(const host::DispatchResult& result) {
-    if (const auto* error = std::get_if<host::DispatchError>(&result)) {
+inline std::string outcomeOf(const messages::DispatchResult& result) {
+    if (const auto* error = std::get_if<messages::DispatchError>(&result)) {
         return "failure " + nameOf(error->failure);
     }
-    const auto& reply = std::get<host::JsonMessage>(result);
+    const auto& reply = std::get<messages::JsonMessage>(result);
     return "reply " + reply.type + " " + reply.json;
 }
 

@@ -4,10 +4,10 @@
 #include <string>
 #include <vector>
 
-#include "host/messages/JsonText.hpp"
-#include "tests/host/messages/RunningService.hpp"
+#include "messages/JsonText.hpp"
+#include "tests/messages/RunningService.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 namespace {
 
 using namespace std::string_literals;
@@ -174,4 +174,4 @@ INSTANTIATE_TEST_SUITE_P(Json, HostileText, ::testing::ValuesIn(texts),
                          [](const auto& tested) { return tested.param.name; });
 
 }  // namespace
-}  // namespace velkor::host
+}  // namespace velkor::messages

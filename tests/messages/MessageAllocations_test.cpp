@@ -6,10 +6,10 @@
 #include <string>
 #include <vector>
 
-#include "tests/host/messages/RunningService.hpp"
+#include "tests/messages/RunningService.hpp"
 #include "tests/support/AllocationCounter.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 namespace {
 
 using velkor::testing::AllocationFailure;
@@ -80,4 +80,4 @@ INSTANTIATE_TEST_SUITE_P(Requests, AnyAllocation, ::testing::ValuesIn(requests),
                          [](const auto& tested) { return tested.param.name; });
 
 }  // namespace
-}  // namespace velkor::host
+}  // namespace velkor::messages

@@ -1,11 +1,11 @@
-#include "host/messages/MessageService.hpp"
+#include "messages/MessageService.hpp"
 
 #include <utility>
 
 #include "configuration/service/ConfigurationServiceProviderImpl.hpp"
 #include "configuration/service/MessageTypes.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 MessageTypeNames allRequestTypes() {
     MessageTypeNames names;
@@ -13,8 +13,9 @@ MessageTypeNames allRequestTypes() {
     return names;
 }
 
-MessageService::MessageService(std::shared_ptr<configuration::Configuration> store)
-    : serializer(std::make_shared<JsonSerializerImpl>()),
+MessageService::MessageService(std::shared_ptr<configuration::Configuration> store,
+                               const JsonLimits& limits)
+    : serializer(std::make_shared<JsonSerializerImpl>(limits)),
       serialization(serializer),
       provider(
           std::make_shared<configuration::ConfigurationServiceProviderImpl>(std::move(store))) {
@@ -26,4 +27,4 @@ std::shared_ptr<const MessageDispatcher> MessageService::dispatcherFor(
     return std::make_shared<MessageDispatcher>(serializer, provider, std::move(allowed));
 }
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

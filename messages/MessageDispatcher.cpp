@@ -1,4 +1,4 @@
-#include "host/messages/MessageDispatcher.hpp"
+#include "messages/MessageDispatcher.hpp"
 
 #include <exception>
 #include <new>
@@ -7,9 +7,9 @@
 
 #include "configuration/StoreErrors.hpp"
 #include "framework/Future.hpp"
-#include "host/messages/JsonText.hpp"
+#include "messages/JsonText.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 namespace {
 
@@ -80,4 +80,4 @@ void MessageDispatcher::requireAllowed(const std::string& type) const {
     throw ForbiddenMessageType("Message type not allowed: " + type);
 }
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

@@ -1,4 +1,4 @@
-#include "host/messages/MessageService.hpp"
+#include "messages/MessageService.hpp"
 
 #include <gtest/gtest.h>
 
@@ -7,9 +7,9 @@
 #include <variant>
 
 #include "configuration/ConfigurationImpl.hpp"
-#include "tests/host/messages/RunningService.hpp"
+#include "tests/messages/RunningService.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 namespace {
 
 using configuration::ConfigurationImpl;
@@ -80,4 +80,4 @@ TEST(AllRequestTypes, AreThoseThatTheServiceAnswers) {
 }
 
 }  // namespace
-}  // namespace velkor::host
+}  // namespace velkor::messages

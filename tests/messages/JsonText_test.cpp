@@ -1,4 +1,4 @@
-#include "host/messages/JsonText.hpp"
+#include "messages/JsonText.hpp"
 
 #include <Poco/JSON/Array.h>
 #include <Poco/JSON/Object.h>
@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-namespace velkor::host {
+namespace velkor::messages {
 namespace {
 
 using Poco::Dynamic::Var;
@@ -59,11 +59,11 @@ TEST(ParseJsonObject, RefusesWhatIsNoJson) {
 }
 
 TEST(ParseJsonObject, TakesTheGreatestDepth) {
-    EXPECT_EQ(refusalOf(nested(maximumJsonDepth)), "taken");
+    EXPECT_EQ(refusalOf(nested(JsonLimits().depth)), "taken");
 }
 
 TEST(ParseJsonObject, RefusesMoreThanTheGreatestDepth) {
-    EXPECT_EQ(refusalOf(nested(maximumJsonDepth + 1)),
+    EXPECT_EQ(refusalOf(nested(JsonLimits().depth + 1)),
               "JSON text is nested more than 64 levels deep");
 }
 
@@ -86,12 +86,20 @@ TEST(ParseJsonObject, FindsTheEndOfATextThatEndsInABackslash) {
 
 TEST(ParseJsonObject, TakesTheGreatestSize) {
     const std::string frame = "{\"a\":\"\"}";
-    const std::string text = "{\"a\":\"" + std::string(maximumJsonSize - frame.size(), 'x') + "\"}";
+    const std::string text = "{\"a\":\"" + std::string(JsonLimits().bytes - frame.size(), 'x') + "\"}";
     EXPECT_EQ(refusalOf(text), "taken");
 }
 
 TEST(ParseJsonObject, RefusesMoreThanTheGreatestSize) {
-    EXPECT_EQ(refusalOf(std::string(maximumJsonSize + 1, ' ')), "JSON text exceeds 16777216 bytes");
+    EXPECT_EQ(refusalOf(std::string(JsonLimits().bytes + 1, ' ')), "JSON text exceeds 16777216 bytes");
+}
+
+TEST(JsonText, CountsObjectsAndArrays) {
+    JsonLimits limits;
+    limits.containers = 3;
+    EXPECT_NO_THROW(parseJsonObject(R"({"a":[{}],"b":"[{"})", limits));
+    EXPECT_EQ(thrownText([&] { parseJsonObject(R"({"a":[{},{}]})", limits); }),
+              "JSON text holds more than 3 objects and arrays");
 }
 
 TEST(RenderJson, WritesAnEmptyObject) {
@@ -195,4 +203,4 @@ TEST(RenderJson, IsTheSameInEveryLocale) {
 }
 
 }  // namespace
-}  // namespace velkor::host
+}  // namespace velkor::messages

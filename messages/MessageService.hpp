@@ -5,20 +5,22 @@
 #include "configuration/Configuration.hpp"
 #include "configuration/service/ConfigurationJsonSerialization.hpp"
 #include "configuration/service/ConfigurationServiceProvider.hpp"
-#include "host/messages/JsonSerializerImpl.hpp"
-#include "host/messages/MessageDispatcher.hpp"
+#include "framework/common/Export.hpp"
+#include "messages/JsonSerializerImpl.hpp"
+#include "messages/MessageDispatcher.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 /// The types of all requests that a `MessageService` answers.
-MessageTypeNames allRequestTypes();
+VELKOR_EXPORT MessageTypeNames allRequestTypes();
 
 /// The service that answers messages about a store, and the ways to it. Safe for concurrent use as
 /// far as the store is. Ends after its front ends: from then on their message types are unknown.
-class MessageService {
+class VELKOR_EXPORT MessageService {
 public:
-    /// Shares `store`, which is not null, with its other users.
-    explicit MessageService(std::shared_ptr<configuration::Configuration> store);
+    /// Shares `store`, which is not null, with its other users. Requests beyond `limits` are refused.
+    explicit MessageService(std::shared_ptr<configuration::Configuration> store,
+                            const JsonLimits& limits = {});
     MessageService(const MessageService&) = delete;
     MessageService& operator=(const MessageService&) = delete;
 
@@ -31,4 +33,4 @@ private:
     std::shared_ptr<configuration::ConfigurationServiceProvider> provider;
 };
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

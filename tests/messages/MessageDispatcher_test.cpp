@@ -1,4 +1,4 @@
-#include "host/messages/MessageDispatcher.hpp"
+#include "messages/MessageDispatcher.hpp"
 
 #include <Poco/JSON/Object.h>
 #include <gtest/gtest.h>
@@ -16,9 +16,9 @@
 
 #include "configuration/StoreErrors.hpp"
 #include "framework/RoutingErrors.hpp"
-#include "tests/host/messages/RunningService.hpp"
+#include "tests/messages/RunningService.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 namespace {
 
 using configuration::ConfigurationServiceProvider;
@@ -291,4 +291,4 @@ TEST_F(Dispatcher, IsSafeForConcurrentUse) {
 }
 
 }  // namespace
-}  // namespace velkor::host
+}  // namespace velkor::messages

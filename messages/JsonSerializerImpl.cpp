@@ -1,13 +1,12 @@
-#include "host/messages/JsonSerializerImpl.hpp"
+#include "messages/JsonSerializerImpl.hpp"
 
 #include <Poco/JSON/Object.h>
 
 #include <utility>
 
 #include "framework/RoutingErrors.hpp"
-#include "host/messages/JsonText.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 namespace {
 
@@ -25,7 +24,7 @@ std::unique_ptr<Message> acknowledgementFromJson(const Poco::JSON::Object::Ptr&)
 
 }  // namespace
 
-JsonSerializerImpl::JsonSerializerImpl() {
+JsonSerializerImpl::JsonSerializerImpl(const JsonLimits& textLimits) : limits(textLimits) {
     JsonSerializerImpl::registerMessage("velkor/Message", typeid(Message), acknowledgementToJson,
                                         acknowledgementFromJson);
 }
@@ -70,7 +69,7 @@ JsonMessage JsonSerializerImpl::encode(const std::unique_ptr<Message>& message) 
 
 std::unique_ptr<Message> JsonSerializerImpl::decode(const JsonMessage& text) const {
     const auto form = formOf(text.type);
-    return form->deserialise(parseJsonObject(text.json));
+    return form->deserialise(parseJsonObject(text.json, limits));
 }
 
 std::shared_ptr<const JsonSerializerImpl::Form> JsonSerializerImpl::formOf(
@@ -89,4 +88,4 @@ std::shared_ptr<const JsonSerializerImpl::Form> JsonSerializerImpl::formOf(
     return entry->second;
 }
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

@@ -1,4 +1,4 @@
-#include "host/messages/JsonText.hpp"
+#include "messages/JsonText.hpp"
 
 #include <Poco/Dynamic/Var.h>
 #include <Poco/Exception.h>
@@ -15,7 +15,7 @@
 
 #include "framework/common/TextConversion.hpp"
 
-namespace velkor::host {
+namespace velkor::messages {
 
 namespace {
 
@@ -36,6 +36,9 @@ public:
         return depth;
     }
 
+    /// How many objects and arrays have begun.
+    std::size_t containers() const noexcept { return begun; }
+
 private:
     void onStringCharacter(char character) {
         if (escaped) {
@@ -52,27 +55,32 @@ private:
             inString = true;
         } else if (character == '{' || character == '[') {
             ++depth;
+            ++begun;
         } else if ((character == '}' || character == ']') && depth > 0) {
             --depth;
         }
     }
 
     std::size_t depth = 0;
+    std::size_t begun = 0;
     bool inString = false;
     bool escaped = false;
 };
 
 // Looked at before the parser is, which recurses at each level.
-void requireWithinLimits(const std::string& text) {
-    if (text.size() > maximumJsonSize) {
-        throw NoJsonObject("JSON text exceeds " + std::to_string(maximumJsonSize) + " bytes");
+void requireWithinLimits(const std::string& text, const JsonLimits& limits) {
+    if (text.size() > limits.bytes) {
+        throw NoJsonObject("JSON text exceeds " + std::to_string(limits.bytes) + " bytes");
     }
     NestingCounter nesting;
-    if (std::any_of(text.begin(), text.end(), [&](char character) {
-            return nesting.depthAfter(character) > maximumJsonDepth;
-        })) {
-        throw NoJsonObject("JSON text is nested more than " + std::to_string(maximumJsonDepth) +
+    if (std::any_of(text.begin(), text.end(),
+                    [&](char character) { return nesting.depthAfter(character) > limits.depth; })) {
+        throw NoJsonObject("JSON text is nested more than " + std::to_string(limits.depth) +
                            " levels deep");
+    }
+    if (nesting.containers() > limits.containers) {
+        throw NoJsonObject("JSON text holds more than " + std::to_string(limits.containers) +
+                           " objects and arrays");
     }
 }
 
@@ -149,8 +157,8 @@ void renderArray(const Array& array, std::ostream& out) {
 
 }  // namespace
 
-Object::Ptr parseJsonObject(const std::string& text) {
-    requireWithinLimits(text);
+Object::Ptr parseJsonObject(const std::string& text, const JsonLimits& limits) {
+    requireWithinLimits(text, limits);
     const Var parsed = parse(text);
     if (parsed.type() != typeid(Object::Ptr)) throw NoJsonObject("JSON text is not an object");
     return parsed.extract<Object::Ptr>();
@@ -164,4 +172,4 @@ std::string renderJson(const Object& object) {
     return out.str();
 }
 
-}  // namespace velkor::host
+}  // namespace velkor::messages

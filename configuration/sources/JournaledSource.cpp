@@ -1,0 +1,7 @@
+#include "configuration/sources/JournaledSource.hpp"
+
+namespace velkor::configuration {
+
+JournaledSource::~JournaledSource() = default;
+
+}  // namespace velkor::configuration

@@ -1,0 +1,7 @@
+#include "configuration/sources/MonitoredSource.hpp"
+
+namespace velkor::configuration {
+
+MonitoredSource::~MonitoredSource() = default;
+
+}  // namespace velkor::configuration
