@@ -18,7 +18,8 @@ VELKOR_EXPORT MessageTypeNames allRequestTypes();
 /// far as the store is. Ends after its front ends: from then on their message types are unknown.
 class VELKOR_EXPORT MessageService {
 public:
-    /// Shares `store`, which is not null, with its other users. Requests beyond `limits` are refused.
+    /// Shares `store`, which is not null, with its other users. Requests beyond `limits` are
+    /// refused.
     explicit MessageService(std::shared_ptr<configuration::Configuration> store,
                             const JsonLimits& limits = {});
     MessageService(const MessageService&) = delete;
