@@ -122,6 +122,7 @@ public:
             "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
         add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
+        listenOptions.emplace(app);
         app.footer(footer);
     }
 
@@ -150,7 +151,7 @@ public:
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
         collectSources(options);
-        options.serving = listenOptions.request();
+        options.serving = listenOptions->request();
         if (options.serving)
             options.serving->server.maxPropertyFileBytes = options.limits.fileBytes;
         return options;
@@ -201,7 +202,7 @@ private:
     Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;
-    ListenOptions listenOptions{app};
+    std::optional<ListenOptions> listenOptions;  // made last: the help shows them behind the others
 };
 
 }  // namespace
