@@ -28,6 +28,7 @@
 #include "host/console/LineReader.hpp"
 #include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
+#include "host/console/SendCommand.hpp"
 #include "host/console/SettingsCommand.hpp"
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
@@ -61,7 +62,7 @@ public:
           store(std::make_shared<SessionStore>(limits)),
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output, [this] { store->acknowledge(); }),
-          service(store),
+          service(store, {}, secretsOf(store)),
           storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
           hostCommands(
               {store, std::make_shared<Watches>(store, showValue()),

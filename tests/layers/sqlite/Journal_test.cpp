@@ -52,8 +52,8 @@ TEST(Journal, CanBeReadAsThatOfAnySource) {
     EXPECT_EQ(last.author, "alice");
     EXPECT_EQ(last.action, "unset");
     EXPECT_EQ(last.key, "a");
-    EXPECT_EQ(last.before, configuration::ConfigurationValue(1));
-    EXPECT_EQ(last.after, std::nullopt);
+    EXPECT_EQ(textOf(last.before.value()), "int 1");
+    EXPECT_FALSE(last.after);
 }
 
 TEST(Journal, GoesOnWhereItEnded) {
