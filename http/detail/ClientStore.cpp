@@ -54,9 +54,9 @@ Future<bool> ClientStore::addPropertyFileSource(const std::string& name, const s
         throw std::runtime_error(configuration::store_errors::fileNotAllowed + narrowPath);
     }
     const std::string text = root->read(narrowPath);
-    return store->addSource(name, group, order, readOnly,
-                            std::make_shared<configuration::PropertyFileSource>(
-                                configuration::PropertyText{text}));
+    return store->addSource(
+        name, group, order, readOnly,
+        std::make_shared<configuration::PropertyFileSource>(configuration::PropertyText{text}));
 }
 
 Future<bool> ClientStore::addInMemorySource(const std::string& name, const std::string& group,

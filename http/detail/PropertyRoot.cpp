@@ -13,6 +13,7 @@
 #include <system_error>
 
 #include "configuration/StoreErrors.hpp"
+#include "http/Refused.hpp"
 
 namespace velkor::http::detail {
 
@@ -60,9 +61,9 @@ std::string placeOf(int descriptor) {
 }
 
 bool isBelow(std::string_view folder, std::string_view path) {
-    if (folder == "/") return path.size() > 1 && path.front() == '/';
-    return path.size() > folder.size() && path.substr(0, folder.size()) == folder &&
-           path[folder.size()] == '/';
+    if (folder != "/" && path.substr(0, folder.size()) != folder) return false;
+    const std::string_view rest = path.substr(folder == "/" ? 0 : folder.size());
+    return rest.size() > 1 && rest.front() == '/';
 }
 
 // Without a look at the file system, which would tell what there is outside.
@@ -92,8 +93,7 @@ PropertyRoot::PropertyRoot(const std::string& path, std::uintmax_t mostFileBytes
       name(std::filesystem::absolute(path).lexically_normal().native()),
       mostBytes(mostFileBytes) {
     if (root < 0) {
-        throw std::runtime_error("Property root could not be opened: " + path + ": " +
-                                 systemText(errno));
+        throw Refused("can't use the property root " + path + ": " + systemText(errno));
     }
 }
 

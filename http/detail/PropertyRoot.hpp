@@ -12,8 +12,8 @@ namespace velkor::http::detail {
 class PropertyRoot {
 public:
     /// The folder at `path`, as long as it lives, wherever that is moved to; files of more than
-    /// `mostFileBytes` are not read. Throws `std::runtime_error` "Property root could not be
-    /// opened: ", `path`, ": " and the system's reason.
+    /// `mostFileBytes` are not read. Throws `Refused` "can't use the property root PATH:
+    /// REASON", the reason being the system's.
     PropertyRoot(const std::string& path, std::uintmax_t mostFileBytes);
     ~PropertyRoot();
 
