@@ -5,6 +5,7 @@
 #include <new>
 #include <optional>
 #include <utility>
+#include <vector>
 
 #include "http/detail/routes/Items.hpp"
 #include "http/detail/routes/JsonWriter.hpp"
@@ -37,9 +38,8 @@ public:
     ~StoreFeed() override {
         --open;
         try {
-            if (mailbox != nullptr) return mailbox->cancel();
-            // A watch without a subscriber stays until it is cancelled by one.
-            start([] {});
+            // A watch that has had no subscriber would stay: only one can cancel it.
+            if (mailbox == nullptr) subscribe([] {});
             mailbox->cancel();
         } catch (...) {
             return;  // the watch ends with the store
@@ -49,10 +49,7 @@ public:
     StoreFeed(const StoreFeed&) = delete;
     StoreFeed& operator=(const StoreFeed&) = delete;
 
-    void start(std::function<void()> onReady) override {
-        mailbox = std::make_shared<Mailbox<T>>(asking, std::move(onReady));
-        std::exchange(publisher, nullptr)->subscribe(mailbox);
-    }
+    void start(std::function<void()> onReady) override { subscribe(std::move(onReady)); }
 
     std::optional<std::string> next() override {
         auto value = mailbox->take();
@@ -69,6 +66,11 @@ protected:
     virtual std::string json(T&& value) = 0;
 
 private:
+    void subscribe(std::function<void()> onReady) {
+        mailbox = std::make_shared<Mailbox<T>>(asking, std::move(onReady));
+        std::exchange(publisher, nullptr)->subscribe(mailbox);
+    }
+
     Source publisher;
     const Asking asking;
     const std::shared_ptr<Metrics> metrics;

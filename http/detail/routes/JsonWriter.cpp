@@ -100,10 +100,6 @@ JsonWriter& JsonWriter::value(const configuration::ConfigurationValue& content, 
 }
 
 void JsonWriter::write(double content) {
-    if (!std::isfinite(content) && nonFinite == NonFinite::asText) {
-        text(std::isnan(content) ? "nan" : content > 0 ? "inf" : "-inf");
-        return;
-    }
     separate();
     if (!std::isfinite(content)) {
         out += "null";

@@ -9,20 +9,12 @@
 
 namespace velkor::http::detail {
 
-/// What becomes of doubles that are not finite, for which JSON has no numbers.
-enum class NonFinite {
-    asText,  ///< "inf", "-inf", "nan"
-    asNull,  ///< As in messages.
-};
-
 /// Writes one JSON text, on a single line and without spaces: what is written is what
-/// `messages::renderJson` would make of it, byte for byte but for doubles that are not finite.
-/// Bytes that are no UTF-8 become U+FFFD. Who calls it sees to it that objects and arrays are
+/// `messages::renderJson` would make of it, byte for byte. A number that is not finite is null, and
+/// bytes that are no UTF-8 become U+FFFD. Who calls it sees to it that objects and arrays are
 /// closed, and that members have names.
 class JsonWriter {
 public:
-    explicit JsonWriter(NonFinite forDoubles = NonFinite::asText) : nonFinite(forDoubles) {}
-
     JsonWriter& beginObject() { return open('{'); }
     JsonWriter& endObject() { return close('}'); }
     JsonWriter& beginArray() { return open('['); }
@@ -30,6 +22,13 @@ public:
 
     /// The name of a member, whose value comes next. Written as it is: it needs no escaping.
     JsonWriter& name(std::string_view plain);
+
+    /// As above, for a name of any characters.
+    JsonWriter& anyName(std::string_view content) {
+        text(content);
+        out += ':';
+        return *this;
+    }
 
     JsonWriter& text(std::string_view content);
     JsonWriter& number(std::int64_t content);
@@ -87,7 +86,6 @@ private:
 
     void appendEscaped(std::string_view utf8);
 
-    const NonFinite nonFinite;
     std::string out;
 };
 

@@ -4,7 +4,6 @@
 #include <utility>
 
 #include "configuration/service/MessageTypes.hpp"
-#include "configuration/service/ValueJson.hpp"
 #include "http/detail/routes/Commits.hpp"
 #include "http/detail/routes/JsonWriter.hpp"
 #include "http/detail/routes/PlainGet.hpp"
@@ -42,7 +41,7 @@ Response dispatched(const Context& context, const std::string& body) {
 // As the service answers, without a message in between.
 Response optionReply(const Context& context, const std::string& key) {
     const auto option = context.store->read({key}).get().options.front();
-    JsonWriter json(NonFinite::asNull);
+    JsonWriter json;
     json.beginObject();
     if (option) {
         json.member("key", option->key).member("source", option->source).name("value");
@@ -52,16 +51,14 @@ Response optionReply(const Context& context, const std::string& key) {
     return replyResponse({messageTypeOf<ConfigurationOptionResponse>.name(), json.take()});
 }
 
-// The member that says what is written, and into which source; empty where the text is no object,
-// which is refused later.
+// The member that says what is written; empty where the text is no object, which is refused later.
 std::string memberOf(const Context& context, const std::string& body, const char* name) {
-    std::string content;
     try {
-        readMember(*messages::parseJsonObject(body, context.jsonLimits), name, content);
+        return messages::parseJsonObject(body, context.jsonLimits)
+            ->optValue<std::string>(name, std::string());
     } catch (const messages::NoJsonObject&) {
         return {};
     }
-    return content;
 }
 
 }  // namespace

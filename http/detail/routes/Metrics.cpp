@@ -44,7 +44,7 @@ std::string labelText(std::string_view text) {
     return escaped;
 }
 
-Metrics::Metrics(const std::vector<std::string_view>& routeNames) : rows(routeNames.size() + 1) {
+Metrics::Metrics(const std::vector<std::string>& routeNames) : rows(routeNames.size() + 1) {
     for (std::size_t i = 0; i < routeNames.size(); ++i) rows[i].name = routeNames[i];
     rows.back().name = "none";
 }
@@ -78,7 +78,7 @@ void Metrics::writeRequests(std::string& out) const {
 }
 
 void Metrics::writeSeconds(const Row& row, std::string& out) {
-    const std::string label = "{route=\"" + std::string(row.name) + "\"";
+    const std::string label = "{route=\"" + row.name + "\"";
     std::string lines;
     std::uint64_t count = 0;
     for (std::size_t i = 0; i < row.buckets.size(); ++i) {

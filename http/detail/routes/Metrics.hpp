@@ -17,9 +17,9 @@ class Metrics {
 public:
     using Count = std::atomic<std::uint64_t>;
 
-    /// Counts requests by what `routeNames`, which outlive this, call their routes; a request of
-    /// none of them has the number behind the last one.
-    explicit Metrics(const std::vector<std::string_view>& routeNames);
+    /// Counts requests by what `routeNames` call their routes; a request of none of them has the
+    /// number behind the last one.
+    explicit Metrics(const std::vector<std::string>& routeNames);
 
     /// A request of the route with that number was answered with `status` after `elapsed`.
     void countRequest(std::size_t route, int status, std::chrono::nanoseconds elapsed) noexcept;
@@ -41,7 +41,7 @@ private:
                                                              10'000, 100'000, 1'000'000, 10'000'000};
 
     struct Row {
-        std::string_view name;
+        std::string name;
         std::array<Count, statuses.size()> byStatus{};
         std::array<Count, bucketEnds.size() + 1> buckets{};
         Count nanoseconds{0};

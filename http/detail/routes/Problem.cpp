@@ -57,6 +57,8 @@ ProblemKind kindOf(Refusal refusal) {
             return ProblemKind::duplicateSource;
         case Refusal::fileNotOpened:
             return ProblemKind::fileNotOpened;
+        case Refusal::fileNotAllowed:
+            return ProblemKind::forbidden;
         case Refusal::notRunning:
             return ProblemKind::unavailable;
         case Refusal::misrouted:
@@ -95,6 +97,7 @@ ProblemKind problemOf(DispatchFailure failure) {
         case DispatchFailure::missingOption:
             return ProblemKind::notFound;
         case DispatchFailure::forbiddenType:
+        case DispatchFailure::fileNotAllowed:
             return ProblemKind::forbidden;
         case DispatchFailure::noJsonObject:
         case DispatchFailure::misrouted:

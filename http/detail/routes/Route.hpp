@@ -56,6 +56,8 @@ struct Route {
     Place place;
     Handling handle;
     std::array<std::string_view, 3> parameters{};  ///< That a query may have.
+    bool isStream = false;                         ///< The answer is a stream of events.
+    bool isForAnyone = false;  ///< Pages of other sites may lead here, with any query.
 
     /// Whether `requested` is a path of this route.
     bool isAt(std::string_view requested) const noexcept;
