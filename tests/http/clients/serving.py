@@ -16,13 +16,15 @@ ADDRESS = "Listening on "
 class Server:
     """The program while it serves. What it says on standard error is kept in `errors`."""
 
-    def __init__(self, *arguments, listen=("127.0.0.1:0",), stdin=subprocess.DEVNULL):
+    def __init__(self, *arguments, listen=("127.0.0.1:0",), stdin=subprocess.DEVNULL,
+                 preexec_fn=None):
         command = [PROGRAM]
         for endpoint in listen:
             command += ["--listen", endpoint]
         self.errors = tempfile.TemporaryFile("w+")
         self.process = subprocess.Popen([*command, *arguments], stdin=stdin, text=True,
-                                        stdout=subprocess.PIPE, stderr=self.errors)
+                                        stdout=subprocess.PIPE, stderr=self.errors,
+                                        preexec_fn=preexec_fn)
         self.urls = [self._next_url() for _ in listen]
         self.url = self.urls[0].rstrip("/")
         self.port = int(self.url.rsplit(":", 1)[1]) if "//" in self.url else 0
@@ -103,7 +105,7 @@ class Answer:
 
 def curl(url, *arguments):
     """Asks by curl, which gives up when something hangs."""
-    done = subprocess.run(["curl", "--silent", "--show-error", "--include", "--globoff",
+    done = subprocess.run(["curl", "--silent", "--show-error", "--include", "--globoff", "--noproxy", "*",
                            "--max-time", str(PATIENCE), *arguments, url],
                           capture_output=True, check=True)
     return Answer(done.stdout.decode())

@@ -2,6 +2,7 @@
 
 import os
 import pty
+import resource
 import signal
 import socket
 import subprocess
@@ -106,6 +107,12 @@ class EndTest(ServerTest):
         self.assertEqual([change["key"] for change in history["changes"]], ["b", "a"])
         author = subprocess.run(["id", "-un"], capture_output=True, text=True).stdout.strip()
         self.assertEqual({change["author"] for change in history["changes"]}, {author})
+
+    def test_the_usual_limit_of_descriptors_is_none_of_connections(self):
+        few = lambda: resource.setrlimit(resource.RLIMIT_NOFILE,
+                                         (40, resource.getrlimit(resource.RLIMIT_NOFILE)[1]))
+        server = self.serve("--set", "a=1", preexec_fn=few)
+        self.open_streams(server, 100)
 
     def test_files_are_followed(self):
         path = self.file("app.properties", "a = 1\n")
