@@ -1,0 +1,20 @@
+#pragma once
+
+#include <memory>
+
+#include "http/ServerOptions.hpp"
+#include "http/detail/Exchange.hpp"
+
+namespace velkor::configuration {
+class ConfigurationImpl;
+}
+
+namespace velkor::http::detail {
+
+/// What answers requests to `store`, within `options`; it reports `counts` among its own. Throws
+/// `Refused` when a file that the options name can't be used.
+std::shared_ptr<Handler> makeService(std::shared_ptr<configuration::ConfigurationImpl> store,
+                                     const ServerOptions& options,
+                                     std::shared_ptr<const TransportCounts> counts);
+
+}  // namespace velkor::http::detail

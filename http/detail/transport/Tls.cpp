@@ -1,0 +1,56 @@
+#include "http/detail/transport/Tls.hpp"
+
+#include <openssl/err.h>
+#include <openssl/ssl.h>
+
+#include <fstream>
+#include <new>
+#include <system_error>
+
+#include "http/Refused.hpp"
+
+namespace velkor::http::detail::transport {
+namespace {
+
+// What the system or OpenSSL has against `file`.
+std::string reasonOf(const std::string& file) {
+    errno = 0;
+    if (!std::ifstream(file)) return std::generic_category().message(errno);
+    const char* const reason = ::ERR_reason_error_string(::ERR_peek_last_error());
+    return reason != nullptr ? reason : "it holds none";
+}
+
+[[noreturn]] void refuse(const std::string& what, const std::string& file) {
+    throw Refused("can't use the " + what + " " + file + ": " + reasonOf(file));
+}
+
+// No one is there who could type a pass phrase.
+int noPassPhrase(char* /*text*/, int /*size*/, int /*writing*/, void* /*data*/) {
+    return -1;
+}
+
+}  // namespace
+
+std::shared_ptr<SSL_CTX> tlsContext(const std::string& certificateFile,
+                                    const std::string& keyFile) {
+    if (certificateFile.empty() && keyFile.empty()) return nullptr;
+    if (certificateFile.empty() || keyFile.empty()) {
+        throw Refused("TLS needs both a certificate and a key");
+    }
+    std::shared_ptr<SSL_CTX> context(::SSL_CTX_new(::TLS_server_method()), ::SSL_CTX_free);
+    if (!context) throw std::bad_alloc();
+    ::SSL_CTX_set_min_proto_version(context.get(), TLS1_2_VERSION);
+    ::SSL_CTX_set_options(context.get(), SSL_OP_NO_RENEGOTIATION | SSL_OP_NO_COMPRESSION);
+    ::SSL_CTX_set_mode(context.get(), SSL_MODE_RELEASE_BUFFERS);
+    ::SSL_CTX_set_default_passwd_cb(context.get(), noPassPhrase);
+    ::ERR_clear_error();
+    if (::SSL_CTX_use_certificate_chain_file(context.get(), certificateFile.c_str()) != 1) {
+        refuse("certificate", certificateFile);
+    }
+    if (::SSL_CTX_use_PrivateKey_file(context.get(), keyFile.c_str(), SSL_FILETYPE_PEM) != 1) {
+        refuse("key", keyFile);
+    }
+    return context;
+}
+
+}  // namespace velkor::http::detail::transport
