@@ -16,7 +16,7 @@ namespace {
 std::string reasonOf(const std::string& file) {
     errno = 0;
     if (!std::ifstream(file)) return std::generic_category().message(errno);
-    const char* const reason = ::ERR_reason_error_string(::ERR_peek_last_error());
+    const char* const reason = ::ERR_reason_error_string(::ERR_peek_error());
     return reason != nullptr ? reason : "it holds none";
 }
 
