@@ -43,27 +43,17 @@ TEST(Endpoint, ReadsAddresses) {
 
 TEST(Endpoint, RefusesWhatIsNone) {
     using namespace std::string_literals;
-    for (const std::string& text : {""s,
-                                    "a"s,
-                                    ":80"s,
-                                    "65536"s,
-                                    "-1"s,
-                                    "+1"s,
-                                    " 80"s,
-                                    "80 "s,
-                                    "0x50"s,
-                                    "localhost:80"s,
-                                    "127.0.0.1"s,
-                                    "127.0.0.1:"s,
-                                    "127.0.0:80"s,
-                                    "127.0.0.1.1:80"s,
-                                    "127.0.0.1\0:80"s,
-                                    "::1:80"s,
-                                    "[::1]"s,
-                                    "[::1]80"s,
-                                    "[]:80"s,
-                                    "[::1:80"s,
-                                    "[127.0.0.1]:80"s,
+    for (const std::string& text : {""s,           "a"s,
+                                    ":80"s,        "65536"s,
+                                    "-1"s,         "+1"s,
+                                    " 80"s,        "80 "s,
+                                    "0x50"s,       "localhost:80"s,
+                                    "127.0.0.1"s,  "127.0.0.1:"s,
+                                    "127.0.0:80"s, "127.0.0.1.1:80"s,
+
+                                    "::1:80"s,     "[::1]"s,
+                                    "[::1]80"s,    "[]:80"s,
+                                    "[::1:80"s,    "[127.0.0.1]:80"s,
                                     "Unix:/a"s}) {
         SCOPED_TRACE(text);
         EXPECT_EQ(thrownText<Refused>([&] { Endpoint{std::string_view(text)}; }),
@@ -71,6 +61,11 @@ TEST(Endpoint, RefusesWhatIsNone) {
                       "' is no address to listen on: give [ADDRESS:]PORT, with ADDRESS in digits, "
                       "or unix:PATH");
     }
+}
+
+TEST(Endpoint, DoesNotStopAtANul) {
+    EXPECT_THROW(Endpoint(std::string_view("127.0.0.1\0:80", 13)), Refused);
+    EXPECT_THROW(Endpoint(std::string_view("unix:a\0b", 8)), Refused);
 }
 
 TEST(Endpoint, RefusesPathsThatTheSystemHasNoRoomFor) {

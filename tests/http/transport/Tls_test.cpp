@@ -220,10 +220,10 @@ TEST(TlsFiles, SayWhyTheyCanNotBeUsed) {
     EXPECT_EQ(complaint(good, "/missing.pem"),
               "can't use the key /missing.pem: No such file or directory");
     EXPECT_EQ(complaint(wrong, certificate().keyPath()),
-              "can't use the certificate " + wrong + ": no start line");
-    EXPECT_EQ(complaint(good, wrong), "can't use the key " + wrong + ": no start line");
+              "can't use the certificate " + wrong + ": no certificate in PEM is in it");
+    EXPECT_EQ(complaint(good, wrong), "can't use the key " + wrong + ": no key in PEM is in it");
     EXPECT_EQ(complaint(good, another.keyPath()),
-              "can't use the key " + another.keyPath() + ": key values mismatch");
+              "can't use the key " + another.keyPath() + ": it is not that of the certificate");
 }
 
 }  // namespace
