@@ -36,8 +36,9 @@ std::streamsize DroppingBuffer::xsputn(const char* bytes, std::streamsize count)
 int DroppingBuffer::sync() {
     const std::string text = std::exchange(record, {});
     if (text.empty()) return 0;
-    if (dropped != 0 && write((isLineOpen ? "\n" : "") + std::to_string(dropped) +
-                              " records were dropped: nobody read them in time\n")) {
+    const std::string gap = isLineOpen ? "\n" : "";
+    if (dropped != 0 && write(gap + "records dropped since nobody read them in time: " +
+                              std::to_string(dropped) + '\n')) {
         dropped = 0;
         isLineOpen = false;
     }
