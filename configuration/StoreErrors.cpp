@@ -37,6 +37,7 @@ constexpr std::array patterns{
     pattern<runtime_error>(store_errors::writingNotSupported, Refusal::notWritable),
     pattern<invalid_argument>(store_errors::duplicateSource, Refusal::duplicateSource),
     pattern<runtime_error>(store_errors::fileNotOpened, Refusal::fileNotOpened),
+    pattern<runtime_error>(store_errors::fileNotAllowed, Refusal::fileNotAllowed),
     pattern<runtime_error>(routing_errors::notRunning, Refusal::notRunning),
     pattern<invalid_argument>(routing_errors::notForThisObject, Refusal::misrouted),
     pattern<invalid_argument>(routing_errors::notForThisService, Refusal::misrouted),

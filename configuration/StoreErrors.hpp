@@ -22,6 +22,7 @@ inline constexpr const char* nullSource = "A configuration source must not be nu
 inline constexpr const char* notInTable = "_Map_base::at";
 inline constexpr const char* nullText = "A text must not be null.";
 inline constexpr const char* fileNotOpened = "Property file could not be opened: ";
+inline constexpr const char* fileNotAllowed = "Property file not allowed: ";
 
 }  // namespace velkor::configuration::store_errors
 
@@ -34,6 +35,7 @@ enum class Refusal {
     notWritable,      ///< No source takes the write.
     duplicateSource,  ///< A source of that name is there already.
     fileNotOpened,    ///< The property file can't be opened.
+    fileNotAllowed,   ///< The property file lies where it is not taken from.
     notRunning,       ///< The service is not running.
     misrouted,        ///< The message is not for the service.
 };

@@ -40,7 +40,7 @@ public:
     /// null store, `std::system_error` when the system starts no thread.
     Server(std::shared_ptr<configuration::ConfigurationImpl> store, const ServerOptions& options);
 
-    /// Stops.
+    /// Stops. Not on a thread of the server itself.
     ~Server();
 
     Server(const Server&) = delete;

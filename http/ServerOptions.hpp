@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <cstddef>
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -36,6 +37,9 @@ struct ServerOptions {
 
     /// The folder below which property files may be added as layers; empty: none may.
     std::string propertyRoot;
+
+    /// Bytes of such a file: larger ones are not taken.
+    std::uintmax_t maxPropertyFileBytes = std::uintmax_t{256} << 20U;
 
     /// Bytes of a request's first line and headers together: more are answered with 431.
     std::size_t maxHeaderBytes = std::size_t{16} << 10U;

@@ -30,6 +30,8 @@ DispatchFailure failureOf(Refusal refusal) {
             return DispatchFailure::duplicateSource;
         case Refusal::fileNotOpened:
             return DispatchFailure::fileNotOpened;
+        case Refusal::fileNotAllowed:
+            return DispatchFailure::fileNotAllowed;
         case Refusal::notRunning:
             return DispatchFailure::notRunning;
         case Refusal::misrouted:

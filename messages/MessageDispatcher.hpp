@@ -23,6 +23,7 @@ enum class DispatchFailure {
     notWritable,      ///< No source takes the write.
     duplicateSource,  ///< A source of that name is there already.
     fileNotOpened,    ///< The property file can't be opened.
+    fileNotAllowed,   ///< The property file lies where it is not taken from.
     other,            ///< Anything else that the service failed with.
 };
 

@@ -4,6 +4,7 @@
 
 #include "configuration/service/ConfigurationServiceProviderImpl.hpp"
 #include "configuration/service/MessageTypes.hpp"
+#include "messages/detail/MaskingSerializer.hpp"
 
 namespace velkor::messages {
 
@@ -14,9 +15,9 @@ MessageTypeNames allRequestTypes() {
 }
 
 MessageService::MessageService(std::shared_ptr<configuration::Configuration> store,
-                               const JsonLimits& limits)
+                               const JsonLimits& limits, Secrets secrets)
     : serializer(std::make_shared<JsonSerializerImpl>(limits)),
-      serialization(serializer),
+      serialization(std::make_shared<detail::MaskingSerializer>(serializer, std::move(secrets))),
       provider(
           std::make_shared<configuration::ConfigurationServiceProviderImpl>(std::move(store))) {
     provider->setRunning(true);

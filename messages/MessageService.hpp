@@ -8,6 +8,7 @@
 #include "framework/common/Export.hpp"
 #include "messages/JsonSerializerImpl.hpp"
 #include "messages/MessageDispatcher.hpp"
+#include "messages/Secrets.hpp"
 
 namespace velkor::messages {
 
@@ -18,9 +19,10 @@ VELKOR_EXPORT MessageTypeNames allRequestTypes();
 /// far as the store is. Ends after its front ends: from then on their message types are unknown.
 class VELKOR_EXPORT MessageService {
 public:
-    /// Shares `store`, which is not null, with its other users. Requests beyond `limits` are refused.
+    /// Shares `store`, which is not null, with its other users. Requests beyond `limits` are
+    /// refused; replies show the mark in the place of a secret value, whose type stays.
     explicit MessageService(std::shared_ptr<configuration::Configuration> store,
-                            const JsonLimits& limits = {});
+                            const JsonLimits& limits = {}, Secrets secrets = {});
     MessageService(const MessageService&) = delete;
     MessageService& operator=(const MessageService&) = delete;
 

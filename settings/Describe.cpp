@@ -152,6 +152,25 @@ std::vector<Description> describe(const std::shared_ptr<ConfigurationImpl>& stor
     return all;
 }
 
+std::vector<Description> describe(const std::shared_ptr<ConfigurationImpl>& store,
+                                  const std::string& key) {
+    std::vector<Description> all;
+    const auto hub = detail::Hub::find(store);
+    if (hub == nullptr) return all;
+    const auto states = hub->statesOf(key);
+    Keys secrets;
+    for (const auto& state : states) {
+        for (const Declared& declared : state->keys()) {
+            if (isSecret(store, declared.key)) secrets.insert(declared.key);
+        }
+    }
+    for (const auto& state : states) describe(*state, secrets, all);
+    all.erase(std::remove_if(all.begin(), all.end(),
+                             [&](const Description& each) { return each.key != key; }),
+              all.end());
+    return all;
+}
+
 std::vector<UndeclaredKey> undeclaredKeys(const std::shared_ptr<ConfigurationImpl>& store) {
     Recogniser recogniser(describe(store));
     std::vector<UndeclaredKey> undeclared;

@@ -32,6 +32,10 @@ struct Description {
 VELKOR_EXPORT std::vector<Description> describe(
     const std::shared_ptr<configuration::ConfigurationImpl>& store);
 
+/// The settings of `key` alone: what this takes does not grow with the number of other settings.
+VELKOR_EXPORT std::vector<Description> describe(
+    const std::shared_ptr<configuration::ConfigurationImpl>& store, const std::string& key);
+
 /// A key of a store that no setting has.
 struct UndeclaredKey {
     std::string key;

@@ -17,4 +17,16 @@ std::set<std::string> secretKeys(const std::shared_ptr<configuration::Configurat
     return keys;
 }
 
+bool isSecret(const std::shared_ptr<configuration::ConfigurationImpl>& store,
+              const std::string& key) {
+    const auto hub = detail::Hub::find(store);
+    if (hub == nullptr) return false;
+    for (const auto& state : hub->statesOf(key)) {
+        for (const detail::Declared& declared : state->keys()) {
+            if (declared.secret && declared.key == key) return true;
+        }
+    }
+    return false;
+}
+
 }  // namespace velkor::settings

@@ -14,6 +14,11 @@ namespace velkor::settings {
 VELKOR_EXPORT std::set<std::string> secretKeys(
     const std::shared_ptr<configuration::ConfigurationImpl>& store);
 
+/// Whether `key` is one of them now, for whoever shows one value: looks at the settings of that key
+/// only. Calls no store. Thread-safe.
+VELKOR_EXPORT bool isSecret(const std::shared_ptr<configuration::ConfigurationImpl>& store,
+                            const std::string& key);
+
 /// What is shown in the place of a secret value.
 inline constexpr const char* secretMark = "•••";
 

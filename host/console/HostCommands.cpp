@@ -87,8 +87,7 @@ std::string quit(const Context& context, const Arguments&) {
 }
 
 std::string send(const Context& context, const Arguments& arguments) {
-    const auto secrets = settings::secretKeys(context.services.store);
-    return sendMessage(*context.services.dispatcher, arguments, secrets);
+    return sendMessage(*context.services.dispatcher, arguments);
 }
 
 std::vector<std::string> suggestCommands(const Context& context) {

@@ -39,6 +39,9 @@ public:
     /// All settings that are alive.
     std::vector<std::shared_ptr<SettingState>> states() const { return index->all(); }
 
+    /// The settings of `key` that are alive.
+    StateIndex::States statesOf(const std::string& key) const { return index->statesOf(key); }
+
 private:
     void watch(std::uint64_t attempt) VELKOR_EXCLUDES(mutex);
 

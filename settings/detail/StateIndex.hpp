@@ -17,6 +17,8 @@ class SettingState;
 /// mutex.
 class StateIndex {
 public:
+    using States = boost::container::small_vector<std::shared_ptr<SettingState>, 4>;
+
     /// Passes the changes of its keys on to `state` from now on.
     void add(const std::shared_ptr<SettingState>& state) VELKOR_EXCLUDES(mutex);
     void remove(const SettingState& state) VELKOR_EXCLUDES(mutex);
@@ -24,18 +26,17 @@ public:
     /// All settings that are alive.
     std::vector<std::shared_ptr<SettingState>> all() const VELKOR_EXCLUDES(mutex);
 
+    /// The settings of `key` that are alive.
+    States statesOf(const std::string& key) const VELKOR_EXCLUDES(mutex);
+
     /// Passes `change` on to the settings of its key.
     void pass(const configuration::OptionChange& change) const VELKOR_EXCLUDES(mutex);
 
 private:
-    using States = boost::container::small_vector<std::shared_ptr<SettingState>, 4>;
-
     struct Entry {
         const SettingState* identity;
         std::weak_ptr<SettingState> state;
     };
-
-    States statesOf(const std::string& key) const VELKOR_EXCLUDES(mutex);
 
     mutable common::Mutex mutex;
     std::unordered_map<std::string, std::vector<Entry>> byKey VELKOR_GUARDED_BY(mutex);

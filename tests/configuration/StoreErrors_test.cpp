@@ -89,6 +89,11 @@ TEST(RefusalOfText, HelpersOfDerivedStoresAreMissingOptions) {
               Refusal::missingOption);
 }
 
+TEST(RefusalOfText, FilesFromElsewhereAreTheirKind) {
+    EXPECT_EQ(refusalOf(std::runtime_error(std::string(store_errors::fileNotAllowed) + "/f")),
+              Refusal::fileNotAllowed);
+}
+
 TEST(RefusalOfText, TheSameTextOfAnotherTypeIsSomethingElse) {
     class Derived : public std::runtime_error {
     public:

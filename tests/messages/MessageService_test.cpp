@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <memory>
+#include <set>
 #include <string>
 #include <variant>
 
@@ -71,6 +72,50 @@ TEST_F(MessageServiceTest, ReleasesTheStoreWithItself) {
     EXPECT_FALSE(observer.expired());
     service.reset();
     EXPECT_TRUE(observer.expired());
+}
+
+class SecretMessagesTest : public ::testing::Test {
+protected:
+    std::string send(const std::string& type, const std::string& json) const {
+        return outcomeOf(service.dispatcherFor(allRequestTypes())->dispatch({type, json}));
+    }
+
+    std::shared_ptr<ConfigurationImpl> store = std::make_shared<ConfigurationImpl>();
+    std::set<std::string> keys{"pin"};
+    MessageService service{
+        store, {}, {[this](const std::string& key) { return keys.count(key) != 0; }, "hidden"}};
+};
+
+TEST_F(SecretMessagesTest, HaveTheMarkInThePlaceOfTheValue) {
+    store->set("pin", 4711);
+    EXPECT_EQ(send(get, R"({"key":"pin"})"),
+              "reply velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"pin","source":"override","value":{"type":"int","value":"hidden"}})");
+}
+
+TEST_F(SecretMessagesTest, HideWhatAWriteReplaced) {
+    store->set("pin", 4711);
+    EXPECT_EQ(send("velkor/configuration/ConfigurationSet",
+                   R"({"key":"pin","value":{"type":"string","value":"x"}})"),
+              "reply velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"pin","source":"","value":{"type":"int","value":"hidden"}})");
+}
+
+TEST_F(SecretMessagesTest, ShowAllOtherValues) {
+    store->set("age", 30);
+    EXPECT_EQ(send(get, R"({"key":"age"})"),
+              "reply velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"age","source":"override","value":{"type":"int","value":30}})");
+    EXPECT_EQ(send(get, R"({"key":"pin"})"),
+              "reply velkor/configuration/ConfigurationOptionResponse {}");
+}
+
+TEST_F(SecretMessagesTest, HideWhatIsSecretAtThatMoment) {
+    store->set("age", 30);
+    keys.insert("age");
+    EXPECT_EQ(send(get, R"({"key":"age"})"),
+              "reply velkor/configuration/ConfigurationOptionResponse "
+              R"({"key":"age","source":"override","value":{"type":"int","value":"hidden"}})");
 }
 
 TEST(AllRequestTypes, AreThoseThatTheServiceAnswers) {

@@ -62,6 +62,8 @@ inline std::string nameOf(messages::DispatchFailure failure) {
             return "duplicate source";
         case messages::DispatchFailure::fileNotOpened:
             return "file not opened";
+        case messages::DispatchFailure::fileNotAllowed:
+            return "file not allowed";
         case messages::DispatchFailure::other:
             return "other";
     }

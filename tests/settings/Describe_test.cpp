@@ -85,6 +85,29 @@ TEST_F(DescribeTest, TellsAllThatIsDeclared) {
     EXPECT_EQ(setting.error, std::nullopt);
 }
 
+TEST_F(DescribeTest, TellsOfOneKeyAlone) {
+    const Setting<int> limit(store, "limit", 1, description("how many"));
+    const Bound<Server> server(store, "server",
+                               fields(&Server::port, "port", 1, &Server::host, "host", "h"));
+    ASSERT_EQ(describe(store, "limit").size(), 1U);
+    EXPECT_EQ(describe(store, "limit").front().description, "how many");
+    ASSERT_EQ(describe(store, "server.host").size(), 1U);
+    EXPECT_EQ(describe(store, "server.host").front().key, "server.host");
+    EXPECT_TRUE(describe(store, "server").empty());
+}
+
+TEST_F(DescribeTest, HidesTheSecretsOfOneKeyAsOfAll) {
+    store->set("password", std::string("verysecret"));
+    const Setting<int> open(store, "password", 1, orDefault());
+    const Setting<std::string> hidden(store, "password", "verysecret", secret());
+    const auto all = describe(store, "password");
+    ASSERT_EQ(all.size(), 2U);
+    for (const Description& setting : all) {
+        EXPECT_TRUE(setting.secret);
+        EXPECT_EQ(setting.error.value_or("•••"), "•••");
+    }
+}
+
 TEST_F(DescribeTest, HidesSecrets) {
     const Setting<std::string> password(store, "password", "verysecret", secret());
     const Description setting = describe(store).front();

@@ -97,6 +97,26 @@ TEST_F(SecretsTest, AreHiddenInWhatAStructIsRefusedWith) {
               "account.age: 300 from source \"override\" is no int: not between 0 and 200");
 }
 
+TEST_F(SecretsTest, AreToldOneByOneAsAllTogether) {
+    const Bound<Account> account(
+        store, "account",
+        fields(&Account::user, "user", "u", &Account::password, "password", "p", secret()));
+    EXPECT_TRUE(isSecret(store, "account.password"));
+    EXPECT_FALSE(isSecret(store, "account.user"));
+    EXPECT_FALSE(isSecret(store, "account"));
+}
+
+TEST_F(SecretsTest, AreToldOneByOneBesideASettingThatDoesNotSaySo) {
+    const Setting<std::string> first(store, "token", "t");
+    EXPECT_FALSE(isSecret(store, "token"));
+    const Setting<std::string> second(store, "token", "t", secret());
+    EXPECT_TRUE(isSecret(store, "token"));
+}
+
+TEST_F(SecretsTest, AreNotToldWhereNothingIsDeclared) {
+    EXPECT_FALSE(isSecret(store, "token"));
+}
+
 TEST(Masked, IsTheTextOfWhatIsNoSecret) {
     EXPECT_EQ(masked(false, "a"), "a");
 }

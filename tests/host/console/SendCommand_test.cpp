@@ -24,7 +24,7 @@ protected:
     std::string send(Words arguments) { return registry->find("send")->run(std::move(arguments)); }
 
     std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
-    messages::MessageService service{store};
+    messages::MessageService service{store, {}, secretsOf(store)};
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     HostCommands commands{{store, std::make_shared<Watches>(store, [](const auto&, const auto&) {}),
                            service.dispatcherFor(messages::allRequestTypes()), [] {}},

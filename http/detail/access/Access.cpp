@@ -1,0 +1,100 @@
+#include "http/detail/access/Access.hpp"
+
+#include <algorithm>
+#include <array>
+#include <string_view>
+
+#include "http/detail/routes/Problem.hpp"
+
+namespace velkor::http::detail {
+
+namespace {
+
+// Those that decide: of two that differ, another program on the way might have looked at the other.
+constexpr std::array<std::string_view, 4> singleHeaders{"host", "origin", "authorization",
+                                                        "sec-fetch-site"};
+
+void requireSingle(const Request& request) {
+    std::array<int, singleHeaders.size()> counts{};
+    for (const auto& [name, value] : request.headers) {
+        const auto* const found = std::find(singleHeaders.begin(), singleHeaders.end(), name);
+        if (found == singleHeaders.end()) continue;
+        if (++counts[static_cast<std::size_t>(found - singleHeaders.begin())] > 1) {
+            throw Problem(ProblemKind::badRequest,
+                          "The header \"" + std::string(name) + "\" was sent twice.");
+        }
+    }
+}
+
+bool isOrigin(std::string_view origin, std::string_view scheme, std::string_view host) {
+    return origin.size() == scheme.size() + host.size() &&
+           isSameName(origin.substr(0, scheme.size()), scheme) &&
+           isSameName(origin.substr(scheme.size()), host);
+}
+
+std::string_view bearerToken(std::string_view authorization) {
+    constexpr std::string_view scheme = "Bearer ";
+    if (!isSameName(authorization.substr(0, scheme.size()), scheme)) return {};
+    return authorization.substr(scheme.size());
+}
+
+}  // namespace
+
+Access::Access(const ServerOptions& options)
+    : allowWrites(options.allowWrites), behindProxy(options.behindProxy), names(options) {
+    if (!options.tokenFile.empty()) tokens.emplace(options.tokenFile);
+}
+
+void Access::requireOwnName(const Request& request) const {
+    requireSingle(request);
+    const auto host = request.header("host");
+    if (!host) throw Problem(ProblemKind::badRequest, "The header \"host\" is missing.");
+    if (!names.contain(*host)) {
+        throw Problem(ProblemKind::forbidden, "No name of this server: " + std::string(*host));
+    }
+    const auto origin = request.header("origin");
+    if (!origin) return;
+    const bool maybeSecure = request.client.secure || behindProxy;
+    const bool isOwn = (maybeSecure && isOrigin(*origin, "https://", *host)) ||
+                       (!request.client.secure && isOrigin(*origin, "http://", *host));
+    if (!isOwn) {
+        throw Problem(ProblemKind::forbidden,
+                      "Pages of another origin may not come here: " + std::string(*origin));
+    }
+}
+
+void Access::requireOwnSite(const Request& request) {
+    const auto site = request.header("sec-fetch-site");
+    if (!site || *site == "same-origin" || *site == "none") return;
+    throw Problem(ProblemKind::forbidden, "Pages of another origin may not come here.");
+}
+
+bool Access::mayWrite(const Request& request) const {
+    if (!allowWrites || !tokens) return allowWrites;
+    const auto holder = holderOf(request);
+    return holder && holder->right == Right::write;
+}
+
+std::string Access::requireRight(const Request& request, Right needed) const {
+    std::string who = "anybody";
+    if (needed == Right::none) return who;
+    Right given = Right::write;
+    if (tokens) {
+        const auto holder = holderOf(request);
+        if (!holder) throw Problem(ProblemKind::unauthorised, "A token that is known is needed.");
+        given = holder->right;
+        who = "token " + std::to_string(holder->number);
+    }
+    if (needed == Right::write && !allowWrites) {
+        throw Problem(ProblemKind::forbidden, "Nobody may write here.");
+    }
+    if (needed > given) throw Problem(ProblemKind::forbidden, "The token may only read.");
+    return who;
+}
+
+std::optional<TokenHolder> Access::holderOf(const Request& request) const {
+    const auto authorization = request.header("authorization");
+    return authorization ? tokens->holderOf(bearerToken(*authorization)) : std::nullopt;
+}
+
+}  // namespace velkor::http::detail

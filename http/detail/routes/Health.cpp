@@ -1,0 +1,105 @@
+#include "http/detail/routes/Health.hpp"
+
+#include <utility>
+
+#include "configuration/sources/MonitoredSource.hpp"
+#include "http/detail/routes/Layers.hpp"
+
+namespace velkor::http::detail {
+
+namespace {
+
+using configuration::ConfigurationSource;
+using configuration::MonitoredSource;
+using configuration::SourceDescription;
+
+Response plainText(int status, std::string&& text) {
+    return {status, "text/plain; charset=utf-8", std::move(text), {}};
+}
+
+bool isWell(const ConfigurationSource& source) {
+    const auto* const monitored = dynamic_cast<const MonitoredSource*>(&source);
+    return monitored == nullptr || monitored->state().isWell;
+}
+
+// The layers, with 1 for those that are well.
+void writeLayers(const Context& context, std::string& out) {
+    std::size_t count = 0;
+    std::string states;
+    forEachSource(context, [&](const SourceDescription& layer, ConfigurationSource& source) {
+        ++count;
+        states.append("velkor_layer_well{layer=\"").append(labelText(layer.name)).append("\"} ");
+        states.append(isWell(source) ? "1\n" : "0\n");
+    });
+    writeMetric(out, "velkor_layers", "gauge", "Layers of the store.", count);
+    writeMetricHead(out, "velkor_layer_well", "gauge", "Whether a layer is well.");
+    out.append(states);
+}
+
+void writeTransport(const TransportCounts& counts, std::string& out) {
+    writeMetric(out, "velkor_http_connections", "gauge", "Open connections.",
+                counts.connectionsOpen);
+    writeMetric(out, "velkor_http_connections_accepted_total", "counter",
+                "Connections that were opened.", counts.connectionsAccepted);
+    writeMetric(out, "velkor_http_connections_refused_total", "counter",
+                "Connections that were one too many.", counts.connectionsRefused);
+    writeMetric(out, "velkor_http_streams", "gauge", "Open event streams.", counts.streamsOpen);
+    writeMetric(out, "velkor_http_streams_refused_total", "counter",
+                "Event streams that were one too many.", counts.streamsRefused);
+    writeMetric(out, "velkor_http_events_written_total", "counter",
+                "Events that were sent to clients.", counts.eventsWritten);
+    writeMetric(out, "velkor_http_requests_read_total", "counter", "Requests that were read.",
+                counts.requestsRead);
+    writeMetric(out, "velkor_http_requests_refused_total", "counter",
+                "Requests that were no HTTP or too large.", counts.requestsRefused);
+    writeMetric(out, "velkor_http_requests_timed_out_total", "counter",
+                "Requests that were not complete in time.", counts.requestsTimedOut);
+    writeMetric(out, "velkor_http_writes_timed_out_total", "counter",
+                "Answers and events that were not taken in time.", counts.writesTimedOut);
+    writeMetric(out, "velkor_http_read_bytes_total", "counter", "Bytes that were read.",
+                counts.bytesRead);
+    writeMetric(out, "velkor_http_written_bytes_total", "counter", "Bytes that were written.",
+                counts.bytesWritten);
+}
+
+void writeValues(const Metrics& metrics, std::string& out) {
+    writeMetricHead(out, "velkor_http_watches", "gauge", "Open watches, by what is watched.");
+    out.append("velkor_http_watches{of=\"key\"} ").append(std::to_string(metrics.watchesOpen));
+    out.append("\nvelkor_http_watches{of=\"prefix\"} ");
+    out.append(std::to_string(metrics.changeStreamsOpen)).append("\n");
+    writeMetric(out, "velkor_http_values_delivered_total", "counter",
+                "Values that were shown to watches.", metrics.valuesDelivered);
+    writeMetric(out, "velkor_http_values_conflated_total", "counter",
+                "Values of watched keys that newer ones replaced before they were shown.",
+                metrics.valuesConflated);
+}
+
+}  // namespace
+
+Response alive(const Context&, const Call&) {
+    return plainText(200, "alive\n");
+}
+
+Response ready(const Context& context, const Call&) {
+    std::string names;
+    forEachSource(context, [&](const SourceDescription& layer, ConfigurationSource& source) {
+        if (!isWell(source)) names += (names.empty() ? "" : ", ") + layer.name;
+    });
+    if (names.empty()) return plainText(200, "ready\n");
+    Response response = plainText(503, "not ready: " + names + "\n");
+    response.headers.emplace_back("Retry-After", "1");
+    return response;
+}
+
+Response metricsText(const Context& context, const Call&) {
+    std::string text;
+    writeMetric(text, "velkor_keys", "gauge", "Keys of the store.",
+                context.store->keys().get().size());
+    writeLayers(context, text);
+    context.metrics->writeRequests(text);
+    writeValues(*context.metrics, text);
+    writeTransport(*context.transport, text);
+    return {200, "text/plain; version=0.0.4; charset=utf-8", std::move(text), {}};
+}
+
+}  // namespace velkor::http::detail

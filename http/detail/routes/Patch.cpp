@@ -1,0 +1,80 @@
+#include "http/detail/routes/Patch.hpp"
+
+#include <algorithm>
+#include <exception>
+#include <new>
+#include <utility>
+
+#include "http/detail/routes/ChangeRequest.hpp"
+#include "http/detail/routes/Commits.hpp"
+#include "http/detail/routes/Items.hpp"
+#include "http/detail/routes/JsonWriter.hpp"
+#include "http/detail/routes/Problem.hpp"
+#include "http/detail/routes/WriteRecord.hpp"
+#include "settings/Secrets.hpp"
+
+namespace velkor::http::detail {
+
+namespace {
+
+using configuration::AppliedChange;
+using configuration::Change;
+
+bool isDryRun(const Call& call) {
+    const std::string* const text = find(call.parameters, "dry-run");
+    if (text == nullptr || *text == "false") return false;
+    if (text->empty() || *text == "true") return true;
+    throw Problem(ProblemKind::badRequest, "\"dry-run\" must be true or false.");
+}
+
+Response changedResponse(const Context& context, const std::vector<AppliedChange>& changes,
+                         bool dryRun) {
+    const auto secrets = settings::secretKeys(context.store);
+    JsonWriter json;
+    json.beginObject().member("dryRun", dryRun).name("changes").beginArray();
+    for (const AppliedChange& change : changes) {
+        json.beginObject();
+        writeKey(json, change.key);
+        json.member("source", change.source);
+        if (change.before) {
+            json.name("before").value(*change.before, secrets.count(change.key) != 0);
+        }
+        json.endObject();
+    }
+    json.endArray().endObject();
+    return jsonResponse(json.take());
+}
+
+std::vector<std::string> sourcesOf(const std::vector<AppliedChange>& changes) {
+    std::vector<std::string> names;
+    for (const AppliedChange& change : changes) names.push_back(change.source);
+    std::sort(names.begin(), names.end());
+    names.erase(std::unique(names.begin(), names.end()), names.end());
+    return names;
+}
+
+void write(const Context& context, Call& call, const std::vector<Change>& changes) {
+    WriteRecord record("PATCH /config", call);
+    for (const Change& change : changes) record.add(change.key);
+    std::vector<AppliedChange> applied;
+    try {
+        applied = context.store->apply(changes).get();
+    } catch (const std::bad_alloc&) {
+        throw;
+    } catch (...) {
+        return record.answer(call.answer, problemResponse(std::current_exception()));
+    }
+    answerOnceCommitted(durableSources(*context.store, sourcesOf(applied)), std::move(record),
+                        std::move(call.answer), changedResponse(context, applied, false));
+}
+
+}  // namespace
+
+void patchOptions(const Context& context, Call& call) {
+    const bool dryRun = isDryRun(call);
+    const auto changes = parsedChanges(call.request.body, context.jsonLimits);
+    if (!dryRun) return write(context, call, changes);
+    call.answer(changedResponse(context, context.store->apply(changes, true).get(), true));
+}
+
+}  // namespace velkor::http::detail

@@ -1,0 +1,229 @@
+#include "http/detail/Service.hpp"
+
+#include <algorithm>
+#include <atomic>
+#include <exception>
+#include <new>
+#include <stdexcept>
+#include <string_view>
+#include <utility>
+
+#include "configuration/ConfigurationImpl.hpp"
+#include "http/Refused.hpp"
+#include "http/detail/ClientStore.hpp"
+#include "http/detail/PropertyRoot.hpp"
+#include "http/detail/routes/Problem.hpp"
+#include "http/detail/routes/Route.hpp"
+#include "http/detail/routes/Worker.hpp"
+
+namespace velkor::http::detail {
+
+namespace {
+
+using configuration::ConfigurationImpl;
+
+constexpr std::size_t mostWaiting = 64;
+constexpr std::size_t smallBody = 4096;
+
+std::shared_ptr<const PropertyRoot> propertyRootOf(const ServerOptions& options) {
+    if (options.propertyRoot.empty()) return nullptr;
+    return std::make_shared<PropertyRoot>(options.propertyRoot, options.maxPropertyFileBytes);
+}
+
+messages::JsonLimits limitsOf(const ServerOptions& options) {
+    return {options.maxBodyBytes, options.maxJsonDepth, options.maxJsonContainers};
+}
+
+std::shared_ptr<Metrics> metricsOfRoutes() {
+    std::vector<std::string> names;
+    for (const Route& route : routes()) {
+        names.push_back(std::string(route.method).append(" ").append(route.path));
+    }
+    return std::make_shared<Metrics>(names);
+}
+
+/// The path and the query of what a request asks for.
+struct Target {
+    std::string_view path;
+    std::string_view query;
+};
+
+Target targetOf(std::string_view sent) {
+    if (sent.empty() || sent.front() != '/') {
+        throw Problem(ProblemKind::badRequest, "The target of the request is no path.");
+    }
+    const auto end = std::min(sent.find('?'), sent.size());
+    return {sent.substr(0, end), sent.substr(std::min(end + 1, sent.size()))};
+}
+
+std::string_view methodOf(const Request& request) {
+    return request.method == "HEAD" ? std::string_view("GET") : request.method;
+}
+
+// The methods that there are at `path`; empty if it is none.
+std::string allowedAt(std::string_view path) {
+    std::string methods;
+    for (const Route& route : routes()) {
+        if (!route.isAt(path) || methods.find(route.method) != std::string::npos) continue;
+        if (!methods.empty()) methods += ", ";
+        methods += route.method;
+        if (route.method == "GET") methods += ", HEAD";
+    }
+    return methods;
+}
+
+const Route* routeAt(std::string_view path, std::string_view method) {
+    const auto& all = routes();
+    const auto found = std::find_if(all.begin(), all.end(), [&](const Route& route) {
+        return route.method == method && route.isAt(path);
+    });
+    return found == all.end() ? nullptr : &*found;
+}
+
+// There is no route of that method at `path`.
+Response otherMethod(std::string_view path, const std::string& method) {
+    std::string allowed = allowedAt(path);
+    if (allowed.empty()) {
+        throw Problem(ProblemKind::notFound, "There is nothing at " + std::string(path));
+    }
+    Response response =
+        method == "OPTIONS"
+            ? Response{204, {}, {}, {}}
+            : problemResponse(ProblemKind::methodNotAllowed, "Allowed here: " + allowed);
+    response.headers.emplace_back("Allow", std::move(allowed));
+    return response;
+}
+
+void requireKnown(const Route& route, const Parameters& parameters) {
+    for (auto each = parameters.begin(); each != parameters.end(); ++each) {
+        const auto& name = each->first;
+        if (name.empty() || std::find(route.parameters.begin(), route.parameters.end(), name) ==
+                                route.parameters.end()) {
+            throw Problem(ProblemKind::badRequest, "Unknown query parameter: " + name);
+        }
+        if (std::any_of(parameters.begin(), each,
+                        [&](const auto& before) { return before.first == name; })) {
+            throw Problem(ProblemKind::badRequest, "Query parameter given twice: " + name);
+        }
+    }
+}
+
+std::string argumentOf(const Route& route, std::string_view path) {
+    if (!route.hasArgument()) return {};
+    auto argument = percentDecoded(path.substr(route.path.size()));
+    if (!argument) {
+        throw Problem(ProblemKind::badRequest, "The path is not percent-encoded right.");
+    }
+    return *std::move(argument);
+}
+
+/// Leads requests through access and routing to what answers them. Immutable but for the worker,
+/// so safe for concurrent use.
+class Service final : public Handler {
+public:
+    Service(std::shared_ptr<ConfigurationImpl> store, const ServerOptions& serverOptions,
+            std::shared_ptr<const TransportCounts> counts)
+        : options(serverOptions),
+          access(options),
+          messageService(std::make_shared<ClientStore>(store, propertyRootOf(options)),
+                         limitsOf(options), secretsOf(store)),
+          context{store,
+                  options,
+                  access,
+                  metricsOfRoutes(),
+                  std::move(counts),
+                  messageService.dispatcherFor(messages::allRequestTypes()),
+                  limitsOf(options)} {}
+
+    void handle(Request&& request, std::function<void(Answer&&)> answer) override {
+        Call call{std::move(request),
+                  PendingAnswer(std::move(answer), context.metrics, routes().size())};
+        answering(call, [&] { letIn(call); });
+    }
+
+    Response refusal(int status) const override {
+        const ProblemKind kind = problemOf(status);
+        return problemResponse(kind, textOf(kind));
+    }
+
+    void stop() noexcept override { worker.stop(); }
+
+private:
+    // Runs `work`, and answers with what it throws. Without memory the answer is that of a request
+    // that was given up.
+    template <class Work>
+    static void answering(Call& call, Work&& work) {
+        try {
+            work();
+        } catch (const std::bad_alloc&) {
+            return;
+        } catch (...) {
+            call.answer(problemResponse(std::current_exception()));
+        }
+    }
+
+    void letIn(Call& call) {
+        const Request& request = call.request;
+        access.requireOwnName(request);
+        const Target target = targetOf(request.target);
+        const Route* const route = routeAt(target.path, methodOf(request));
+        if (route == nullptr) return call.answer(otherMethod(target.path, request.method));
+        call.answer.belongsTo(static_cast<std::size_t>(route - routes().data()));
+        if (!route->isForAnyone) Access::requireOwnSite(request);
+        call.who = access.requireRight(request, route->right);
+        if (!route->isForAnyone && !target.query.empty()) {
+            call.parameters = parsedQuery(target.query);
+            requireKnown(*route, call.parameters);
+        }
+        call.argument = argumentOf(*route, target.path);
+        if (route->isStream && request.method == "HEAD") {
+            return call.answer(Response{200, "text/event-stream", {}, {}});
+        }
+        const bool isLight = route->place == Place::caller && request.body.size() <= smallBody;
+        if (isLight) return route->handle(context, call);
+        enqueue(*route, call);
+    }
+
+    void enqueue(const Route& route, Call& call) {
+        const auto kept = std::make_shared<Call>(std::move(call));
+        const bool isTaken = worker.post([this, &route, kept] {
+            answering(*kept, [&] { route.handle(context, *kept); });
+        });
+        if (!isTaken) {
+            kept->answer(problemResponse(ProblemKind::unavailable, "Too many requests wait."));
+        }
+    }
+
+    static std::string_view textOf(ProblemKind kind) {
+        switch (kind) {
+            case ProblemKind::badRequest:
+                return "The request is no HTTP that is understood here.";
+            case ProblemKind::timeout:
+                return "The request was not complete in time.";
+            case ProblemKind::tooLarge:
+                return "The body is too large.";
+            case ProblemKind::headersTooLarge:
+                return "The headers are too large.";
+            case ProblemKind::unavailable:
+                return "There are too many connections or streams.";
+            default:
+                return "The request can't be answered.";
+        }
+    }
+
+    const ServerOptions options;
+    const Access access;
+    const messages::MessageService messageService;
+    const Context context;
+    Worker worker{mostWaiting};  // the last member: it uses the others
+};
+
+}  // namespace
+
+std::shared_ptr<Handler> makeService(std::shared_ptr<ConfigurationImpl> store,
+                                     const ServerOptions& options,
+                                     std::shared_ptr<const TransportCounts> counts) {
+    return std::make_shared<Service>(std::move(store), options, std::move(counts));
+}
+
+}  // namespace velkor::http::detail

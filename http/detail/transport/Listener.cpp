@@ -1,0 +1,57 @@
+#include "http/detail/transport/Listener.hpp"
+
+#include <utility>
+
+#include "http/Refused.hpp"
+#include "http/detail/transport/Acceptor.hpp"
+#include "http/detail/transport/ListeningSocket.hpp"
+#include "http/detail/transport/Loop.hpp"
+#include "http/detail/transport/Shared.hpp"
+#include "http/detail/transport/Tls.hpp"
+
+namespace velkor::http::detail::transport {
+
+Listener::Listener(const ServerOptions& options, std::shared_ptr<Handler> handler,
+                   std::shared_ptr<TransportCounts> counts)
+    : shared(std::make_shared<Shared>(options, std::move(handler), std::move(counts),
+                                      tlsContext(options.tlsCertificate, options.tlsKey))) {
+    std::vector<std::unique_ptr<ListeningSocket>> sockets;
+    for (const std::string& text : options.endpoints) {
+        sockets.push_back(std::make_unique<ListeningSocket>(Endpoint(text)));
+        bound.push_back(sockets.back()->endpoint());
+    }
+    for (unsigned count = 0; count < options.threads; ++count) loops.emplace_back(shared);
+    turn = loops.begin();
+    for (auto& socket : sockets) {
+        const bool secure = shared->tls && !socket->endpoint().isUnix();
+        acceptors.push_back(std::make_shared<Acceptor>(loops.front(), std::move(socket), secure,
+                                                       shared,
+                                                       [this]() -> Loop& { return nextLoop(); }));
+    }
+    for (const auto& acceptor : acceptors) acceptor->start();
+}
+
+Listener::~Listener() {
+    stop();
+}
+
+Loop& Listener::nextLoop() noexcept {
+    Loop& chosen = *turn++;
+    if (turn == loops.end()) turn = loops.begin();
+    return chosen;
+}
+
+bool Listener::stop() noexcept {
+    if (!isStopping.exchange(true)) {
+        for (const auto& acceptor : acceptors) acceptor->close();
+        for (Loop& loop : loops) loop.stop();
+    }
+    for (const Loop& loop : loops) {
+        if (loop.runsHere()) return false;
+    }
+    const common::MutexLock lock(joining);
+    for (Loop& loop : loops) loop.join();
+    return true;
+}
+
+}  // namespace velkor::http::detail::transport

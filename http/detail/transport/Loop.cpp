@@ -1,0 +1,148 @@
+#include "http/detail/transport/Loop.hpp"
+
+#include <algorithm>
+#include <boost/asio/post.hpp>
+#include <exception>
+#include <utility>
+
+#include "http/detail/Loggers.hpp"
+#include "http/detail/transport/Connections.hpp"
+#include "http/detail/transport/ResponseText.hpp"
+
+namespace velkor::http::detail::transport {
+namespace {
+
+using std::chrono::milliseconds;
+
+// How long answers that are under way are waited for when the server stops.
+constexpr milliseconds stopGrace{500};
+
+// How often the times of the connections are looked at: a small part of the shortest of them.
+milliseconds tickInterval(const ServerOptions& options) {
+    const auto shortest = std::min({options.requestTimeout, options.writeTimeout,
+                                    options.idleTimeout, options.commentInterval});
+    return std::clamp(shortest / 16, milliseconds(1), milliseconds(250));
+}
+
+// What a sink throws doesn't end the thread either.
+void reportLost(const std::exception& error) noexcept {
+    try {
+        logger.write(common::error, "A connection was lost: ", error.what());
+    } catch (const std::exception&) {
+        return;
+    }
+}
+
+}  // namespace
+
+Loop::Loop(std::shared_ptr<Shared> sharedByAll)
+    : shared(std::move(sharedByAll)),
+      interval(tickInterval(shared->options)),
+      running(std::make_shared<Context>(1)),
+      work(boost::asio::make_work_guard(*running)),
+      ticker(*running) {
+    thread.emplace([this] { run(); });
+}
+
+Loop::~Loop() {
+    stop();
+    join();
+}
+
+void Loop::run() noexcept {
+    threadId = std::this_thread::get_id();
+    for (;;) {
+        try {
+            running->run();
+            return;
+        } catch (const std::exception& error) {
+            reportLost(error);
+        }
+    }
+}
+
+void Loop::take(Arrival&& arrival, Limits::Place&& place) {
+    boost::asio::post(*running,
+                      [this, arrival = std::move(arrival), place = std::move(place)]() mutable {
+                          admit(std::move(arrival), std::move(place));
+                      });
+}
+
+void Loop::admit(Arrival&& arrival, Limits::Place&& place) noexcept {
+    if (isStopping()) return;
+    try {
+        const auto make = arrival.secure ? tlsConnection : plainConnection;
+        const std::shared_ptr<Peer> peer =
+            make(*this, shared, std::move(arrival), std::move(place));
+        peers.emplace(peer.get(), peer);
+        peer->begin();
+        armTicker();
+    } catch (const std::exception&) {
+        ++shared->counts->connectionsRefused;
+    }
+}
+
+void Loop::forget(const Peer& peer) noexcept {
+    peers.erase(&peer);
+    endIfDone();
+}
+
+const std::string& Loop::date() {
+    const std::time_t now = std::time(nullptr);
+    if (now != dateSecond) {
+        dateOfSecond = dateText(now);
+        dateSecond = now;
+    }
+    return dateOfSecond;
+}
+
+void Loop::stop() {
+    boost::asio::post(*running, [this] { beginStop(); });
+}
+
+void Loop::beginStop() {
+    if (isStopping()) return;
+    stopTime = Peer::Clock::now() + stopGrace;
+    // A peer that ends leaves the others where they are, and goes itself.
+    for (auto next = peers.begin(); next != peers.end();) {
+        const std::shared_ptr<Peer> peer = (next++)->second;
+        peer->stop();
+    }
+    ticker.cancel();  // its next end is the new time
+    endIfDone();
+}
+
+void Loop::armTicker() {
+    if (ticking) return;
+    const auto now = Peer::Clock::now();
+    ticker.expires_at(isStopping() ? std::min(*stopTime, now + interval) : now + interval);
+    ticker.async_wait([this](const boost::system::error_code&) {
+        ticking = false;
+        tick();
+    });
+    ticking = true;
+}
+
+void Loop::tick() {
+    const auto now = Peer::Clock::now();
+    const bool timeIsUp = isStopping() && now >= *stopTime;
+    for (auto next = peers.begin(); next != peers.end();) {
+        const auto present = next++;
+        if (!timeIsUp && now < present->second->dueTime()) continue;
+        const std::shared_ptr<Peer> peer = present->second;
+        if (timeIsUp) {
+            peer->end();
+        } else {
+            peer->expire();
+        }
+    }
+    if (!peers.empty()) armTicker();
+}
+
+void Loop::endIfDone() noexcept {
+    if (!isStopping() || !peers.empty()) return;
+    work.reset();
+    ticker.cancel();
+}
+
+}  // namespace velkor::http::detail::transport
