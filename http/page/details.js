@@ -35,6 +35,7 @@ class Details {
         this.#historyLimit = 20;
         this.#frame(item.key === '' ? '(empty key)' : item.key,
             element('p', { id: 'details-about', class: 'about' }),
+            element('div', { id: 'details-setting' }),
             this.#section('Layers', 'details-layers'),
             ...this.#formSection(item),
             this.#section('History', 'details-history'));
@@ -64,6 +65,7 @@ class Details {
         await Promise.all([
             this.#load(item, 'details-layers', `/config/${encodedKey(item)}`, (found) => this.#layers(found)),
             this.#load(item, 'details-history', `/history?key=${encodedKey(item)}&limit=${this.#historyLimit}`, (found) => this.#history(found)),
+            this.#load(item, 'details-setting', '/settings', (found) => this.#errors(found)),
         ]);
     }
 
@@ -113,6 +115,12 @@ class Details {
                 ...this.#unsetButton(layer)),
             wholeValue(layer.value)));
         return [element('ol', { class: 'layers' }, ...rows)];
+    }
+
+    // A process that declared the key may have refused its value, and goes by the last good one.
+    #errors({ settings }) {
+        return settings.filter(({ key, error }) => error && key === this.#item?.key)
+            .map(({ error }) => element('p', { class: 'problem' }, `Not taken by the process: ${error}`));
     }
 
     #unsetButton({ source: name }) {
