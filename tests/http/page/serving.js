@@ -1,14 +1,21 @@
 // Runs velkor-config as a server for tests, and a browser in front of it.
 import { spawn } from 'node:child_process';
-import { mkdtempSync, rmSync, writeFileSync } from 'node:fs';
+import { mkdtempSync, readFileSync, rmSync, writeFileSync } from 'node:fs';
 import { createRequire } from 'node:module';
+import { after } from 'node:test';
 import { tmpdir } from 'node:os';
 import { join } from 'node:path';
 import { createInterface } from 'node:readline';
 
 const require = createRequire(join(process.env.VELKOR_NODE_FOLDER, '/'));
 const { chromium } = require('playwright-core');
-const axe = require.resolve('axe-core/axe.min.js');
+const axe = readFileSync(require.resolve('axe-core/axe.min.js'), 'utf8');
+
+const browser = await chromium.launch({
+    executablePath: process.env.VELKOR_BROWSER,
+    args: ['--no-sandbox'],  // which root is not given
+});
+after(() => browser.close());
 
 /// The program while it serves, on `port` or one that is free.
 export class Server {
@@ -18,7 +25,7 @@ export class Server {
     static async start(args, port = 0) {
         const server = new Server();
         server.#process = spawn(process.env.VELKOR_CONFIG_PROGRAM,
-            ['--listen', `127.0.0.1:${port}`, ...args], { stdio: ['ignore', 'pipe', 'inherit'] });
+            ['--listen', `127.0.0.1:${port}`, '--log', 'velkor::http=fatal,error', ...args], { stdio: ['ignore', 'pipe', 'inherit'] });
         server.#ended = new Promise((resolve) => server.#process.once('exit', resolve));
         for await (const line of createInterface(server.#process.stdout)) {
             server.url = line.replace('Listening on ', '');
@@ -51,7 +58,6 @@ export class Server {
 export class Bench {
     #folder = mkdtempSync(join(tmpdir(), 'velkor-'));
     #test;
-    #browser;
 
     constructor(test) {
         this.#test = test;
@@ -75,14 +81,8 @@ export class Bench {
 
     /// A new page; nothing that it reports may be left when the test ends.
     async openTab(look = {}) {
-        if (this.#browser === undefined) {
-            this.#browser = await chromium.launch({
-                executablePath: process.env.VELKOR_BROWSER,
-                args: ['--no-sandbox'],
-            });
-            this.#test.after(() => this.#browser.close());
-        }
-        const context = await this.#browser.newContext(look);
+        const context = await browser.newContext(look);
+        this.#test.after(() => context.close());
         const tab = await context.newPage();
         tab.complaints = [];
         tab.on('pageerror', (problem) => tab.complaints.push(String(problem)));
@@ -117,19 +117,22 @@ export const showsText = (tab, selector, text) =>
 export async function flaws(tab) {
     // The policy of the page lets no script in but its own: this one comes by the debugger.
     const session = await tab.context().newCDPSession(tab);
-    const { readFileSync } = await import('node:fs');
-    await session.send('Runtime.evaluate', { expression: readFileSync(axe, 'utf8') });
+    await session.send('Runtime.evaluate', { expression: axe });
     const found = await tab.evaluate(() => globalThis.axe.run());
     return found.violations.map(({ id, nodes }) => `${id}: ${nodes.map((node) => `${node.html} ${node.failureSummary}`).join('; ')}`);
 }
 
-/// Seconds that scripts have run in the page.
-export async function measureScripts(tab) {
+/// Tells the seconds that scripts, and all tasks, have run in the page since.
+export async function measureTasks(tab) {
     const session = await tab.context().newCDPSession(tab);
     await session.send('Performance.enable');
-    return async () => {
+    const read = async (name) => {
         const { metrics } = await session.send('Performance.getMetrics');
-        const seconds = (name) => metrics.find((metric) => metric.name === name).value;
-        return { scripts: seconds('ScriptDuration'), everything: seconds('TaskDuration') };
+        return metrics.find((metric) => metric.name === name).value;
     };
+    const [scripts, everything] = [await read('ScriptDuration'), await read('TaskDuration')];
+    return async () => ({
+        scripts: await read('ScriptDuration') - scripts,
+        everything: await read('TaskDuration') - everything,
+    });
 }
