@@ -32,6 +32,7 @@ class Details {
     /// Shows `item` and moves the focus there.
     open(item) {
         this.#item = item;
+        this.#form = undefined;
         this.#historyLimit = 20;
         this.#frame(item.key === '' ? '(empty key)' : item.key,
             element('p', { id: 'details-about', class: 'about' }),
@@ -67,6 +68,11 @@ class Details {
             this.#load(item, 'details-history', `/history?key=${encodedKey(item)}&limit=${this.#historyLimit}`, (found) => this.#history(found)),
             this.#load(item, 'details-setting', '/settings', (found) => this.#errors(found)),
         ]);
+    }
+
+    /// Lets the form know that the value is another one now.
+    renewForm() {
+        this.#form?.renew();
     }
 
     #frame(title, ...content) {

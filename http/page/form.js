@@ -11,7 +11,9 @@ class SetForm {
     #asJson;
     #field;
     #source;
+    #shown;  // the text of the value that the field began with
     #hint = element('p', { id: 'value-hint', class: 'muted hint' });
+    #changed = element('p', { class: 'hint', role: 'status' });
     #problem = element('p', { id: 'value-problem', class: 'problem', role: 'alert' });
     #done = element('p', { class: 'done', role: 'status' });
 
@@ -37,8 +39,30 @@ class SetForm {
         return this.#item?.secret === true;
     }
 
+    get #held() {
+        return this.#item?.value ?? { type: 'string', value: '' };
+    }
+
+    /// Shows the value that the item has now, unless another one is being entered: then it is told.
+    renew() {
+        if (this.#item === undefined || this.#isSecret) return;
+        if (this.#field.value !== this.#shown) {
+            this.#changed.textContent = `It has changed meanwhile: ${showContent(this.#held.value) || 'empty text'}`;
+            return;
+        }
+        this.#type.value = this.#held.type;
+        this.#showHeld();
+    }
+
+    #showHeld() {
+        this.#asJson.checked = !this.#isSecret && needsJson(this.#held);
+        this.#showField(this.#isSecret ? '' : writeValue(this.#held, this.#asJson.checked));
+        this.#shown = this.#field.value;
+        this.#changed.textContent = '';
+    }
+
     #build() {
-        const held = this.#item?.value ?? { type: 'string', value: '' };
+        const held = this.#held;
         if (this.#item === undefined) {
             this.#key = element('input', { id: 'set-key', autocomplete: 'off', spellcheck: 'false', required: true });
             this.#key.addEventListener('input', () => this.#offerSources());
@@ -46,7 +70,6 @@ class SetForm {
         this.#type = element('select', { id: 'set-type', onchange: () => this.#changeType() },
             ...typeNames.map((name) => element('option', { selected: name === held.type }, name)));
         this.#asJson = element('input', { type: 'checkbox', id: 'set-json', onchange: () => this.#changeForm() });
-        this.#asJson.checked = !this.#isSecret && needsJson(held);
         this.#source = element('select', { id: 'set-source' });
         this.#field = element('input');
         this.#node = element('form', { class: 'set', onsubmit: (event) => this.#submit(event) },
@@ -55,12 +78,12 @@ class SetForm {
             labelled('Layer', this.#source),
             element('div', { class: 'wide' },
                 element('label', { for: 'set-value' }, 'Value'), this.#field,
-                element('label', { class: 'check' }, this.#asJson, ' as JSON'), this.#hint, this.#problem),
+                element('label', { class: 'check' }, this.#asJson, ' as JSON'), this.#hint, this.#changed, this.#problem),
             element('p', { class: 'actions wide' },
                 element('button', { class: 'primary', value: 'set' }, 'Set'), ' ',
                 element('button', { value: 'check' }, 'Only check')),
             this.#done);
-        this.#showField(this.#isSecret ? '' : writeValue(held, this.#asJson.checked));
+        this.#showHeld();
         this.#offerSources();
     }
 
@@ -143,7 +166,10 @@ class SetForm {
             const source = this.#source.value || undefined;
             const { changes: [change] } = await this.#api.change([{ key, value, source }], { dryRun });
             this.#done.textContent = `${dryRun ? 'Would be set' : 'Set'} in ${change.source}. ${beforeText(change)}`;
-            if (!dryRun) this.#onSet(change);
+            if (dryRun) return;
+            this.#shown = this.#field.value;
+            this.#changed.textContent = '';
+            this.#onSet(change);
         } catch (problem) {
             this.#complain(problem.message);
             this.#field.focus();

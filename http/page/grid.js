@@ -156,6 +156,12 @@ class Grid {
         return item && this.#rows.get(item.id)?.targets[this.#active.column];
     }
 
+    // Those that a narrow table leaves out can't show the focus.
+    get #shownColumns() {
+        const [{ targets }] = this.#rows.values();
+        return [...targets.keys()].filter((column) => targets[column].offsetWidth > 1);
+    }
+
     #syncTabStop() {
         const stop = this.#activeCell;
         for (const old of this.#body.querySelectorAll('[tabindex="0"]')) {
@@ -199,19 +205,21 @@ class Grid {
         const { first, last } = this.#visible;
         const page = Math.max(1, last - first - 1);
         const end = this.#items.length - 1;
+        const columns = this.#shownColumns;
+        const place = columns.indexOf(column);
         const target = {
             ArrowUp: [index - 1, column],
             ArrowDown: [index + 1, column],
-            ArrowLeft: [index, column - 1],
-            ArrowRight: [index, column + 1],
+            ArrowLeft: [index, columns[place - 1] ?? column],
+            ArrowRight: [index, columns[place + 1] ?? column],
             PageUp: [index - page, column],
             PageDown: [index + page, column],
-            Home: event.ctrlKey ? [0, 0] : [index, 0],
-            End: event.ctrlKey ? [end, 4] : [index, 4],
+            Home: [event.ctrlKey ? 0 : index, 0],
+            End: [event.ctrlKey ? end : index, columns.at(-1)],
         }[event.key];
         if (target !== undefined) {
             event.preventDefault();
-            this.#focusCell(Math.min(Math.max(target[0], 0), end), Math.min(Math.max(target[1], 0), 4));
+            this.#focusCell(Math.min(Math.max(target[0], 0), end), target[1]);
         } else if ((event.key === 'Enter' || event.key === ' ') && event.target.role === 'gridcell') {
             event.preventDefault();
             this.#onOpen(this.#items[index]);

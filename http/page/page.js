@@ -98,7 +98,7 @@ function onState(state, { pause, problem }) {
         if (!wasLost) {
             byId('lost-text').textContent = `Connection lost at ${clock(new Date())}. What is shown may be out of date.`;
         }
-        byId('lost-pause').textContent = `${problem?.message ?? ''} Trying again in ${pause < 1000 ? 'a moment' : countOf(pause / 1000, 'second')}.`;
+        byId('lost-pause').textContent = `${problem.message}. Trying again in ${pause < 1000 ? 'a moment' : countOf(pause / 1000, 'second')}.`;
     }
 }
 
@@ -110,7 +110,9 @@ function onDifferences(differences, isResync) {
     for (const { kind, item } of differences) {
         if (kind === 'gone') changed.delete(item.id);
         else changed.set(item.id, now);
-        if (item.id === details.openedId) refreshDetails();
+        if (item.id !== details.openedId) continue;
+        details.renewForm();
+        refreshDetails();
     }
     describeNew(differences);
     announce(differences, isResync);

@@ -166,6 +166,17 @@ test('elements that hold line ends are edited as JSON', async (t) => {
     await showsValue(tab, 'lines', 'a↵b, d');
 });
 
+test('the form follows its key, but never takes away what is being entered', async (t) => {
+    const { server, tab } = await openWritable(new Bench(t));
+    await openDetails(tab, 'http.motd');
+    await server.set('http.motd', 'string', 'Hello');
+    await tab.waitForFunction(() => document.getElementById('set-value').value === 'Hello');
+    await tab.getByLabel('Value', { exact: true }).fill('Good day');
+    await server.set('http.motd', 'string', 'Good evening');
+    await showsText(tab, 'form.set', 'It has changed meanwhile: Good evening');
+    assert.equal(await tab.getByLabel('Value', { exact: true }).inputValue(), 'Good day');
+});
+
 test('checking a change leaves the store alone', async (t) => {
     const { tab } = await openWritable(new Bench(t));
     await openDetails(tab, 'http.motd');
