@@ -61,8 +61,10 @@ std::uint32_t hexadecimalPrefix(std::string_view digits) {
 PropertyFileParser::PropertyFileParser(std::string content) : text(std::move(content)) {}
 
 TextTable PropertyFileParser::parse() {
-    State state = State::lineStart;
-    while (!atEnd()) state = step(state);
+    return parse([](const Step&) {});
+}
+
+TextTable PropertyFileParser::finish(State state) {
     // A last line needs no line break, but it does need a key and a separator.
     const bool hasKey = current.key != current.value;
     if (state == State::value && hasKey) storeProperty("Parsed final property: ");

@@ -20,13 +20,7 @@ namespace velkor::configuration {
 /// more. A key ends at a separator and not at a line break. A later line with the same key wins.
 class PropertyFileParser {
 public:
-    /// Takes over `content`, the whole file.
-    explicit PropertyFileParser(std::string content);
-
-    /// To be called once.
-    TextTable parse();
-
-private:
+    /// What the next byte belongs to.
     enum class State {
         lineStart,
         key,
@@ -37,6 +31,35 @@ private:
         continuationIndent
     };
 
+    /// One step through the file: the bytes from `begin` to `end` were read in the state `from`,
+    /// and led to `to`.
+    struct Step {
+        State from;
+        State to;
+        std::size_t begin;
+        std::size_t end;
+    };
+
+    /// Takes over `content`, the whole file.
+    explicit PropertyFileParser(std::string content);
+
+    /// To be called once, or the other one.
+    TextTable parse();
+
+    /// As above, and calls `observe` with each step.
+    template <class Observe>
+    TextTable parse(Observe&& observe) {
+        State state = State::lineStart;
+        while (!atEnd()) {
+            const std::size_t begin = position;
+            const State next = step(state);
+            observe(Step{state, next, begin, position});
+            state = next;
+        }
+        return finish(state);
+    }
+
+private:
     // Each handles the bytes from `position` on, at least one of which is left, and says what
     // comes next.
     State onLineStart();
@@ -47,6 +70,7 @@ private:
     State onValueEscape();
     State onContinuationIndent();
     State step(State state);
+    TextTable finish(State state);
 
     bool atEnd() const { return position == text.size(); }
     char next() const { return text[position]; }
