@@ -5,7 +5,11 @@
 namespace velkor::configuration::detail {
 
 void KeyPage::addAll(std::string_view group, const TextTable& table) {
-    for (std::size_t number = 0; number < table.size(); ++number) {
+    const std::size_t size = table.size();
+    // Each key that is smaller than all before it has to be kept for a while.
+    const bool descends = size != 0 && table.key(size - 1) < table.key(0);
+    for (std::size_t count = 0; count < size; ++count) {
+        const std::size_t number = descends ? size - 1 - count : count;
         const Candidate candidate{group, table.key(number)};
         if (accepts(candidate) && table.counting(number) == number) insert(candidate);
     }

@@ -1,6 +1,7 @@
 #include "host/look/KeyPattern.hpp"
 
 #include <algorithm>
+#include <set>
 #include <utility>
 
 #include "host/TerminalText.hpp"
@@ -90,6 +91,10 @@ KeySelection::KeySelection(const std::vector<std::string>& words,
 }
 
 void KeySelection::forEach(const std::function<void(const std::string& key)>& visit) {
+    if (!parts.empty() && std::all_of(parts.begin(), parts.end(),
+                                      [](const Part& part) { return part.pattern.isKey(); })) {
+        return visitKeys(visit);
+    }
     std::string first;
     if (!parts.empty()) {
         first = std::min_element(parts.begin(), parts.end(), [](const Part& a, const Part& b) {
@@ -100,6 +105,16 @@ void KeySelection::forEach(const std::function<void(const std::string& key)>& vi
         if (selects(key)) visit(key);
         return !isBehindAll(key);
     });
+}
+
+// Without a look at any other key.
+void KeySelection::visitKeys(const std::function<void(const std::string& key)>& visit) {
+    std::set<std::string> keys;
+    for (Part& part : parts) {
+        part.isFound = true;
+        keys.insert(part.pattern.beginning());
+    }
+    for (const auto& key : keys) visit(key);
 }
 
 void KeySelection::requireAllFound() const {

@@ -23,6 +23,9 @@ public:
 
     bool matches(std::string_view key) const;
 
+    /// Whether it means one key only.
+    bool isKey() const noexcept { return kind == Kind::key; }
+
     /// What all keys begin with that match.
     const std::string& beginning() const noexcept { return fixed; }
 
@@ -57,6 +60,7 @@ private:
         bool isFound = false;
     };
 
+    void visitKeys(const std::function<void(const std::string& key)>& visit);
     bool selects(const std::string& key);
     bool isBehindAll(const std::string& key) const;
 
