@@ -35,6 +35,7 @@
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
 #include "host/lint/CheckFiles.hpp"
+#include "host/look/JsonAnswers.hpp"
 #include "host/look/LookCommands.hpp"
 #include "host/sources/SourceLoader.hpp"
 #include "host/state/StateLayer.hpp"
@@ -69,9 +70,9 @@ public:
           storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
           lookCommands(store, registry),
           hostCommands(
-              {store, std::make_shared<Watches>(store, showValue()),
+              {store, std::make_shared<Watches>(store, showValue(optionText)),
                service.dispatcherFor(messages::allRequestTypes()), [this] { console.quit(); },
-               [this](const auto& name) { return problemOf(name); }},
+               [this](const auto& name) { return problemOf(name); }, showValue(watchedJson)},
               registry) {}
 
     // Threads of sources may be about to announce something still.
@@ -122,12 +123,13 @@ public:
     }
 
 private:
-    Watches::Show showValue() const {
-        return [announcements = announcements, watched = std::weak_ptr(store)](const auto& key,
-                                                                               const auto& value) {
+    /// Announces values as the lines that `line` makes of them.
+    Watches::Show showValue(decltype(&optionText) line) const {
+        return [line, announcements = announcements, watched = std::weak_ptr(store)](
+                   const auto& key, const auto& value) {
             const auto open = watched.lock();
             const bool isSecret = open != nullptr && settings::secretKeys(open).count(key) != 0;
-            announcements->announce(optionText(key, value, isSecret));
+            announcements->announce(line(key, value, isSecret));
         };
     }
 

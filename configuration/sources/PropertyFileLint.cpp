@@ -107,7 +107,8 @@ public:
         }
         lookForForeignBytes();
         const TextTable table =
-            PropertyFileParser(std::string(text)).parse([this](const Step& s) { observe(s); });
+            PropertyFileParser(std::string(text), PropertyFileParser::Records::omitted)
+                .parse([this](const Step& s) { observe(s); });
         atEnd();
         lookForSameKeys(table);
         std::stable_sort(found.begin(), found.end(), [](const Finding& a, const Finding& b) {

@@ -58,7 +58,8 @@ std::uint32_t hexadecimalPrefix(std::string_view digits) {
 
 }  // namespace
 
-PropertyFileParser::PropertyFileParser(std::string content) : text(std::move(content)) {}
+PropertyFileParser::PropertyFileParser(std::string content, Records kept)
+    : text(std::move(content)), records(kept) {}
 
 TextTable PropertyFileParser::parse() {
     return parse([](const Step&) {});
@@ -190,9 +191,11 @@ void PropertyFileParser::takeUnicodeEscape() {
 void PropertyFileParser::storeProperty(std::string_view logPrefix) {
     const std::string_view all = text;
     properties.push_back(current);
-    propertyFileLogger.write(common::trace, logPrefix,
-                             all.substr(current.key, current.value - current.key), " = ",
-                             all.substr(current.value, taken - current.value));
+    if (records == Records::written) {
+        propertyFileLogger.write(common::trace, logPrefix,
+                                 all.substr(current.key, current.value - current.key), " = ",
+                                 all.substr(current.value, taken - current.value));
+    }
     current = {taken, taken};
 }
 

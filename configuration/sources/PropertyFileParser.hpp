@@ -40,8 +40,11 @@ public:
         std::size_t end;
     };
 
+    /// Whether each property is written to the log.
+    enum class Records { written, omitted };
+
     /// Takes over `content`, the whole file.
-    explicit PropertyFileParser(std::string content);
+    explicit PropertyFileParser(std::string content, Records kept = Records::written);
 
     /// To be called once, or the other one.
     TextTable parse();
@@ -86,6 +89,7 @@ private:
     std::size_t taken = 0;                 // the size of what is gathered
     TextTable::Property current = {0, 0};  // where that of this line begins
     std::vector<TextTable::Property> properties;
+    const Records records;
 };
 
 }  // namespace velkor::configuration

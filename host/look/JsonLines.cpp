@@ -19,6 +19,13 @@ Poco::JSON::Object::Ptr optionJson(const configuration::Option& option, bool isS
     return json;
 }
 
+Poco::JSON::Array::Ptr holdersJson(const std::vector<configuration::Option>& holders,
+                                   bool isSecret) {
+    Poco::JSON::Array::Ptr array = new Poco::JSON::Array;
+    for (const auto& holder : holders) array->add(optionJson(holder, isSecret));
+    return array;
+}
+
 void JsonLines::add(const std::string& name, const Poco::Dynamic::Var& value) {
     if (!last.empty()) output.line(last + ',');
     Poco::JSON::Object member;

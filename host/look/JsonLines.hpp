@@ -1,8 +1,10 @@
 #pragma once
 
+#include <Poco/JSON/Array.h>
 #include <Poco/JSON/Object.h>
 
 #include <string>
+#include <vector>
 
 #include "configuration/Option.hpp"
 #include "host/console/Command.hpp"
@@ -14,6 +16,10 @@ Poco::JSON::Object::Ptr valueJson(const configuration::ConfigurationValue& value
 
 /// As above, with the name of its source: {"source":...,"value":{...}}.
 Poco::JSON::Object::Ptr optionJson(const configuration::Option& option, bool isSecret);
+
+/// An array of `holders`, each as above.
+Poco::JSON::Array::Ptr holdersJson(const std::vector<configuration::Option>& holders,
+                                   bool isSecret);
 
 /// Writes one JSON object over several lines, a member on each, as it is made.
 class JsonLines {

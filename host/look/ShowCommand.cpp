@@ -1,5 +1,3 @@
-#include <Poco/JSON/Array.h>
-
 #include "host/console/ValueText.hpp"
 #include "host/look/JsonLines.hpp"
 #include "host/look/KeyPattern.hpp"
@@ -16,12 +14,6 @@ using configuration::Option;
 
 /// Shows the sources that hold one key, in order of precedence. There is one at least.
 using ShowKey = std::function<void(const std::vector<Option>& holders, bool isSecret)>;
-
-Poco::Dynamic::Var holdersJson(const std::vector<Option>& holders, bool isSecret) {
-    Poco::JSON::Array::Ptr array = new Poco::JSON::Array;
-    for (const auto& holder : holders) array->add(optionJson(holder, isSecret));
-    return array;
-}
 
 ShowKey inJson(JsonLines& lines, bool withSource, bool allSources) {
     return [&lines, withSource, allSources](const auto& holders, bool isSecret) {
