@@ -29,8 +29,8 @@ constexpr const char* footer =
     "separated by commas.\n"
     "\n"
     "Exit status: 0 fine, 1 a command failed or --check found something, 2 bad usage, 3 a source "
-    "or the state could not be\n"
-    "loaded.";
+    "or\n"
+    "the state could not be loaded.";
 
 constexpr const char* groupSetting = "group=";
 constexpr const char* orderSetting = "order=";
