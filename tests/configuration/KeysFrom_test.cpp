@@ -88,7 +88,8 @@ TEST_F(KeysFrom, AreAllKeysWhateverTheirOrderAndThePagesAre) {
     addFile("ascending", "", ascending);
     addFile("descending", "u", descending);
     addFile("shuffled", "up1", shuffled);
-    for (const std::size_t most : {1U, 7U, 100U, 4096U, 100000U}) EXPECT_EQ(inPagesOf(most), allKeys());
+    for (const std::size_t most : {1U, 7U, 100U, 4096U, 100000U})
+        EXPECT_EQ(inPagesOf(most), allKeys());
 }
 
 }  // namespace
