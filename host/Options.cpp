@@ -32,8 +32,9 @@ constexpr const char* footer =
     "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
     "separated by commas.\n"
     "\n"
-    "Exit status: 0 fine, 1 a command failed, 2 bad usage, 3 a source or the state could not be\n"
-    "loaded.";
+    "Exit status: 0 fine, 1 a command failed or --check found something, 2 bad usage, 3 a source "
+    "or\n"
+    "the state could not be loaded.";
 
 constexpr const char* groupSetting = "group=";
 constexpr const char* orderSetting = "order=";
@@ -118,6 +119,7 @@ public:
             "Keep what is set in FILE, with its history; made when missing.");
         addFlag("--watch-files", true, "Read files again when they change.");
         addFlag("--no-watch-files", false, "Read files once; as without a terminal.");
+        app.add_flag("--check", checksFiles, "Tell what is wrong with the files, and end.");
         add(fileSizes, "--max-file-size", "SIZE",
             "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
@@ -150,10 +152,15 @@ public:
         }
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
+        options.checksFiles = checksFiles;
         collectSources(options);
         options.serving = listenOptions->request();
-        if (options.serving)
+        if (options.serving) {
             options.serving->server.maxPropertyFileBytes = options.limits.fileBytes;
+        }
+        if (checksFiles && files.texts.empty() && sources.texts.empty()) {
+            throw UsageError("--check: a FILE is needed");
+        }
         return options;
     }
 
@@ -199,6 +206,7 @@ private:
     Repeatable assignments;
     Repeatable states;
     std::optional<bool> watchesFiles;
+    bool checksFiles = false;
     Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;

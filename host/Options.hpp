@@ -30,6 +30,7 @@ struct Options {
     SourceLimits limits{};
     std::vector<Assignment> assignments{};
     std::optional<std::string> statePath{};
+    bool checksFiles = false;            ///< The files are checked, and nothing else is done.
     std::optional<bool> watchesFiles{};  ///< Nothing: as fits the session.
     std::vector<std::string> lines{};    ///< Command lines; empty: they are read.
     std::vector<LogRequest> logs{};

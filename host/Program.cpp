@@ -24,15 +24,20 @@
 #include "host/console/DescriptorBuffer.hpp"
 #include "host/console/GivenLines.hpp"
 #include "host/console/HostCommands.hpp"
+#include "host/console/Interruption.hpp"
 #include "host/console/LineEditor.hpp"
 #include "host/console/LineReader.hpp"
 #include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
 #include "host/console/SendCommand.hpp"
 #include "host/console/SettingsCommand.hpp"
+#include "host/console/StreamedAnswer.hpp"
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
+#include "host/lint/CheckFiles.hpp"
+#include "host/look/JsonAnswers.hpp"
+#include "host/look/LookCommands.hpp"
 #include "host/serving/DroppingBuffer.hpp"
 #include "host/serving/Serving.hpp"
 #include "host/serving/Termination.hpp"
@@ -67,10 +72,11 @@ public:
           console(registry, output, [this] { store->acknowledge(); }),
           service(store, {}, secretsOf(store)),
           storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
+          lookCommands(store, registry),
           hostCommands(
-              {store, std::make_shared<Watches>(store, showValue()),
+              {store, std::make_shared<Watches>(store, showValue(optionText)),
                service.dispatcherFor(messages::allRequestTypes()), [this] { console.quit(); },
-               [this](const auto& name) { return problemOf(name); }},
+               [this](const auto& name) { return problemOf(name); }, showValue(watchedJson)},
               registry) {}
 
     // Threads of sources may be about to announce something still.
@@ -103,6 +109,7 @@ public:
     bool load(const std::vector<SourceRequest>& requests) {
         auto loaded = loadSources(*store, requests, limits);
         watchedFiles = std::move(loaded.watchedFiles);
+        for (const auto& notice : loaded.notices) output.message(notice);
         for (const auto& failure : loaded.failures) output.message(failure);
         return loaded.failures.empty();
     }
@@ -125,12 +132,13 @@ public:
     }
 
 private:
-    Watches::Show showValue() const {
-        return [announcements = announcements, watched = std::weak_ptr(store)](const auto& key,
-                                                                               const auto& value) {
+    /// Announces values as the lines that `line` makes of them.
+    Watches::Show showValue(decltype(&optionText) line) const {
+        return [line, announcements = announcements, watched = std::weak_ptr(store)](
+                   const auto& key, const auto& value) {
             const auto open = watched.lock();
             const bool isSecret = open != nullptr && settings::secretKeys(open).count(key) != 0;
-            announcements->announce(optionText(key, value, isSecret));
+            announcements->announce(line(key, value, isSecret));
         };
     }
 
@@ -162,6 +170,7 @@ private:
     Console console;
     messages::MessageService service;
     configuration::ConfigurationCommandProvider storeCommands;
+    LookCommands lookCommands;
     HostCommands hostCommands;
     std::shared_ptr<const void> declared;
     std::optional<SettingsCommand> settingsCommand;
@@ -220,6 +229,23 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
 }
 
+ExitCode runCheck(const Options& options, Output& output) {
+    std::vector<std::string> paths;
+    for (const auto& source : options.sources) {
+        if (source.kind == SourceRequest().kind) paths.push_back(source.location);
+    }
+    CheckedFiles checked;
+    StreamedAnswer answer(output);
+    try {
+        checked = checkFiles(paths, options.limits, answer);
+        answer.flush();
+    } catch (const Interrupted&) {
+        return ExitCode::commandFailed;  // nobody reads the remarks any more
+    }
+    if (checked.unreadable != 0) return ExitCode::sourceNotLoaded;
+    return checked.remarks == 0 ? ExitCode::fine : ExitCode::commandFailed;
+}
+
 }  // namespace
 
 ExitCode runProgram(const std::vector<std::string>& arguments, const DeclareSettings& declare) {
@@ -232,7 +258,11 @@ ExitCode runProgram(const std::vector<std::string>& arguments, const DeclareSett
     try {
         const Options options = parseOptions(arguments);
         output.answer(options.information);
-        if (options.information.empty()) exitCode = runSession(options, declare, output);
+        if (options.checksFiles) {
+            exitCode = runCheck(options, output);
+        } else if (options.information.empty()) {
+            exitCode = runSession(options, declare, output);
+        }
     } catch (const UsageError& error) {
         output.message(error.what());
         return ExitCode::badUsage;

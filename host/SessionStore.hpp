@@ -26,6 +26,9 @@ public:
     /// The layer that lasts; null when there is none.
     StateLayer* state() const noexcept { return stateLayer.get(); }
 
+    /// What the reading of a file may cost.
+    const SourceLimits& sourceLimits() const noexcept { return limits; }
+
     /// As in the library; throws `Interrupted` once Ctrl-C was pressed, on the console's thread.
     Future<configuration::ConfigurationValue> get(const std::string& key) override;
 

@@ -16,6 +16,15 @@ std::string counted(unsigned count) {
     return std::to_string(count) + (count == 1 ? " argument" : " arguments");
 }
 
+/// An answer that nobody sees before it is complete.
+class CollectedAnswer final : public CommandOutput {
+public:
+    void line(std::string_view added) override { text.append(added) += '\n'; }
+    void note(std::string_view) override {}
+
+    std::string text;
+};
+
 }  // namespace
 
 std::string_view Command::shortName() const noexcept {
@@ -39,14 +48,22 @@ std::vector<std::string> Command::readArguments(CommandLine& line) const {
     return arguments;
 }
 
-std::string Command::run(std::vector<std::string>&& arguments) const {
+std::string Command::run(std::vector<std::string>&& arguments, CommandOutput& output) const {
     const std::size_t count = arguments.size();
     const bool tooMany =
         descriptor.maximumArguments != unlimited && count > descriptor.maximumArguments;
     if (count < descriptor.minimumArguments || tooMany) {
         throw CommandError(name() + " takes " + limits() + "; given: " + std::to_string(count));
     }
-    return descriptor.handler(std::move(arguments));
+    if (traits.stream == nullptr) return descriptor.handler(std::move(arguments));
+    traits.stream(std::move(arguments), output);
+    return "";
+}
+
+std::string Command::run(std::vector<std::string>&& arguments) const {
+    CollectedAnswer collected;
+    const std::string answer = run(std::move(arguments), collected);
+    return collected.text + answer;
 }
 
 std::string Command::limits() const {

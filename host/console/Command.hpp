@@ -17,6 +17,23 @@ public:
     using std::runtime_error::runtime_error;
 };
 
+/// What a command writes to as it goes. Used by the thread that carries out the command.
+class CommandOutput {
+public:
+    virtual ~CommandOutput() = default;
+
+    /// Writes `text` and a line feed to the answer, now or soon. Throws `Interrupted` when Ctrl-C
+    /// was pressed, or nobody reads the answers any more.
+    virtual void line(std::string_view text) = 0;
+
+    /// Tells the operator something that is no part of the answer, behind what was written of it.
+    virtual void note(std::string_view text) = 0;
+};
+
+/// Carries out a command that writes its answer as it goes, a little of it at a time.
+using StreamingHandler =
+    std::function<void(std::vector<std::string>&& arguments, CommandOutput& output)>;
+
 /// What the console knows of a command beyond its descriptor.
 struct CommandTraits {
     /// The names of the arguments as help shows them; empty: help shows how many there are.
@@ -25,6 +42,8 @@ struct CommandTraits {
     bool takesRawRest = false;
     /// What the first argument may be, for completion; empty: a key of the store.
     std::function<std::vector<std::string>()> suggestions{};
+    /// Takes the place of the handler, for an answer that may be long; empty: the handler answers.
+    StreamingHandler stream{};
 };
 
 /// One command of the console. Immutable; its handler may run on several threads at once.
@@ -54,9 +73,12 @@ public:
     /// `CommandLineError`.
     std::vector<std::string> readArguments(CommandLine& line) const;
 
-    /// Calls the handler and gives its answer. Throws `CommandError` with the name, " takes ", the
-    /// limits, "; given: " and the number when that is outside the limits; what the handler throws
-    /// passes on.
+    /// Carries out the command: gives the handler's answer, or nothing when it writes to `output`
+    /// as it goes. Throws `CommandError` with the name, " takes ", the limits, "; given: " and the
+    /// number when that is outside the limits; what the handler throws passes on.
+    std::string run(std::vector<std::string>&& arguments, CommandOutput& output) const;
+
+    /// As above, with all of the answer as one text. What is noted is dropped.
     std::string run(std::vector<std::string>&& arguments) const;
 
 private:

@@ -5,6 +5,7 @@
 
 #include "host/console/CommandLine.hpp"
 #include "host/console/Interruption.hpp"
+#include "host/console/StreamedAnswer.hpp"
 
 namespace velkor::host {
 
@@ -66,15 +67,18 @@ void Console::execute(const std::string& line) {
     if (!name || isComment(line, words)) return;
     const auto command = registry->find(*name);
     auto arguments = command->readArguments(words);
+    StreamedAnswer streamed(output);
     std::string answer;
     try {
-        answer = command->run(std::move(arguments));
+        answer = command->run(std::move(arguments), streamed);
         acknowledge();
     } catch (const Interrupted&) {
         return;
     } catch (...) {
+        streamed.flush();
         throw CommandError(failureText(*command));
     }
+    streamed.flush();
     output.answer(answer);
 }
 

@@ -8,6 +8,8 @@
 #include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
+#include "host/look/JsonAnswers.hpp"
+#include "host/look/WordOptions.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -22,7 +24,34 @@ struct Context {
     std::weak_ptr<CommandRegistry> registry;
 };
 
-std::string showSources(const Context& context, const Arguments&) {
+constexpr const char* jsonOption = "--json";
+constexpr const char* rawOption = "--raw";
+
+/// The words of a command that knows no option but --json, and whether that is given.
+struct JsonChoice {
+    explicit JsonChoice(const Arguments& arguments) {
+        auto options = parseOptionsAmong(arguments, {{jsonOption}});
+        json = options.has(jsonOption);
+        words = std::move(options.words);
+    }
+
+    /// Throws `CommandError` unless KEY is given and nothing else.
+    const std::string& key() const {
+        if (words.size() != 1) throw CommandError("One KEY is needed.");
+        return words.front();
+    }
+
+    bool json;
+    Arguments words;
+};
+
+std::string showSources(const Context& context, const Arguments& arguments) {
+    const JsonChoice choice(arguments);
+    if (!choice.words.empty()) throw CommandError("sources takes no argument but --json.");
+    if (choice.json) {
+        return sourcesJson(context.services.store->describeSources().get(),
+                           context.services.problemOf);
+    }
     std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS", ""}};
     for (const auto& source : context.services.store->describeSources().get()) {
         rows.push_back({source.name, source.group.empty() ? "-" : source.group,
@@ -34,9 +63,11 @@ std::string showSources(const Context& context, const Arguments&) {
 }
 
 std::string explain(const Context& context, const Arguments& arguments) {
-    const auto options = context.services.store->explain(arguments.at(0)).get();
-    if (options.empty()) return "No configuration option with key: " + arguments.at(0);
-    const bool isSecret = settings::secretKeys(context.services.store).count(arguments.at(0)) != 0;
+    const JsonChoice choice(arguments);
+    const auto options = context.services.store->explain(choice.key()).get();
+    const bool isSecret = settings::secretKeys(context.services.store).count(choice.key()) != 0;
+    if (choice.json) return layersJson(choice.key(), options, isSecret);
+    if (options.empty()) return "No configuration option with key: " + choice.key();
     std::vector<std::vector<std::string>> rows;
     rows.reserve(options.size());
     for (const auto& option : options) {
@@ -47,8 +78,12 @@ std::string explain(const Context& context, const Arguments& arguments) {
 }
 
 std::string watch(const Context& context, const Arguments& arguments) {
-    if (context.services.watches->add(arguments.at(0))) return "";
-    throw CommandError("Watched already: " + arguments.at(0));
+    const JsonChoice choice(arguments);
+    auto& watches = *context.services.watches;
+    const bool isNew = choice.json ? watches.add(choice.key(), context.services.showJson)
+                                   : watches.add(choice.key());
+    if (isNew) return "";
+    throw CommandError("Watched already: " + choice.key());
 }
 
 std::string unwatch(const Context& context, const Arguments& arguments) {
@@ -86,8 +121,21 @@ std::string quit(const Context& context, const Arguments&) {
     return "";
 }
 
+/// The TYPE and JSON that follow --raw, which took the place of TYPE.
+Arguments behindRaw(const Arguments& arguments) {
+    if (arguments.size() == 1) throw CommandError("send --raw takes TYPE [JSON].");
+    CommandLine rest(arguments[1]);
+    Arguments typeAndJson{rest.nextWord().value_or("")};
+    const std::string_view json = rest.takeRest();
+    if (!json.empty()) typeAndJson.emplace_back(json);
+    return typeAndJson;
+}
+
 std::string send(const Context& context, const Arguments& arguments) {
-    return sendMessage(*context.services.dispatcher, arguments);
+    auto& dispatcher = *context.services.dispatcher;
+    if (arguments.at(0) != rawOption) return sendMessage(dispatcher, arguments);
+    const std::string reply = sendMessage(dispatcher, behindRaw(arguments));
+    return reply.substr(reply.find(' ') + 1);
 }
 
 std::vector<std::string> suggestCommands(const Context& context) {
@@ -115,9 +163,10 @@ struct HostCommand {
 };
 
 constexpr HostCommand commands[] = {
-    {"sources", "", "List the sources in order of precedence.", showSources, 0, 0},
-    {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
-    {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
+    {"sources", "[--json]", "List the sources in order of precedence.", showSources, 0, 1, false,
+     suggestNothing},
+    {"explain", "KEY [--json]", "Show every source that holds a key.", explain, 1, 2},
+    {"watch", "KEY [--json]", "Show the value of a key now and whenever it changes.", watch, 1, 2},
     {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
     {"put", "KEY VALUE [--for TIME]", "Set a value, with --for until the time is over.",
      onStore<putValue>, 2, 4},
@@ -127,8 +176,8 @@ constexpr HostCommand commands[] = {
      onStore<showHistory>, 0, 3},
     {"undo", "[N]", "Take back change N of the history, or the newest one.", onStore<undoChange>, 0,
      1, false, suggestNothing},
-    {"send", "TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2, true,
-     suggestRequests},
+    {"send", "[--raw] TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2,
+     true, suggestRequests},
     {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
      suggestCommands},
     {"quit", "", "End the session.", quit, 0, 0},

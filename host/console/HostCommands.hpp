@@ -22,21 +22,26 @@ struct HostServices {
     std::function<std::string(const std::string& name)> problemOf = [](const auto&) {
         return std::string();
     };
+    /// Shows a value that is watched as JSON.
+    Watches::Show showJson = [](const auto&, const auto&) {};
 };
 
 /// Keeps the host's own commands registered while it lives:
 ///
-/// - sources: a table of all sources in order of precedence, with what is the matter with them.
-/// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
-///   is the effective one.
-/// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.
+/// - sources [--json]: a table of all sources in order of precedence, with what is the matter with
+///   them.
+/// - explain KEY [--json]: a table of the sources that hold KEY in order of precedence, the first
+/// of
+///   which is the effective one.
+/// - watch KEY [--json], unwatch KEY: show the values of KEY as they change, and no longer.
 /// - put KEY VALUE [--for TIME], unset KEY, history [KEY] [--limit N], undo [N]: see
 ///   StateCommands.hpp.
-/// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest
-///   of the line as it was typed.
+/// - send [--raw] TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`; with
+///   --raw nothing but its JSON. JSON is the rest of the line as it was typed.
 /// - help [COMMAND], quit.
 ///
-/// Values of secret keys, see `settings::secretKeys`, are shown as •••.
+/// With --json the answer is JSON, see JsonAnswers.hpp. Values of secret keys, see
+/// `settings::secretKeys`, are shown as •••.
 ///
 /// Handlers share the services, so they may run after this object is gone. Called with too few
 /// arguments they throw `std::out_of_range`.

@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "host/console/ValueText.hpp"
+#include "host/look/KeyWalk.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -23,29 +24,32 @@ CommandHandler maskingGet(const StorePtr& store, CommandHandler get) {
     };
 }
 
-CommandHandler maskingList(const StorePtr& store, CommandHandler list) {
-    return [store, list = std::move(list)](Arguments&& arguments) {
+// Every line as the command writes it.
+StreamingHandler streamedList(const StorePtr& store) {
+    return [store](Arguments&&, CommandOutput& output) {
         const auto secrets = settings::secretKeys(store);
-        if (secrets.empty()) return list(std::move(arguments));
-        std::string text;
-        for (const auto& key : store->keys().get()) {
-            text += optionText(key, store->get(key).get(), secrets.count(key) != 0) + '\n';
-        }
-        return text;
+        OptionWriter writer;
+        walkKeys(*store, "", [&](const std::string& key) {
+            output.line(writer.text(key, store->get(key).get(), secrets.count(key) != 0));
+            return true;
+        });
     };
 }
 
 }  // namespace
 
 MaskingRegistry::MaskingRegistry(StorePtr maskedStore,
-                                 std::shared_ptr<administration::Administration> commandRegistry)
+                                 std::shared_ptr<CommandRegistry> commandRegistry)
     : store(std::move(maskedStore)), registry(std::move(commandRegistry)) {}
 
 Future<bool> MaskingRegistry::registerCommand(administration::CommandDescriptor command) {
     if (command.name == "velkor.configuration.get") {
         command.handler = maskingGet(store, std::move(command.handler));
     } else if (command.name == "velkor.configuration.list") {
-        command.handler = maskingList(store, std::move(command.handler));
+        CommandTraits traits;
+        traits.stream = streamedList(store);
+        return makeReadyFuture(
+            registry->add(std::make_shared<const Command>(std::move(command), std::move(traits))));
     }
     return registry->registerCommand(std::move(command));
 }

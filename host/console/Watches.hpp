@@ -28,6 +28,9 @@ public:
     /// watch is over then; so it is when the key was removed meanwhile.
     bool add(const std::string& key) VELKOR_EXCLUDES(mutex);
 
+    /// As above, but the values are shown by `shownBy`.
+    bool add(const std::string& key, const Show& shownBy) VELKOR_EXCLUDES(mutex);
+
     /// Shows no further values of `key`. Gives false when the key was not watched.
     bool remove(const std::string& key) VELKOR_EXCLUDES(mutex);
 
@@ -35,7 +38,7 @@ private:
     /// What keeps one watch open, once it is; its address tells it from a later one of the key.
     using Watch = std::shared_ptr<reactive_streams::SubscriptionHandle>;
 
-    reactive_streams::SubscriptionHandle open(const std::string& key) const;
+    reactive_streams::SubscriptionHandle open(const std::string& key, const Show& shownBy) const;
     void forget(const std::string& key, const Watch& watch) VELKOR_EXCLUDES(mutex);
 
     const std::shared_ptr<configuration::Configuration> store;

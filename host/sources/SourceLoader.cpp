@@ -4,6 +4,7 @@
 #include <new>
 #include <set>
 
+#include "host/lint/Remarks.hpp"
 #include "host/sources/SourceKinds.hpp"
 
 namespace velkor::host {
@@ -37,8 +38,11 @@ private:
 
 void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
                 const SourceRequest& request, const SourceLimits& limits, LoadedSources& loaded) {
-    const auto source = sourceKind(request.kind).make(request, limits);
+    const auto [source, remarks] = sourceKind(request.kind).make(request, limits);
     store.addSource(name, request.group, request.order, !request.writable, source).get();
+    if (remarks != 0) {
+        loaded.notices.push_back(remarksNotice(request.location, remarks));
+    }
     const auto file = std::dynamic_pointer_cast<const layers::ReloadingFileSource>(source);
     if (file == nullptr) return;
     loaded.watchedFiles.emplace(name, file);

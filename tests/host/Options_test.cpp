@@ -146,7 +146,7 @@ TEST(Options, HelpDescribesEveryOption) {
     for (const char* part :
          {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "--max-file-size SIZE",
           "--env PREFIX", "--set KEY=VALUE", "--state FILE", "--watch-files", "--no-watch-files",
-          "-c LINE", "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
+          "--check", "-c LINE", "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
         EXPECT_NE(help.find(part), std::string::npos) << part;
     }
 }

@@ -167,7 +167,7 @@ TEST_F(HostCommandsTest, UndoSuggestsNoKeys) {
 TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {
     const configuration::ConfigurationCommandProvider storeCommands(store, registry);
     const std::string help = run("help");
-    EXPECT_NE(help.find("explain                    KEY                      Show every source"),
+    EXPECT_NE(help.find("explain                    KEY [--json]             Show every source"),
               std::string::npos);
     EXPECT_NE(help.find("velkor.configuration.set   2 arguments              Set a configuration "
                         "value.\n"),
@@ -181,7 +181,7 @@ TEST_F(HostCommandsTest, HelpDescribesOneCommand) {
               "Short: get\n"
               "Get a specific configuration value.\n");
     EXPECT_EQ(run("help", {"watch"}),
-              "watch (KEY)\nShow the value of a key now and whenever it changes.\n");
+              "watch (KEY [--json])\nShow the value of a key now and whenever it changes.\n");
 }
 
 TEST_F(HostCommandsTest, HelpRefusesAnUnknownCommand) {
