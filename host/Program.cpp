@@ -29,6 +29,7 @@
 #include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
 #include "host/console/SettingsCommand.hpp"
+#include "host/console/StoreCommandRegistry.hpp"
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
@@ -62,7 +63,12 @@ public:
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output, [this] { store->acknowledge(); }),
           service(store),
-          storeCommands(store, std::make_shared<MaskingRegistry>(store, registry)),
+          storeCommands(
+              store,
+              std::make_shared<MaskingRegistry>(
+                  store, std::make_shared<StoreCommandRegistry>(
+                             store, registry,
+                             [this](std::string text) { console.remark(std::move(text)); }))),
           hostCommands(
               {store, std::make_shared<Watches>(store, showValue()),
                service.dispatcherFor(messages::allRequestTypes()), [this] { console.quit(); },

@@ -32,11 +32,18 @@ std::vector<std::string> Command::readArguments(CommandLine& line) const {
     while (!traits.takesRawRest || arguments.size() + 1 < descriptor.maximumArguments) {
         auto word = line.nextWord();
         if (!word) return arguments;
-        arguments.push_back(*std::move(word));
+        arguments.push_back(traits.takesWordsAsTyped ? std::string(line.typedWord())
+                                                     : *std::move(word));
     }
     const std::string_view rest = line.takeRest();
     if (!rest.empty()) arguments.emplace_back(rest);
     return arguments;
+}
+
+std::vector<std::string> Command::givenArguments(std::vector<std::string> words) const {
+    if (!traits.takesWordsAsTyped) return words;
+    for (auto& word : words) word = quotedWord(word);
+    return words;
 }
 
 std::string Command::run(std::vector<std::string>&& arguments) const {

@@ -25,6 +25,9 @@ struct CommandTraits {
     bool takesRawRest = false;
     /// What the first argument may be, for completion; empty: a key of the store.
     std::function<std::vector<std::string>()> suggestions{};
+    /// The arguments are words as they were typed, for `OptionWords`: what is quoted is told from
+    /// what is not.
+    bool takesWordsAsTyped = false;
 };
 
 /// One command of the console. Immutable; its handler may run on several threads at once.
@@ -53,6 +56,10 @@ public:
     /// The arguments of this command on `line`, whose first word has been read already. Throws
     /// `CommandLineError`.
     std::vector<std::string> readArguments(CommandLine& line) const;
+
+    /// The arguments of this command where the words after its name are known one by one, and
+    /// quoted by nobody.
+    std::vector<std::string> givenArguments(std::vector<std::string> words) const;
 
     /// Calls the handler and gives its answer. Throws `CommandError` with the name, " takes ", the
     /// limits, "; given: " and the number when that is outside the limits; what the handler throws

@@ -57,25 +57,35 @@ bool Console::runNext(LineSource& lines) {
     const auto line = lines.nextLine();
     Interruption::take();  // what came before the command is not about it
     if (line) execute(*line);
+    showRemarks(lines.position());
     return line.has_value();
 }
 
 void Console::execute(const std::string& line) {
+    remarks.clear();
     CommandLine words(line);
     const auto name = words.nextWord();
     if (!name || isComment(line, words)) return;
     const auto command = registry->find(*name);
-    auto arguments = command->readArguments(words);
+    carryOut(*command, command->readArguments(words));
+}
+
+void Console::carryOut(const Command& command, std::vector<std::string>&& arguments) {
     std::string answer;
     try {
-        answer = command->run(std::move(arguments));
+        answer = command.run(std::move(arguments));
         acknowledge();
     } catch (const Interrupted&) {
         return;
     } catch (...) {
-        throw CommandError(failureText(*command));
+        throw CommandError(failureText(command));
     }
     output.answer(answer);
+}
+
+void Console::showRemarks(const std::string& position) {
+    for (const auto& remark : remarks) output.message(position + remark);
+    remarks.clear();
 }
 
 }  // namespace velkor::host

@@ -4,6 +4,7 @@
 #include <iterator>
 #include <utility>
 
+#include "host/console/PutCommand.hpp"
 #include "host/console/SendCommand.hpp"
 #include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
@@ -70,13 +71,21 @@ std::string helpFor(const Command& command) {
     return text + command.description() + '\n';
 }
 
+// Options would make every row of the table as long as theirs: `help COMMAND` shows them.
+std::string withoutOptions(std::string argumentText) {
+    const std::size_t options = argumentText.find(" [--");
+    return options == std::string::npos ? argumentText
+                                        : argumentText.substr(0, options) + " [OPTIONS]";
+}
+
 std::string help(const Context& context, const Arguments& arguments) {
     const auto registry = context.registry.lock();
     if (!registry) return "";
     if (!arguments.empty()) return helpFor(*registry->find(arguments.at(0)));
     std::vector<std::vector<std::string>> rows;
     for (const auto& command : registry->commands()) {
-        rows.push_back({command->name(), command->argumentText(), command->description()});
+        rows.push_back(
+            {command->name(), withoutOptions(command->argumentText()), command->description()});
     }
     return formatTable(rows) + "A command may be called by the last word of its name.\n";
 }
@@ -113,6 +122,7 @@ struct HostCommand {
     std::uint8_t maximumArguments;
     bool takesRawRest = false;
     std::vector<std::string> (*suggest)(const Context&) = nullptr;
+    bool takesWordsAsTyped = false;
 };
 
 constexpr HostCommand commands[] = {
@@ -120,10 +130,10 @@ constexpr HostCommand commands[] = {
     {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
     {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
     {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
-    {"put", "KEY VALUE [--for TIME]", "Set a value, with --for until the time is over.",
-     onStore<putValue>, 2, 4},
-    {"unset", "KEY", "Take back what was set for a key, and show what is effective then.",
-     onStore<unsetKey>, 1, 1},
+    {"put", putUsage, "Set a value as it was typed, or of a type, also for a time.",
+     onStore<putValue>, 0, 255, false, nullptr, true},
+    {"unset", unsetUsage, "Take back what was set for a key, and show what is effective then.",
+     onStore<unsetKey>, 0, 255, false, nullptr, true},
     {"history", "[KEY] [--limit N]", "Show what was set when and by whom, the newest first.",
      onStore<showHistory>, 0, 3},
     {"undo", "[N]", "Take back change N of the history, or the newest one.", onStore<undoChange>, 0,
@@ -141,6 +151,7 @@ CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
         return run(*context, arguments);
     };
     CommandTraits traits{command.argumentNames, command.takesRawRest};
+    traits.takesWordsAsTyped = command.takesWordsAsTyped;
     if (command.suggest != nullptr) {
         traits.suggestions = [suggest = command.suggest, context] { return suggest(*context); };
     }

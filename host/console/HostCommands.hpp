@@ -30,8 +30,8 @@ struct HostServices {
 /// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
 ///   is the effective one.
 /// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.
-/// - put KEY VALUE [--for TIME], unset KEY, history [KEY] [--limit N], undo [N]: see
-///   StateCommands.hpp.
+/// - put: see PutCommand.hpp.
+/// - unset, history [KEY] [--limit N], undo [N]: see StateCommands.hpp.
 /// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest
 ///   of the line as it was typed.
 /// - help [COMMAND], quit.

@@ -137,6 +137,27 @@ TEST(Program, AnAbsentKeyIsAnAnswerNotAFailure) {
     EXPECT_EQ(result.exitCode, 0);
 }
 
+TEST(Program, SaysWhenSetStoresSomethingElseThanWasTyped) {
+    const auto result = runProgram({}, "set host 10.20.0.9\nset a 1\nget host\n");
+    EXPECT_EQ(result.out, "10.2\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 1: set host: 10.20.0.9 was stored as 10.2; put stores the whole "
+              "word\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, PutTellsQuotedWordsFromOthers) {
+    EXPECT_EQ(runProgram({"-c", "put a 5", "-c", "put b '5'", "-c", "list"}).out,
+              "a = 5\nb = '5'\n");
+}
+
+TEST(Program, PutFailsWhereTheValueDoesNotFit) {
+    const auto result = runProgram({"-c", "put a --type uint -1", "-c", "list"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err, "velkor-config: --type uint: not within 0 to 4294967295\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
 TEST(Program, ReportsWhatASourceRefuses) {
     const auto result = runProgram(
         {"--source", "s=" + serviceFile + ",order=-1,writable", "-c", "set server.port 1"});

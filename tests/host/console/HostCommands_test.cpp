@@ -167,11 +167,16 @@ TEST_F(HostCommandsTest, UndoSuggestsNoKeys) {
 TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {
     const configuration::ConfigurationCommandProvider storeCommands(store, registry);
     const std::string help = run("help");
-    EXPECT_NE(help.find("explain                    KEY                      Show every source"),
+    EXPECT_NE(help.find("explain                    KEY                       Show every source"),
               std::string::npos);
-    EXPECT_NE(help.find("velkor.configuration.set   2 arguments              Set a configuration "
+    EXPECT_NE(help.find("velkor.configuration.set   2 arguments               Set a configuration "
                         "value.\n"),
               std::string::npos);
+}
+
+TEST_F(HostCommandsTest, HelpShowsOptionsOfOneCommandOnly) {
+    EXPECT_NE(run("help").find("unset    KEY [OPTIONS]"), std::string::npos);
+    EXPECT_EQ(run("help", {"unset"}).rfind("unset (KEY [--source SOURCE])\n", 0), 0U);
 }
 
 TEST_F(HostCommandsTest, HelpDescribesOneCommand) {
