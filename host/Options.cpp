@@ -69,14 +69,6 @@ std::optional<std::string> valueOf(std::string_view setting, std::string_view na
     return std::string(setting.substr(name.size()));
 }
 
-std::optional<int> parseOrder(const std::string& text) {
-    int order = 0;
-    const char* end = text.data() + text.size();
-    const auto [parsedEnd, error] = std::from_chars(text.data(), end, order);
-    if (error != std::errc() || parsedEnd != end) return std::nullopt;
-    return order;
-}
-
 void applySetting(SourceRequest& request, const std::string& setting, const std::string& text) {
     if (const auto group = valueOf(setting, groupSetting)) {
         request.group = *group;

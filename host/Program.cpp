@@ -30,10 +30,9 @@
 #include "host/console/Output.hpp"
 #include "host/console/SettingsCommand.hpp"
 #include "host/console/StoreCommandRegistry.hpp"
-#include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
-#include "host/sources/SourceLoader.hpp"
+#include "host/sources/SessionSources.hpp"
 #include "host/state/StateLayer.hpp"
 #include "messages/MessageService.hpp"
 #include "settings/Describe.hpp"
@@ -58,8 +57,8 @@ public:
     Session(Output& sessionOutput, const SourceLimits& sourceLimits)
         : output(sessionOutput),
           announcements(std::make_shared<Announcements>(output)),
-          limits(sourceLimits),
-          store(std::make_shared<SessionStore>(limits)),
+          store(std::make_shared<SessionStore>(sourceLimits)),
+          sources(std::make_shared<SessionSources>(store, sourceLimits)),
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output, [this] { store->acknowledge(); }),
           service(store),
@@ -72,7 +71,7 @@ public:
           hostCommands(
               {store, std::make_shared<Watches>(store, showValue()),
                service.dispatcherFor(messages::allRequestTypes()), [this] { console.quit(); },
-               [this](const auto& name) { return problemOf(name); }},
+               [sources = sources](const auto& name) { return sources->problemOf(name); }, sources},
               registry) {}
 
     // Threads of sources may be about to announce something still.
@@ -101,12 +100,13 @@ public:
                                  std::move(values));
     }
 
-    /// Gives whether all sources could be loaded; reports those that could not.
-    bool load(const std::vector<SourceRequest>& requests) {
-        auto loaded = loadSources(*store, requests, limits);
-        watchedFiles = std::move(loaded.watchedFiles);
-        for (const auto& failure : loaded.failures) output.message(failure);
-        return loaded.failures.empty();
+    /// Gives whether all sources could be loaded; reports those that could not. Files are read
+    /// again when they change if `watches`.
+    bool load(const std::vector<SourceRequest>& requests, bool watches) {
+        sources->watchFiles(watches);
+        const auto failures = sources->begin(requests);
+        for (const auto& failure : failures) output.message(failure);
+        return failures.empty();
     }
 
     /// Declares settings, and lists them by a command if there are any.
@@ -131,13 +131,6 @@ private:
         };
     }
 
-    std::string problemOf(const std::string& name) const {
-        const auto file = watchedFiles.find(name);
-        if (file == watchedFiles.end()) return "";
-        const auto problem = file->second->status().problem;
-        return problem ? "since " + timeText(problem->since) + ": " + problem->text : "";
-    }
-
     std::unique_ptr<LineSource> makeLineSource(const std::vector<std::string>& lines) {
         if (!lines.empty()) return std::make_unique<GivenLines>(lines);
         if (!isInteractive(lines)) return std::make_unique<LineReader>(std::cin);
@@ -152,9 +145,8 @@ private:
 
     Output& output;
     const std::shared_ptr<Announcements> announcements;
-    const SourceLimits limits;
-    LoadedSources::WatchedFiles watchedFiles;
     std::shared_ptr<SessionStore> store;
+    std::shared_ptr<SessionSources> sources;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
     messages::MessageService service;
@@ -172,11 +164,6 @@ bool answersArrived(Output& output) {
     return false;
 }
 
-std::vector<SourceRequest> watched(std::vector<SourceRequest> sources, bool watches) {
-    for (auto& source : sources) source.watched = watches;
-    return sources;
-}
-
 ExitCode runSession(const Options& options, const DeclareSettings& declare, Output& output) {
     std::optional<LogSink> logSink;
     if (!options.logs.empty()) logSink.emplace(std::cerr);
@@ -190,7 +177,7 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
     }
     session.assign(options.assignments);
     const bool watches = options.watchesFiles.value_or(isInteractive(options.lines));
-    const bool allLoaded = session.load(watched(options.sources, watches));
+    const bool allLoaded = session.load(options.sources, watches);
     session.declareSettings(declare);
     const bool allCarriedOut = session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;

@@ -6,6 +6,7 @@
 
 #include "host/console/PutCommand.hpp"
 #include "host/console/SendCommand.hpp"
+#include "host/console/SourceCommands.hpp"
 #include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
@@ -63,6 +64,12 @@ std::string onStore(const Context& context, const Arguments& arguments) {
     return run(context.services.store, arguments);
 }
 
+/// A command on nothing but the session's sources.
+template <std::string (*run)(SessionSources&, const Arguments&)>
+std::string onSources(const Context& context, const Arguments& arguments) {
+    return run(*context.services.sources, arguments);
+}
+
 std::string helpFor(const Command& command) {
     std::string text = command.name() + ' ' + '(' + command.argumentText() + ")\n";
     if (command.shortName() != command.name()) {
@@ -109,6 +116,10 @@ std::vector<std::string> suggestNothing(const Context&) {
     return {};
 }
 
+std::vector<std::string> suggestSources(const Context& context) {
+    return context.services.sources->names();
+}
+
 std::vector<std::string> suggestRequests(const Context&) {
     return requestTypes();
 }
@@ -127,6 +138,10 @@ struct HostCommand {
 
 constexpr HostCommand commands[] = {
     {"sources", "", "List the sources in order of precedence.", showSources, 0, 0},
+    {"load", loadUsage, "Add a property file as a source.", onSources<loadFile>, 0, 255, false,
+     nullptr, true},
+    {"unload", unloadUsage, "Remove a source.", onSources<unloadSource>, 1, 1, false,
+     suggestSources},
     {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
     {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
     {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},

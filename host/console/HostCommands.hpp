@@ -8,6 +8,7 @@
 #include "host/SessionStore.hpp"
 #include "host/console/CommandRegistration.hpp"
 #include "host/console/Watches.hpp"
+#include "host/sources/SessionSources.hpp"
 #include "messages/MessageDispatcher.hpp"
 
 namespace velkor::host {
@@ -22,6 +23,7 @@ struct HostServices {
     std::function<std::string(const std::string& name)> problemOf = [](const auto&) {
         return std::string();
     };
+    std::shared_ptr<SessionSources> sources{};
 };
 
 /// Keeps the host's own commands registered while it lives:
@@ -30,6 +32,7 @@ struct HostServices {
 /// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
 ///   is the effective one.
 /// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.
+/// - load, unload: see SourceCommands.hpp.
 /// - put: see PutCommand.hpp.
 /// - unset, history [KEY] [--limit N], undo [N]: see StateCommands.hpp.
 /// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest

@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "host/console/Command.hpp"
+#include "host/console/NearestNames.hpp"
 #include "settings/Conversion.hpp"
 
 namespace velkor::host {
@@ -92,12 +93,6 @@ struct Reading<std::vector<Element>> {
     }
 };
 
-std::string joinedTypeNames() {
-    std::string names;
-    for (const auto& name : typeNames()) names += (names.empty() ? "" : ", ") + name;
-    return names;
-}
-
 }  // namespace
 
 ConfigurationValue wordValue(const std::string& word) {
@@ -122,7 +117,7 @@ ConfigurationValue typedValue(const std::string& type, const Words& words) {
         if (kind.tag == type) value = Reading<Kind>::read(type, words);
     });
     if (value) return *std::move(value);
-    throw CommandError("--type " + type + ": one of " + joinedTypeNames() + " is needed");
+    throw CommandError("--type " + type + ": one of " + joinedNames(typeNames()) + " is needed");
 }
 
 std::vector<std::string> typeNames() {

@@ -2,7 +2,9 @@
 
 #include <exception>
 #include <new>
+#include <optional>
 #include <set>
+#include <stdexcept>
 
 #include "host/sources/SourceKinds.hpp"
 
@@ -38,11 +40,13 @@ private:
 void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
                 const SourceRequest& request, const SourceLimits& limits, LoadedSources& loaded) {
     const auto source = sourceKind(request.kind).make(request, limits);
-    store.addSource(name, request.group, request.order, !request.writable, source).get();
     const auto file = std::dynamic_pointer_cast<const layers::ReloadingFileSource>(source);
-    if (file == nullptr) return;
-    loaded.watchedFiles.emplace(name, file);
-    if (const auto problem = file->status().problem) loaded.failures.push_back(problem->text);
+    const auto problem = file == nullptr ? std::nullopt : file->status().problem;
+    if (problem && request.mustBeReadable) throw std::runtime_error(problem->text);
+    store.addSource(name, request.group, request.order, !request.writable, source).get();
+    loaded.names.push_back(name);
+    if (file != nullptr) loaded.watchedFiles.emplace(name, file);
+    if (problem) loaded.failures.push_back(problem->text);
 }
 
 }  // namespace

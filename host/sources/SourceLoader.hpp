@@ -17,6 +17,7 @@ struct LoadedSources {
     using WatchedFiles = std::map<std::string, std::shared_ptr<const layers::ReloadingFileSource>>;
 
     std::vector<std::string> failures{};
+    std::vector<std::string> names{};  ///< Of the sources that were added.
     WatchedFiles watchedFiles{};
 };
 

@@ -10,6 +10,7 @@
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Setting.hpp"
+#include "tests/support/TemporaryFile.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
@@ -18,8 +19,8 @@ namespace {
 using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
-const Words hostNames{"sources", "explain", "watch", "unwatch", "put", "unset",
-                      "history", "undo",    "send",  "help",    "quit"};
+const Words hostNames{"sources", "load",    "unload", "explain", "watch", "unwatch", "put",
+                      "unset",   "history", "undo",   "send",    "help",  "quit"};
 
 class HostCommandsTest : public ::testing::Test {
 protected:
@@ -27,8 +28,12 @@ protected:
         const auto show = [this](const auto& key, const auto& value) {
             shown.push_back(optionText(key, value));
         };
-        return {store, std::make_shared<Watches>(store, show), nullptr, [this] { quitting = true; },
-                [this](const auto& name) { return name == troubled ? "not now" : ""; }};
+        return {store,
+                std::make_shared<Watches>(store, show),
+                nullptr,
+                [this] { quitting = true; },
+                [this](const auto& name) { return name == troubled ? "not now" : ""; },
+                std::make_shared<SessionSources>(store, SourceLimits{})};
     }
 
     std::string run(const std::string& name, Words arguments = {}) {
@@ -101,6 +106,15 @@ TEST_F(HostCommandsTest, SourcesShowsWhatIsTheMatterWithOne) {
               "NAME      GROUP  ORDER       ACCESS    PROBLEM\n"
               "override  -      0           writable  not now\n"
               "default   -      2147483647  writable\n");
+}
+
+TEST_F(HostCommandsTest, LoadAndUnloadAddAndRemoveASource) {
+    const velkor::testing::TemporaryFile file("a=1\n");
+    EXPECT_EQ(run("load", {file.path().string()}), "Loaded as file.");
+    EXPECT_TRUE(store->has("a").get());
+    EXPECT_EQ(registry->find("unload")->suggestions()(), (Words{"override", "file", "default"}));
+    EXPECT_EQ(run("unload", {"file"}), "");
+    EXPECT_FALSE(store->has("a").get());
 }
 
 TEST_F(HostCommandsTest, ExplainShowsTheEffectiveValueFirst) {
