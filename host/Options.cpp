@@ -24,6 +24,7 @@ constexpr const char* footer =
     "smaller order wins.\n"
     "With --env APP_ the variable APP_SERVER__MAX_SIZE is server.max_size.\n"
     "On a terminal files are read again when they change, unless an option says otherwise.\n"
+    "Behind -- stands one command, whose words are taken as they are.\n"
     "SIZE is a number of bytes, also with KiB, MiB or GiB behind it.\n"
     "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
     "separated by commas.\n"
@@ -31,6 +32,7 @@ constexpr const char* footer =
     "Exit status: 0 fine, 1 a command failed, 2 bad usage, 3 a source or the state could not be\n"
     "loaded.";
 
+constexpr const char* commandMark = "--";
 constexpr const char* groupSetting = "group=";
 constexpr const char* orderSetting = "order=";
 constexpr const char* writableSetting = "writable";
@@ -125,8 +127,9 @@ public:
         app.footer(footer);
     }
 
-    Options parse(const std::vector<std::string>& arguments) {
+    Options parse(std::vector<std::string> arguments) {
         Options options;
+        options.command = takeCommand(arguments);
         try {
             std::vector<std::string> reversed;
             std::transform(arguments.rbegin(), arguments.rend(), std::back_inserter(reversed),
@@ -147,6 +150,9 @@ public:
         for (const auto& text : assignments.texts) {
             options.assignments.push_back(parseAssignment(unguarded(text)));
         }
+        if (!options.lines.empty() && !options.command.empty()) {
+            throw UsageError("-c LINE and -- COMMAND can't both be carried out (see --help)");
+        }
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
         collectSources(options);
@@ -162,6 +168,16 @@ private:
     void add(Repeatable& added, const char* name, const char* value, const char* help) {
         added.option = app.add_option(name, added.texts, help);
         added.option->allow_extra_args(added.option->get_positional())->type_name(value);
+    }
+
+    // Takes what stands behind "--" away, which no option's value can be.
+    static std::vector<std::string> takeCommand(std::vector<std::string>& arguments) {
+        const auto mark = std::find(arguments.begin(), arguments.end(), commandMark);
+        if (mark == arguments.end()) return {};
+        std::vector<std::string> command(mark + 1, arguments.end());
+        if (command.empty()) throw UsageError("-- needs a COMMAND (see --help)");
+        arguments.erase(mark, arguments.end());
+        return command;
     }
 
     // Of several the last one counts.

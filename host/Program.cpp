@@ -15,6 +15,7 @@
 #include "framework/common/DiagnosticLogger.hpp"
 #include "host/LogSink.hpp"
 #include "host/LoginName.hpp"
+#include "host/MisplacedCommands.hpp"
 #include "host/Options.hpp"
 #include "host/SessionStore.hpp"
 #include "host/console/Announcements.hpp"
@@ -47,8 +48,9 @@ bool isTerminal(int descriptor) {
 }
 
 /// Whether somebody types the commands.
-bool isInteractive(const std::vector<std::string>& lines) {
-    return lines.empty() && isTerminal(STDIN_FILENO) && isTerminal(STDOUT_FILENO);
+bool isInteractive(const Options& options) {
+    return options.lines.empty() && options.command.empty() && isTerminal(STDIN_FILENO) &&
+           isTerminal(STDOUT_FILENO);
 }
 
 /// The store with everything that can be done to it on the console.
@@ -115,10 +117,17 @@ public:
         if (!settings::describe(store).empty()) settingsCommand.emplace(store, registry);
     }
 
-    /// Carries out the given lines or, when there are none, those that are typed or read.
-    bool run(const std::vector<std::string>& lines) {
-        const auto source = makeLineSource(lines);
-        return console.run(*source);
+    /// Throws `UsageError` where a file was asked for that is none but has the name of a command.
+    void refuseCommandsAmong(const std::vector<SourceRequest>& requests) const {
+        refuseMisplacedCommands(requests, registry->names());
+    }
+
+    /// Carries out the given command or lines or, when there are none, those that are typed or
+    /// read. Gives whether all could be carried out; what somebody typed is no matter.
+    bool run(const Options& options) {
+        if (!options.command.empty()) return console.run(options.command);
+        const auto source = makeLineSource(options);
+        return console.run(*source) || isInteractive(options);
     }
 
 private:
@@ -131,9 +140,9 @@ private:
         };
     }
 
-    std::unique_ptr<LineSource> makeLineSource(const std::vector<std::string>& lines) {
-        if (!lines.empty()) return std::make_unique<GivenLines>(lines);
-        if (!isInteractive(lines)) return std::make_unique<LineReader>(std::cin);
+    std::unique_ptr<LineSource> makeLineSource(const Options& options) {
+        if (!options.lines.empty()) return std::make_unique<GivenLines>(options.lines);
+        if (!isInteractive(options)) return std::make_unique<LineReader>(std::cin);
         const Completer completer(registry, [store = store] {
             const auto keys = store->keys().get();
             return std::vector<std::string>(keys.begin(), keys.end());
@@ -171,15 +180,16 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
     Session session(output, options.limits);
+    session.refuseCommandsAmong(options.sources);
     // Without it a write would be lost that is meant to last.
     if (options.statePath && !session.keepStateIn(*options.statePath)) {
         return ExitCode::sourceNotLoaded;
     }
     session.assign(options.assignments);
-    const bool watches = options.watchesFiles.value_or(isInteractive(options.lines));
+    const bool watches = options.watchesFiles.value_or(isInteractive(options));
     const bool allLoaded = session.load(options.sources, watches);
     session.declareSettings(declare);
-    const bool allCarriedOut = session.run(options.lines);
+    const bool allCarriedOut = session.run(options);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
 }

@@ -53,6 +53,20 @@ bool Console::run(LineSource& lines) {
     return allFine;
 }
 
+bool Console::run(const std::vector<std::string>& words) {
+    bool isFine = true;
+    try {
+        const auto command = registry->find(words.at(0));
+        carryOut(*command, command->givenArguments({words.begin() + 1, words.end()}));
+    } catch (const std::exception& error) {
+        isFine = false;
+        remarks.clear();
+        output.message(error.what());
+    }
+    showRemarks("");
+    return isFine;
+}
+
 bool Console::runNext(LineSource& lines) {
     const auto line = lines.nextLine();
     Interruption::take();  // what came before the command is not about it

@@ -31,6 +31,10 @@ public:
     /// Gives whether every line could be carried out.
     bool run(LineSource& lines);
 
+    /// Carries out one command, the words of which are its name and its arguments. Gives whether it
+    /// could be carried out.
+    bool run(const std::vector<std::string>& words);
+
     /// Has one message shown beside the answer of the command that is being carried out, unless it
     /// fails. For a handler to call, on its thread.
     void remark(std::string text) { remarks.push_back(std::move(text)); }

@@ -67,8 +67,10 @@ TEST(Options, FilesAndSourcesKeepTheirCommonOrder) {
               (Words{"a", "b", "c", "d"}));
 }
 
-TEST(Options, AfterTwoDashesEverythingIsAFile) {
-    EXPECT_EQ(pathsOf(parseOptions({"a", "--", "--log", "-c"})), (Words{"a", "--log", "-c"}));
+TEST(Options, AfterTwoDashesEverythingIsACommand) {
+    const Options options = parseOptions({"a", "--", "get", "--log", "[b]", "--", ""});
+    EXPECT_EQ(pathsOf(options), Words{"a"});
+    EXPECT_EQ(options.command, (Words{"get", "--log", "[b]", "--", ""}));
 }
 
 TEST(Options, BracketsAreTakenAsTheyAre) {
@@ -184,6 +186,13 @@ INSTANTIATE_TEST_SUITE_P(
                   {"--foo"},
                   "The following argument was not expected: --foo (see --help)"},
         UsageCase{"LineMissing", {"-c"}, "-c: 1 required LINE missing (see --help)"},
+        UsageCase{"NoCommand", {"a", "--"}, "-- needs a COMMAND (see --help)"},
+        UsageCase{"LineAndCommand",
+                  {"-c", "list", "--", "list"},
+                  "-c LINE and -- COMMAND can't both be carried out (see --help)"},
+        UsageCase{"TwoDashesAreNoValue",
+                  {"-c", "--", "list"},
+                  "-c: 1 required LINE missing (see --help)"},
         UsageCase{"NoPath", {"--source", "n"}, "--source n: NAME=PATH is needed"},
         UsageCase{"EmptyPath", {"--source", "n="}, "--source n=: NAME=PATH is needed"},
         UsageCase{"EmptyName", {"--source", "=p"}, "--source =p: NAME=PATH is needed"},

@@ -141,7 +141,17 @@ TEST_F(LineEditorTest, TheTerminalMayGetAnotherSizeWhileALineIsEdited) {
 TEST_F(LineEditorTest, MessagesNameNoLineNumber) {
     enter("nope");
     EXPECT_TRUE(terminal.shows("velkor-config: Unknown command: nope\r\nvelkor> "));
+}
+
+TEST_F(LineEditorTest, ACommandThatFailedIsNoFailureOfTheSession) {
+    enter("nope");
+    EXPECT_TRUE(terminal.shows("Unknown command"));
     enter("quit");
+    EXPECT_EQ(terminal.exitCode(), 0);
+}
+
+TEST(LineEditor, GivenLinesThatFailAreAFailureAlsoOnATerminal) {
+    TerminalSession terminal({"-c", "nope"});
     EXPECT_EQ(terminal.exitCode(), 1);
 }
 
