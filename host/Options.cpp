@@ -123,6 +123,9 @@ public:
         add(fileSizes, "--max-file-size", "SIZE",
             "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
+        app.add_flag_callback(
+            "--no-history", [this] { keepsHistory = false; },
+            "Keep what is typed at the prompt for this session only.");
         add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
         app.footer(footer);
     }
@@ -155,6 +158,7 @@ public:
         }
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
+        options.keepsHistory = keepsHistory;
         collectSources(options);
         return options;
     }
@@ -211,6 +215,7 @@ private:
     Repeatable assignments;
     Repeatable states;
     std::optional<bool> watchesFiles;
+    bool keepsHistory = true;
     Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;

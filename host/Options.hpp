@@ -31,6 +31,7 @@ struct Options {
     std::optional<std::string> statePath{};
     std::optional<bool> watchesFiles{};  ///< Nothing: as fits the session.
     std::vector<std::string> lines{};    ///< Command lines; empty: they are read.
+    bool keepsHistory = true;            ///< What is typed outlasts the session.
     std::vector<std::string> command{};  ///< A command with its arguments, carried out by itself.
     std::vector<LogRequest> logs{};
     std::string information{};  ///< What --help or --version wants shown, instead of all else.

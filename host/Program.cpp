@@ -26,9 +26,11 @@
 #include "host/console/GivenLines.hpp"
 #include "host/console/HostCommands.hpp"
 #include "host/console/LineEditor.hpp"
+#include "host/console/LineHistory.hpp"
 #include "host/console/LineReader.hpp"
 #include "host/console/MaskingRegistry.hpp"
 #include "host/console/Output.hpp"
+#include "host/console/SecretLines.hpp"
 #include "host/console/SettingsCommand.hpp"
 #include "host/console/StoreCommandRegistry.hpp"
 #include "host/console/ValueText.hpp"
@@ -42,6 +44,9 @@
 namespace velkor::host {
 
 namespace {
+
+constexpr const char* greeting =
+    "velkor-config " VELKOR_VERSION ": 'help' lists the commands, 'quit' ends the session.";
 
 bool isTerminal(int descriptor) {
     return isatty(descriptor) == 1;
@@ -147,9 +152,27 @@ private:
             const auto keys = store->keys().get();
             return std::vector<std::string>(keys.begin(), keys.end());
         });
+        LineEditor::Memory memory;
+        if (options.keepsHistory) memory = history();
+        output.answer(greeting);
         return std::make_unique<LineEditor>(
             [completer](const std::string& line) { return completer.complete(line); },
-            *announcements);
+            *announcements, std::move(memory));
+    }
+
+    // What is typed, without what may hold a secret; nothing where it can't be kept.
+    LineEditor::Memory history() {
+        const auto file = usualHistoryFile();
+        if (!file) return {};
+        try {
+            const auto kept = std::make_shared<const LineHistory>(*file);
+            return {kept->earlierLines(), [kept, store = store](const std::string& line) {
+                        if (!mayHoldSecret(line, settings::secretKeys(store))) kept->add(line);
+                    }};
+        } catch (const std::runtime_error& error) {
+            output.message(error.what());
+            return {};
+        }
     }
 
     Output& output;

@@ -157,7 +157,9 @@ constexpr HostCommand commands[] = {
      suggestRequests},
     {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
      suggestCommands},
+    {"?", "[COMMAND]", "The same as help.", help, 0, 1, false, suggestCommands},
     {"quit", "", "End the session.", quit, 0, 0},
+    {"exit", "", "The same as quit.", quit, 0, 0},
 };
 
 CommandRegistry::CommandPtr makeCommand(const HostCommand& command,

@@ -37,7 +37,7 @@ struct HostServices {
 /// - unset, history [KEY] [--limit N], undo [N]: see StateCommands.hpp.
 /// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest
 ///   of the line as it was typed.
-/// - help [COMMAND], quit.
+/// - help [COMMAND], quit; also as ? and exit.
 ///
 /// Values of secret keys, see `settings::secretKeys`, are shown as •••.
 ///

@@ -133,6 +133,11 @@ TEST(Options, TheLastWordOnWatchedFilesCounts) {
     EXPECT_EQ(parseOptions({"--watch-files", "--no-watch-files"}).watchesFiles, false);
 }
 
+TEST(Options, HistoryIsKeptUnlessTheCommandLineSaysOtherwise) {
+    EXPECT_TRUE(parseOptions({}).keepsHistory);
+    EXPECT_FALSE(parseOptions({"--no-history"}).keepsHistory);
+}
+
 TEST(Options, LogNamesAChannelAndItsSeverities) {
     const auto logs =
         parseOptions({"--log", "velkor::configuration=debug,trace", "--log=b=24"}).logs;
@@ -148,7 +153,8 @@ TEST(Options, HelpDescribesEveryOption) {
     for (const char* part :
          {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "--max-file-size SIZE",
           "--env PREFIX", "--set KEY=VALUE", "--state FILE", "--watch-files", "--no-watch-files",
-          "-c LINE", "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
+          "-c LINE", "--no-history", "--log CHANNEL=SEVERITIES", "--help", "--version",
+          "Exit status"}) {
         EXPECT_NE(help.find(part), std::string::npos) << part;
     }
 }

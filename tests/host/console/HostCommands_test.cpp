@@ -19,8 +19,8 @@ namespace {
 using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
-const Words hostNames{"sources", "load",    "unload", "explain", "watch", "unwatch", "put",
-                      "unset",   "history", "undo",   "send",    "help",  "quit"};
+const Words hostNames{"sources", "load", "unload", "explain", "watch", "unwatch", "put", "unset",
+                      "history", "undo", "send",   "help",    "?",     "quit",    "exit"};
 
 class HostCommandsTest : public ::testing::Test {
 protected:
@@ -79,8 +79,7 @@ TEST_P(HostCommandNameTest, StaysWithACommandThatGotItLater) {
     EXPECT_EQ(other->names(), Words{GetParam()});
 }
 
-INSTANTIATE_TEST_SUITE_P(Names, HostCommandNameTest, ::testing::ValuesIn(hostNames),
-                         [](const auto& tested) { return tested.param; });
+INSTANTIATE_TEST_SUITE_P(Names, HostCommandNameTest, ::testing::ValuesIn(hostNames));
 
 TEST_F(HostCommandsTest, KeepNothingAliveThroughTheRegistry) {
     const std::weak_ptr<CommandRegistry> weak = [this] {
@@ -213,6 +212,12 @@ TEST_F(HostCommandsTest, HelpSuggestsCommandNames) {
 
 TEST_F(HostCommandsTest, QuitEndsTheSession) {
     EXPECT_EQ(run("quit"), "");
+    EXPECT_TRUE(quitting);
+}
+
+TEST_F(HostCommandsTest, ExitAndTheQuestionMarkAreOtherNamesOfCommands) {
+    EXPECT_EQ(run("?"), run("help"));
+    EXPECT_EQ(run("exit"), "");
     EXPECT_TRUE(quitting);
 }
 
