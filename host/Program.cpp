@@ -19,6 +19,8 @@
 #include "host/Options.hpp"
 #include "host/SessionStore.hpp"
 #include "host/console/Announcements.hpp"
+#include "host/console/ArgumentWords.hpp"
+#include "host/console/Colours.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "host/console/Completer.hpp"
 #include "host/console/Console.hpp"
@@ -52,6 +54,11 @@ bool isTerminal(int descriptor) {
     return isatty(descriptor) == 1;
 }
 
+Output::Answers formOfAnswers() {
+    if (!isTerminal(STDOUT_FILENO)) return Output::Answers::exact;
+    return terminalHasColours() ? Output::Answers::coloured : Output::Answers::escaped;
+}
+
 /// Whether somebody types the commands.
 bool isInteractive(const Options& options) {
     return options.lines.empty() && options.command.empty() && isTerminal(STDIN_FILENO) &&
@@ -66,6 +73,7 @@ public:
           announcements(std::make_shared<Announcements>(output)),
           store(std::make_shared<SessionStore>(sourceLimits)),
           sources(std::make_shared<SessionSources>(store, sourceLimits)),
+          watches(std::make_shared<Watches>(store, showValue())),
           registry(std::make_shared<CommandRegistry>()),
           console(registry, output, [this] { store->acknowledge(); }),
           service(store),
@@ -76,8 +84,8 @@ public:
                              store, registry,
                              [this](std::string text) { console.remark(std::move(text)); }))),
           hostCommands(
-              {store, std::make_shared<Watches>(store, showValue()),
-               service.dispatcherFor(messages::allRequestTypes()), [this] { console.quit(); },
+              {store, watches, service.dispatcherFor(messages::allRequestTypes()),
+               [this] { console.quit(); },
                [sources = sources](const auto& name) { return sources->problemOf(name); }, sources},
               registry) {}
 
@@ -108,9 +116,9 @@ public:
     }
 
     /// Gives whether all sources could be loaded; reports those that could not. Files are read
-    /// again when they change if `watches`.
-    bool load(const std::vector<SourceRequest>& requests, bool watches) {
-        sources->watchFiles(watches);
+    /// again when they change if `watchesFiles`.
+    bool load(const std::vector<SourceRequest>& requests, bool watchesFiles) {
+        sources->watchFiles(watchesFiles);
         const auto failures = sources->begin(requests);
         for (const auto& failure : failures) output.message(failure);
         return failures.empty();
@@ -148,10 +156,9 @@ private:
     std::unique_ptr<LineSource> makeLineSource(const Options& options) {
         if (!options.lines.empty()) return std::make_unique<GivenLines>(options.lines);
         if (!isInteractive(options)) return std::make_unique<LineReader>(std::cin);
-        const Completer completer(registry, [store = store] {
-            const auto keys = store->keys().get();
-            return std::vector<std::string>(keys.begin(), keys.end());
-        });
+        const Completer completer(
+            registry, [words = ArgumentWords(store, watches, sources)](
+                          const auto& name, const auto& typed) { return words.of(name, typed); });
         LineEditor::Memory memory;
         if (options.keepsHistory) memory = history();
         output.answer(greeting);
@@ -179,6 +186,7 @@ private:
     const std::shared_ptr<Announcements> announcements;
     std::shared_ptr<SessionStore> store;
     std::shared_ptr<SessionSources> sources;
+    std::shared_ptr<Watches> watches;
     std::shared_ptr<CommandRegistry> registry;
     Console console;
     messages::MessageService service;
@@ -222,9 +230,7 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
 ExitCode runProgram(const std::vector<std::string>& arguments, const DeclareSettings& declare) {
     DescriptorBuffer standardOutput(STDOUT_FILENO);
     std::ostream answers(&standardOutput);
-    Output output(answers,
-                  isTerminal(STDOUT_FILENO) ? Output::Answers::escaped : Output::Answers::exact,
-                  std::cerr);
+    Output output(answers, formOfAnswers(), std::cerr);
     ExitCode exitCode = ExitCode::fine;
     try {
         const Options options = parseOptions(arguments);

@@ -27,6 +27,11 @@ std::string Command::argumentText() const {
     return traits.arguments.empty() ? limits() : traits.arguments;
 }
 
+CommandUsage Command::usage() const {
+    const bool isUnknown = traits.arguments.empty() && descriptor.maximumArguments > 0;
+    return CommandUsage(isUnknown ? "KEY" : std::string_view(traits.arguments));
+}
+
 std::vector<std::string> Command::readArguments(CommandLine& line) const {
     std::vector<std::string> arguments;
     while (!traits.takesRawRest || arguments.size() + 1 < descriptor.maximumArguments) {

@@ -8,6 +8,7 @@
 
 #include "framework/administration/Administration.hpp"
 #include "host/console/CommandLine.hpp"
+#include "host/console/CommandUsage.hpp"
 
 namespace velkor::host {
 
@@ -23,7 +24,8 @@ struct CommandTraits {
     std::string arguments{};
     /// The last argument is the rest of the line as it was typed, quotes and blanks included.
     bool takesRawRest = false;
-    /// What the first argument may be, for completion; empty: a key of the store.
+    /// What the first argument may be, for completion; empty: what its name says, and a key of the
+    /// store where it has none.
     std::function<std::vector<std::string>()> suggestions{};
     /// The arguments are words as they were typed, for `OptionWords`: what is quoted is told from
     /// what is not.
@@ -50,8 +52,8 @@ public:
         return traits.suggestions;
     }
 
-    /// Whether there may be arguments at all.
-    bool takesArguments() const noexcept { return descriptor.maximumArguments > 0; }
+    /// What there may be behind the name; a KEY where nobody says more of arguments.
+    CommandUsage usage() const;
 
     /// The arguments of this command on `line`, whose first word has been read already. Throws
     /// `CommandLineError`.

@@ -94,7 +94,7 @@ void Console::carryOut(const Command& command, std::vector<std::string>&& argume
     } catch (...) {
         throw CommandError(failureText(command));
     }
-    output.answer(answer);
+    output.answer(answer, paintOf(command.name()));
 }
 
 void Console::showRemarks(const std::string& position) {

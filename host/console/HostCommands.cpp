@@ -116,10 +116,6 @@ std::vector<std::string> suggestNothing(const Context&) {
     return {};
 }
 
-std::vector<std::string> suggestSources(const Context& context) {
-    return context.services.sources->names();
-}
-
 std::vector<std::string> suggestRequests(const Context&) {
     return requestTypes();
 }
@@ -140,11 +136,10 @@ constexpr HostCommand commands[] = {
     {"sources", "", "List the sources in order of precedence.", showSources, 0, 0},
     {"load", loadUsage, "Add a property file as a source.", onSources<loadFile>, 0, 255, false,
      nullptr, true},
-    {"unload", unloadUsage, "Remove a source.", onSources<unloadSource>, 1, 1, false,
-     suggestSources},
+    {"unload", unloadUsage, "Remove a source.", onSources<unloadSource>, 1, 1},
     {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
     {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
-    {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
+    {"unwatch", "WATCHED-KEY", "Stop showing the values of a key.", unwatch, 1, 1},
     {"put", putUsage, "Set a value as it was typed, or of a type, also for a time.",
      onStore<putValue>, 0, 255, false, nullptr, true},
     {"unset", unsetUsage, "Take back what was set for a key, and show what is effective then.",

@@ -194,7 +194,8 @@ private:
         const Completion completion = complete(std::string(line->buffer, line->cursor));
         if (completion.words.empty()) return CC_REFRESH_BEEP;
         std::string addition = completion.commonAddition();
-        if (completion.words.size() == 1) addition += ' ';
+        const bool isWhole = completion.words.size() == 1 && completion.words[0].back() != '/';
+        if (isWhole) addition += ' ';
         if (addition.empty()) return show(completion.words);
         return el_insertstr(editor.get(), addition.c_str()) == 0 ? CC_REFRESH : CC_ERROR;
     }

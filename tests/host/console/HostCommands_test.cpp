@@ -111,7 +111,6 @@ TEST_F(HostCommandsTest, LoadAndUnloadAddAndRemoveASource) {
     const velkor::testing::TemporaryFile file("a=1\n");
     EXPECT_EQ(run("load", {file.path().string()}), "Loaded as file.");
     EXPECT_TRUE(store->has("a").get());
-    EXPECT_EQ(registry->find("unload")->suggestions()(), (Words{"override", "file", "default"}));
     EXPECT_EQ(run("unload", {"file"}), "");
     EXPECT_FALSE(store->has("a").get());
 }

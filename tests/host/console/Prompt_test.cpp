@@ -76,6 +76,18 @@ TEST_F(PromptTest, ALineThatCantBeKeptIsNoFailure) {
     EXPECT_EQ(terminal.exitCode(), 0);
 }
 
+TEST_F(PromptTest, AnswersAreColouredWhereTheTerminalHasColours) {
+    TerminalSession terminal({"-c", "set a 1", "-c", "explain a"}, "xterm");
+    EXPECT_TRUE(terminal.shows("effective  \x1b[34moverride\x1b[0m  \x1b[36m1\x1b[0m\r\n"));
+}
+
+TEST_F(PromptTest, AnswersAreNotColouredWhereThatIsNotWantedOrNotPossible) {
+    TerminalSession unwanted({"-c", "set a 1", "-c", "explain a"}, "xterm", {"NO_COLOR=1"});
+    EXPECT_TRUE(unwanted.shows("effective  override  1\r\n"));
+    TerminalSession incapable({"-c", "set a 1", "-c", "explain a"}, "vt100");
+    EXPECT_TRUE(incapable.shows("effective  override  1\r\n"));
+}
+
 TEST_F(PromptTest, WhereNobodyTypesNothingIsKept) {
     ::setenv("XDG_STATE_HOME", folder.parent().c_str(), 1);
     const auto result = runProgram({}, "set a 1\n");
