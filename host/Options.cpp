@@ -127,7 +127,19 @@ public:
             "--no-history", [this] { keepsHistory = false; },
             "Keep what is typed at the prompt for this session only.");
         add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
+        app.add_option("--manual", manualForm)->group("");  // for whoever builds the program
         app.footer(footer);
+    }
+
+    ProgramUsage usage() const {
+        ProgramUsage usage{description, footer};
+        for (const CLI::Option* option : app.get_options()) {
+            if (option->get_group().empty()) continue;
+            usage.options.push_back({namesOf(*option),
+                                     option->get_positional() ? "" : option->get_type_name(),
+                                     option->get_description()});
+        }
+        return usage;
     }
 
     Options parse(std::vector<std::string> arguments) {
@@ -158,6 +170,7 @@ public:
         }
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
+        options.manualForm = manualForm;
         options.keepsHistory = keepsHistory;
         collectSources(options);
         return options;
@@ -172,6 +185,14 @@ private:
     void add(Repeatable& added, const char* name, const char* value, const char* help) {
         added.option = app.add_option(name, added.texts, help);
         added.option->allow_extra_args(added.option->get_positional())->type_name(value);
+    }
+
+    static std::vector<std::string> namesOf(const CLI::Option& option) {
+        if (option.get_positional()) return {option.get_name(true)};
+        std::vector<std::string> names;
+        for (const auto& name : option.get_snames()) names.push_back('-' + name);
+        for (const auto& name : option.get_lnames()) names.push_back("--" + name);
+        return names;
     }
 
     // Takes what stands behind "--" away, which no option's value can be.
@@ -215,6 +236,7 @@ private:
     Repeatable assignments;
     Repeatable states;
     std::optional<bool> watchesFiles;
+    std::string manualForm;
     bool keepsHistory = true;
     Repeatable fileSizes;
     Repeatable lines;
@@ -225,6 +247,10 @@ private:
 
 Options parseOptions(const std::vector<std::string>& arguments) {
     return Parser().parse(arguments);
+}
+
+ProgramUsage programUsage() {
+    return Parser().usage();
 }
 
 SourceRequest parseSource(const std::string& text) {

@@ -15,6 +15,7 @@
 #include "framework/common/DiagnosticLogger.hpp"
 #include "host/LogSink.hpp"
 #include "host/LoginName.hpp"
+#include "host/Manual.hpp"
 #include "host/MisplacedCommands.hpp"
 #include "host/Options.hpp"
 #include "host/SessionStore.hpp"
@@ -130,6 +131,11 @@ public:
         if (!settings::describe(store).empty()) settingsCommand.emplace(store, registry);
     }
 
+    /// The session's options and commands in a form of `manual`.
+    std::string describe(const std::string& form) const {
+        return manual(form, programUsage(), registry->commands());
+    }
+
     /// Throws `UsageError` where a file was asked for that is none but has the name of a command.
     void refuseCommandsAmong(const std::vector<SourceRequest>& requests) const {
         refuseMisplacedCommands(requests, registry->names());
@@ -235,7 +241,11 @@ ExitCode runProgram(const std::vector<std::string>& arguments, const DeclareSett
     try {
         const Options options = parseOptions(arguments);
         output.answer(options.information);
-        if (options.information.empty()) exitCode = runSession(options, declare, output);
+        if (!options.manualForm.empty()) {
+            output.answer(Session(output, options.limits).describe(options.manualForm));
+        } else if (options.information.empty()) {
+            exitCode = runSession(options, declare, output);
+        }
     } catch (const UsageError& error) {
         output.message(error.what());
         return ExitCode::badUsage;

@@ -28,7 +28,8 @@ std::string Command::argumentText() const {
 }
 
 CommandUsage Command::usage() const {
-    const bool isUnknown = traits.arguments.empty() && descriptor.maximumArguments > 0;
+    const unsigned most = descriptor.maximumArguments;
+    const bool isUnknown = traits.arguments.empty() && most > 0 && most != unlimited;
     return CommandUsage(isUnknown ? "KEY" : std::string_view(traits.arguments));
 }
 

@@ -52,7 +52,8 @@ public:
         return traits.suggestions;
     }
 
-    /// What there may be behind the name; a KEY where nobody says more of arguments.
+    /// What there may be behind the name: a KEY where nobody says more of arguments but how many
+    /// there may be, and nothing where there may be any number.
     CommandUsage usage() const;
 
     /// The arguments of this command on `line`, whose first word has been read already. Throws

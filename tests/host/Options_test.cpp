@@ -159,6 +159,15 @@ TEST(Options, HelpDescribesEveryOption) {
     }
 }
 
+TEST(Options, OfTheProgramAreThoseThatHelpDescribes) {
+    const std::string help = parseOptions({"--help"}).information;
+    for (const auto& option : programUsage().options) {
+        EXPECT_NE(help.find(option.help), std::string::npos) << option.help;
+        for (const auto& name : option.names) EXPECT_NE(help.find(name), std::string::npos) << name;
+    }
+    EXPECT_EQ(programUsage().options.front().names, (Words{"-h", "--help"}));
+}
+
 TEST(Options, VersionNamesTheProgram) {
     EXPECT_EQ(parseOptions({"--version"}).information.rfind("velkor-config ", 0), 0U);
 }

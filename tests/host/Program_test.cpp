@@ -267,6 +267,12 @@ TEST(Program, ShowsItsHelpOnStandardOutput) {
     EXPECT_EQ(result.exitCode, 0);
 }
 
+TEST(Program, RefusesAManualInAFormThatThereIsNot) {
+    const auto result = runProgram({"--manual", "html"});
+    EXPECT_EQ(result.err, "velkor-config: --manual: one of man, bash, usage is needed\n");
+    EXPECT_EQ(result.exitCode, 2);
+}
+
 TEST(Program, WritesALogChannelToStandardError) {
     const auto result =
         runProgram({"--log", "velkor::configuration=debug", "-c", "set a 1", "-c", "get a"});
