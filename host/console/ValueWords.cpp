@@ -2,8 +2,11 @@
 
 #include <charconv>
 #include <cstddef>
+#include <iterator>
 #include <optional>
+#include <string_view>
 #include <system_error>
+#include <type_traits>
 #include <utility>
 
 #include "host/console/Command.hpp"
