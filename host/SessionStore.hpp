@@ -17,6 +17,9 @@ namespace velkor::host {
 /// `acknowledge`.
 class SessionStore final : public configuration::ConfigurationImpl {
 public:
+    /// The name of the source of the layer that lasts.
+    static constexpr const char* stateSource = "state";
+
     explicit SessionStore(const SourceLimits& sourceLimits) : limits(sourceLimits) {}
 
     /// Lets `layer`, which is not null, take the writes from now on, as the source "state" in the

@@ -36,16 +36,29 @@ std::string Command::argumentText() const {
     return traits.arguments.empty() ? limits() : traits.arguments;
 }
 
+CommandUsage Command::usage() const {
+    const unsigned most = descriptor.maximumArguments;
+    const bool isUnknown = traits.arguments.empty() && most > 0 && most != unlimited;
+    return CommandUsage(isUnknown ? "KEY" : std::string_view(traits.arguments));
+}
+
 std::vector<std::string> Command::readArguments(CommandLine& line) const {
     std::vector<std::string> arguments;
     while (!traits.takesRawRest || arguments.size() + 1 < descriptor.maximumArguments) {
         auto word = line.nextWord();
         if (!word) return arguments;
-        arguments.push_back(*std::move(word));
+        arguments.push_back(traits.takesWordsAsTyped ? std::string(line.typedWord())
+                                                     : *std::move(word));
     }
     const std::string_view rest = line.takeRest();
     if (!rest.empty()) arguments.emplace_back(rest);
     return arguments;
+}
+
+std::vector<std::string> Command::givenArguments(std::vector<std::string> words) const {
+    if (!traits.takesWordsAsTyped) return words;
+    for (auto& word : words) word = quotedWord(word);
+    return words;
 }
 
 std::string Command::run(std::vector<std::string>&& arguments, CommandOutput& output) const {

@@ -8,6 +8,7 @@
 
 #include "framework/administration/Administration.hpp"
 #include "host/console/CommandLine.hpp"
+#include "host/console/CommandUsage.hpp"
 
 namespace velkor::host {
 
@@ -40,10 +41,14 @@ struct CommandTraits {
     std::string arguments{};
     /// The last argument is the rest of the line as it was typed, quotes and blanks included.
     bool takesRawRest = false;
-    /// What the first argument may be, for completion; empty: a key of the store.
+    /// What the first argument may be, for completion; empty: what its name says, and a key of the
+    /// store where it has none.
     std::function<std::vector<std::string>()> suggestions{};
     /// Takes the place of the handler, for an answer that may be long; empty: the handler answers.
     StreamingHandler stream{};
+    /// The arguments are words as they were typed, for `OptionWords`: what is quoted is told from
+    /// what is not.
+    bool takesWordsAsTyped = false;
 };
 
 /// One command of the console. Immutable; its handler may run on several threads at once.
@@ -66,12 +71,17 @@ public:
         return traits.suggestions;
     }
 
-    /// Whether there may be arguments at all.
-    bool takesArguments() const noexcept { return descriptor.maximumArguments > 0; }
+    /// What there may be behind the name: a KEY where nobody says more of arguments but how many
+    /// there may be, and nothing where there may be any number.
+    CommandUsage usage() const;
 
     /// The arguments of this command on `line`, whose first word has been read already. Throws
     /// `CommandLineError`.
     std::vector<std::string> readArguments(CommandLine& line) const;
+
+    /// The arguments of this command where the words after its name are known one by one, and
+    /// quoted by nobody.
+    std::vector<std::string> givenArguments(std::vector<std::string> words) const;
 
     /// Carries out the command: gives the handler's answer, or nothing when it writes to `output`
     /// as it goes. Throws `CommandError` with the name, " takes ", the limits, "; given: " and the

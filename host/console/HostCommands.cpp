@@ -4,12 +4,14 @@
 #include <iterator>
 #include <utility>
 
+#include "host/console/OptionWords.hpp"
+#include "host/console/PutCommand.hpp"
 #include "host/console/SendCommand.hpp"
+#include "host/console/SourceCommands.hpp"
 #include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/look/JsonAnswers.hpp"
-#include "host/look/WordOptions.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -27,28 +29,13 @@ struct Context {
 constexpr const char* jsonOption = "--json";
 constexpr const char* rawOption = "--raw";
 
-/// The words of a command that knows no option but --json, and whether that is given.
-struct JsonChoice {
-    explicit JsonChoice(const Arguments& arguments) {
-        auto options = parseOptionsAmong(arguments, {{jsonOption}});
-        json = options.has(jsonOption);
-        words = std::move(options.words);
-    }
-
-    /// Throws `CommandError` unless KEY is given and nothing else.
-    const std::string& key() const {
-        if (words.size() != 1) throw CommandError("One KEY is needed.");
-        return words.front();
-    }
-
-    bool json;
-    Arguments words;
-};
+constexpr const char* sourcesUsage = "[--json]";
+constexpr const char* explainUsage = "KEY [--json]";
+constexpr const char* watchUsage = "KEY [--json]";
 
 std::string showSources(const Context& context, const Arguments& arguments) {
-    const JsonChoice choice(arguments);
-    if (!choice.words.empty()) throw CommandError("sources takes no argument but --json.");
-    if (choice.json) {
+    const OptionWords given("sources", sourcesUsage, 0, arguments);
+    if (given.has(jsonOption)) {
         return sourcesJson(context.services.store->describeSources().get(),
                            context.services.problemOf);
     }
@@ -63,11 +50,12 @@ std::string showSources(const Context& context, const Arguments& arguments) {
 }
 
 std::string explain(const Context& context, const Arguments& arguments) {
-    const JsonChoice choice(arguments);
-    const auto options = context.services.store->explain(choice.key()).get();
-    const bool isSecret = settings::secretKeys(context.services.store).count(choice.key()) != 0;
-    if (choice.json) return layersJson(choice.key(), options, isSecret);
-    if (options.empty()) return "No configuration option with key: " + choice.key();
+    const OptionWords given("explain", explainUsage, 1, arguments);
+    const std::string& key = given.words().front().text;
+    const auto options = context.services.store->explain(key).get();
+    const bool isSecret = settings::secretKeys(context.services.store).count(key) != 0;
+    if (given.has(jsonOption)) return layersJson(key, options, isSecret);
+    if (options.empty()) return "No configuration option with key: " + key;
     std::vector<std::vector<std::string>> rows;
     rows.reserve(options.size());
     for (const auto& option : options) {
@@ -78,12 +66,13 @@ std::string explain(const Context& context, const Arguments& arguments) {
 }
 
 std::string watch(const Context& context, const Arguments& arguments) {
-    const JsonChoice choice(arguments);
+    const OptionWords given("watch", watchUsage, 1, arguments);
+    const std::string& key = given.words().front().text;
     auto& watches = *context.services.watches;
-    const bool isNew = choice.json ? watches.add(choice.key(), context.services.showJson)
-                                   : watches.add(choice.key());
+    const bool isNew =
+        given.has(jsonOption) ? watches.add(key, context.services.showJson) : watches.add(key);
     if (isNew) return "";
-    throw CommandError("Watched already: " + choice.key());
+    throw CommandError("Watched already: " + key);
 }
 
 std::string unwatch(const Context& context, const Arguments& arguments) {
@@ -97,6 +86,12 @@ std::string onStore(const Context& context, const Arguments& arguments) {
     return run(context.services.store, arguments);
 }
 
+/// A command on nothing but the session's sources.
+template <std::string (*run)(SessionSources&, const Arguments&)>
+std::string onSources(const Context& context, const Arguments& arguments) {
+    return run(*context.services.sources, arguments);
+}
+
 std::string helpFor(const Command& command) {
     std::string text = command.name() + ' ' + '(' + command.argumentText() + ")\n";
     if (command.shortName() != command.name()) {
@@ -105,13 +100,21 @@ std::string helpFor(const Command& command) {
     return text + command.description() + '\n';
 }
 
+// Options would make every row of the table as long as theirs: `help COMMAND` shows them.
+std::string withoutOptions(std::string argumentText) {
+    const std::size_t options = argumentText.find(" [--");
+    return options == std::string::npos ? argumentText
+                                        : argumentText.substr(0, options) + " [OPTIONS]";
+}
+
 std::string help(const Context& context, const Arguments& arguments) {
     const auto registry = context.registry.lock();
     if (!registry) return "";
     if (!arguments.empty()) return helpFor(*registry->find(arguments.at(0)));
     std::vector<std::vector<std::string>> rows;
     for (const auto& command : registry->commands()) {
-        rows.push_back({command->name(), command->argumentText(), command->description()});
+        rows.push_back(
+            {command->name(), withoutOptions(command->argumentText()), command->description()});
     }
     return formatTable(rows) + "A command may be called by the last word of its name.\n";
 }
@@ -160,18 +163,24 @@ struct HostCommand {
     std::uint8_t maximumArguments;
     bool takesRawRest = false;
     std::vector<std::string> (*suggest)(const Context&) = nullptr;
+    bool takesWordsAsTyped = false;
 };
 
 constexpr HostCommand commands[] = {
-    {"sources", "[--json]", "List the sources in order of precedence.", showSources, 0, 1, false,
-     suggestNothing},
-    {"explain", "KEY [--json]", "Show every source that holds a key.", explain, 1, 2},
-    {"watch", "KEY [--json]", "Show the value of a key now and whenever it changes.", watch, 1, 2},
-    {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
-    {"put", "KEY VALUE [--for TIME]", "Set a value, with --for until the time is over.",
-     onStore<putValue>, 2, 4},
-    {"unset", "KEY", "Take back what was set for a key, and show what is effective then.",
-     onStore<unsetKey>, 1, 1},
+    {"sources", sourcesUsage, "List the sources in order of precedence.", showSources, 0, 255,
+     false, nullptr, true},
+    {"load", loadUsage, "Add a property file as a source.", onSources<loadFile>, 0, 255, false,
+     nullptr, true},
+    {"unload", unloadUsage, "Remove a source.", onSources<unloadSource>, 1, 1},
+    {"explain", explainUsage, "Show every source that holds a key.", explain, 0, 255, false,
+     nullptr, true},
+    {"watch", watchUsage, "Show the value of a key now and whenever it changes.", watch, 0, 255,
+     false, nullptr, true},
+    {"unwatch", "WATCHED-KEY", "Stop showing the values of a key.", unwatch, 1, 1},
+    {"put", putUsage, "Set a value as it was typed, or of a type, also for a time.",
+     onStore<putValue>, 0, 255, false, nullptr, true},
+    {"unset", unsetUsage, "Take back what was set for a key, and show what is effective then.",
+     onStore<unsetKey>, 0, 255, false, nullptr, true},
     {"history", "[KEY] [--limit N]", "Show what was set when and by whom, the newest first.",
      onStore<showHistory>, 0, 3},
     {"undo", "[N]", "Take back change N of the history, or the newest one.", onStore<undoChange>, 0,
@@ -180,7 +189,9 @@ constexpr HostCommand commands[] = {
      true, suggestRequests},
     {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
      suggestCommands},
+    {"?", "[COMMAND]", "The same as help.", help, 0, 1, false, suggestCommands},
     {"quit", "", "End the session.", quit, 0, 0},
+    {"exit", "", "The same as quit.", quit, 0, 0},
 };
 
 CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
@@ -189,6 +200,7 @@ CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
         return run(*context, arguments);
     };
     CommandTraits traits{command.argumentNames, command.takesRawRest};
+    traits.takesWordsAsTyped = command.takesWordsAsTyped;
     if (command.suggest != nullptr) {
         traits.suggestions = [suggest = command.suggest, context] { return suggest(*context); };
     }

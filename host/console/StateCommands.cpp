@@ -1,18 +1,16 @@
 #include "host/console/StateCommands.hpp"
 
 #include <charconv>
-#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <utility>
 
-#include "configuration/admin/TypedText.hpp"
 #include "host/console/Command.hpp"
+#include "host/console/OptionWords.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
-#include "settings/Conversion.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -22,15 +20,8 @@ namespace {
 using configuration::ConfigurationValue;
 using Arguments = std::vector<std::string>;
 using StorePtr = std::shared_ptr<SessionStore>;
-using std::chrono::milliseconds;
 
 constexpr std::size_t usualLimit = 20;
-constexpr milliseconds longestLifetime = std::chrono::hours(24) * 36500;
-
-StateLayer& stateOf(const SessionStore& store) {
-    if (store.state() != nullptr) return *store.state();
-    throw CommandError("Nothing lasts in this session; start it with --state FILE for that.");
-}
 
 template <class Number>
 std::optional<Number> parseNumber(const std::string& text) {
@@ -39,13 +30,6 @@ std::optional<Number> parseNumber(const std::string& text) {
     const auto [parsedEnd, error] = std::from_chars(text.data(), end, number);
     if (error != std::errc() || parsedEnd != end) return std::nullopt;
     return number;
-}
-
-milliseconds parseLifetime(const std::string& text) {
-    const auto read = settings::Conversion<milliseconds>::from(ConfigurationValue(text));
-    if (!read) throw CommandError("--for " + text + ": " + read.reason().text);
-    if (read.value() > milliseconds::zero() && read.value() <= longestLifetime) return read.value();
-    throw CommandError("--for " + text + ": not between 1ms and 36500d");
 }
 
 std::size_t parseLimit(const std::string& text) {
@@ -93,25 +77,17 @@ std::string historyTable(const StorePtr& store,
 
 }  // namespace
 
-std::string putValue(const StorePtr& store, const Arguments& arguments) {
-    const auto lifetime =
-        optionBehind(2, 2, arguments, "--for", "What follows VALUE is no --for TIME.");
-    ConfigurationValue value = configuration::typedText(arguments.at(1));
-    if (!lifetime) {
-        store->set(arguments.at(0), std::move(value)).get();
-        return "";
-    }
-    StateLayer& state = stateOf(*store);
-    const auto parsed = parseLifetime(*lifetime);
-    store->noteWrite();
-    state.setFor(arguments.at(0), std::move(value), parsed);
-    return "";
+StateLayer& stateOf(const SessionStore& store) {
+    if (store.state() != nullptr) return *store.state();
+    throw CommandError("Nothing lasts in this session; start it with --state FILE for that.");
 }
 
 std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
-    const std::string& key = arguments.at(0);
+    const OptionWords given("unset", unsetUsage, 1, arguments);
+    const std::string& key = given.words().front().text;
+    const auto source = given.value("--source");
     store->noteWrite();
-    const bool wasThere = store->unset(key).get();
+    const bool wasThere = (source ? store->unset(key, *source) : store->unset(key)).get();
     if (!wasThere) throw CommandError("Nothing to unset: " + effectiveText(store, key));
     return effectiveText(store, key);
 }

@@ -21,7 +21,7 @@ void StreamedAnswer::note(std::string_view text) {
 }
 
 void StreamedAnswer::flush() {
-    output.answer(pending);
+    output.answer(pending, paint);
     pending.clear();
 }
 

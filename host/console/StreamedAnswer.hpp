@@ -3,6 +3,7 @@
 #include <string>
 #include <string_view>
 
+#include "host/console/Colours.hpp"
 #include "host/console/Command.hpp"
 #include "host/console/Output.hpp"
 
@@ -12,8 +13,10 @@ namespace velkor::host {
 /// is not flushed is dropped.
 class StreamedAnswer final : public CommandOutput {
 public:
-    /// Writes to `shownIn`, which must live as long.
-    explicit StreamedAnswer(Output& shownIn) : output(shownIn) {}
+    /// Writes to `shownIn`, which must live as long. Where there are colours, each line is painted
+    /// by `linePaint`, unless that is null.
+    explicit StreamedAnswer(Output& shownIn, Paint linePaint = nullptr)
+        : output(shownIn), paint(linePaint) {}
 
     void line(std::string_view text) override;
     void note(std::string_view text) override;
@@ -23,6 +26,7 @@ public:
 
 private:
     Output& output;
+    const Paint paint;
     std::string pending;
     bool hasBegun = false;
 };

@@ -46,6 +46,13 @@ bool Watches::remove(const std::string& key) {
     return true;
 }
 
+std::vector<std::string> Watches::keys() const {
+    const common::MutexLock lock(mutex);
+    std::vector<std::string> keys;
+    for (const auto& watch : watches) keys.push_back(watch.first);
+    return keys;
+}
+
 void Watches::forget(const std::string& key, const Watch& watch) {
     const common::MutexLock lock(mutex);
     const auto found = watches.find(key);

@@ -4,6 +4,7 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "configuration/Configuration.hpp"
 #include "framework/common/Mutex.hpp"
@@ -34,6 +35,9 @@ public:
     /// Shows no further values of `key`. Gives false when the key was not watched.
     bool remove(const std::string& key) VELKOR_EXCLUDES(mutex);
 
+    /// The keys that are watched, sorted.
+    std::vector<std::string> keys() const VELKOR_EXCLUDES(mutex);
+
 private:
     /// What keeps one watch open, once it is; its address tells it from a later one of the key.
     using Watch = std::shared_ptr<reactive_streams::SubscriptionHandle>;
@@ -43,7 +47,7 @@ private:
 
     const std::shared_ptr<configuration::Configuration> store;
     const Show show;
-    common::Mutex mutex;
+    mutable common::Mutex mutex;
     // Cancelling a handle may wait for the thread that writes to the store, and that may show a
     // value meanwhile: handles end with the mutex released.
     std::map<std::string, Watch> watches VELKOR_GUARDED_BY(mutex);

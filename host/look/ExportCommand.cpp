@@ -4,13 +4,13 @@
 #include <functional>
 
 #include "host/TerminalText.hpp"
+#include "host/console/OptionWords.hpp"
 #include "host/look/FileFormat.hpp"
 #include "host/look/JsonLines.hpp"
 #include "host/look/KeyPattern.hpp"
 #include "host/look/LookCommands.hpp"
 #include "host/look/PlainText.hpp"
 #include "host/look/PropertyLine.hpp"
-#include "host/look/WordOptions.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -92,9 +92,9 @@ void exportProperties(const std::shared_ptr<SessionStore>& store, KeySelection& 
 
 void exportOptions(const std::shared_ptr<SessionStore>& store,
                    const std::vector<std::string>& arguments, CommandOutput& output) {
-    const auto options = parseOptionsAmong(arguments, {{}, {formatOption}});
-    const auto format = chosenFormat(options).value_or(FileFormat::properties);
-    KeySelection selection(options.words, *store);
+    const OptionWords given("export", exportUsage, 0, arguments);
+    const auto format = chosenFormat(given).value_or(FileFormat::properties);
+    KeySelection selection(given.texts(), *store);
     if (format == FileFormat::json) {
         exportJson(store, selection, output);
     } else {

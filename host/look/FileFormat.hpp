@@ -2,7 +2,7 @@
 
 #include <optional>
 
-#include "host/look/WordOptions.hpp"
+#include "host/console/OptionWords.hpp"
 
 namespace velkor::host {
 
@@ -13,6 +13,6 @@ inline constexpr const char* formatOption = "--format";
 
 /// The format that `options` ask for; nothing if they ask for none. Throws `CommandError` "--format
 /// X: properties or json is needed".
-std::optional<FileFormat> chosenFormat(const WordOptions& options);
+std::optional<FileFormat> chosenFormat(const OptionWords& options);
 
 }  // namespace velkor::host

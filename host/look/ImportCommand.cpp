@@ -1,9 +1,9 @@
 #include "configuration/service/ValueJson.hpp"
 #include "host/TerminalText.hpp"
+#include "host/console/OptionWords.hpp"
 #include "host/lint/Remarks.hpp"
 #include "host/look/FileFormat.hpp"
 #include "host/look/LookCommands.hpp"
-#include "host/look/WordOptions.hpp"
 #include "host/sources/PropertyFile.hpp"
 #include "messages/JsonText.hpp"
 
@@ -60,11 +60,10 @@ std::vector<Change> changesIn(const std::string& text, FileFormat format,
 
 void importFile(const std::shared_ptr<SessionStore>& store,
                 const std::vector<std::string>& arguments, CommandOutput& output) {
-    const auto options = parseOptionsAmong(arguments, {{}, {formatOption}});
-    if (options.words.size() != 1) throw CommandError("import takes one FILE.");
-    const std::string& path = options.words.front();
+    const OptionWords given("import", importUsage, 1, arguments);
+    const std::string& path = given.words().front().text;
     const std::string text = readPropertyFile(path, store->sourceLimits());
-    const FileFormat format = chosenFormat(options).value_or(formatOf(text));
+    const FileFormat format = chosenFormat(given).value_or(formatOf(text));
     std::vector<Change> changes;
     try {
         changes = changesIn(text, format, store->sourceLimits());

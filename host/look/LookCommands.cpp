@@ -23,31 +23,18 @@ struct LookCommand {
     void (*run)(const StorePtr&, const Words&, CommandOutput&);
     std::uint8_t minimumArguments;
     std::uint8_t maximumArguments;
-    Words (*suggest)(SessionStore&) = nullptr;
+    bool takesWordsAsTyped = false;
 };
 
-Words suggestSources(SessionStore& store) {
-    Words names;
-    for (auto& source : store.describeSources().get()) names.push_back(std::move(source.name));
-    return names;
-}
-
-Words suggestNothing(SessionStore&) {
-    return {};
-}
-
 constexpr LookCommand commands[] = {
-    {"show", "[PATTERN...] [--source] [--all] [--json] [--raw]",
-     "Show values, with their sources, of all layers, as JSON, or bare.", showOptions, 0,
-     anyNumber},
-    {"diff", "[[A] B]", "Show what layer B changes of A, or of all behind it.", diffSources, 0, 2,
-     suggestSources},
-    {"export", "[PATTERN...] [--format properties|json]",
-     "Write what is effective in a form that can be loaded.", exportOptions, 0, anyNumber},
-    {"import", "FILE [--format properties|json]", "Set everything that a file holds, or nothing.",
-     importFile, 1, 3, suggestNothing},
-    {"check", "FILE...", "Tell what is wrong with property files.", checkNamedFiles, 1, anyNumber,
-     suggestNothing},
+    {"show", showUsage, "Show values, with their sources, of all layers, as JSON, or bare.",
+     showOptions, 0, anyNumber, true},
+    {"diff", "[[A] B]", "Show what layer B changes of A, or of all behind it.", diffSources, 0, 2},
+    {"export", exportUsage, "Write what is effective in a form that can be loaded.", exportOptions,
+     0, anyNumber, true},
+    {"import", importUsage, "Set everything that a file holds, or nothing.", importFile, 0,
+     anyNumber, true},
+    {"check", "FILE...", "Tell what is wrong with property files.", checkNamedFiles, 1, anyNumber},
 };
 
 CommandRegistry::CommandPtr makeCommand(const LookCommand& command, const StorePtr& store) {
@@ -55,9 +42,7 @@ CommandRegistry::CommandPtr makeCommand(const LookCommand& command, const StoreP
     traits.stream = [run = command.run, store](Words&& arguments, CommandOutput& output) {
         run(store, arguments, output);
     };
-    if (command.suggest != nullptr) {
-        traits.suggestions = [suggest = command.suggest, store] { return suggest(*store); };
-    }
+    traits.takesWordsAsTyped = command.takesWordsAsTyped;
     return std::make_shared<const Command>(
         administration::CommandDescriptor{command.name, command.description, nullptr,
                                           command.minimumArguments, command.maximumArguments},

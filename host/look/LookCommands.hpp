@@ -12,9 +12,13 @@ namespace velkor::host {
 
 // The commands that look at the store as a whole, and at files. All write their answers as they go.
 // Values of secret keys, see `settings::secretKeys`, are never shown. `KeyPattern` says which keys
-// a PATTERN means. Each throws `CommandError` for options that it doesn't know.
+// a PATTERN means. Where there are options, `arguments` are words as they were typed, and what
+// `OptionWords` throws passes on.
 
-/// [PATTERN...] [--source] [--all] [--json] [--raw]: a line "KEY = VALUE" for each key that any
+/// What `showOptions` takes.
+inline constexpr const char* showUsage = "[PATTERN...] [--source] [--all] [--json] [--raw]";
+
+/// A line "KEY = VALUE" for each key that any
 /// PATTERN means, or for all. With --source " (SOURCE)" follows; with --all there is such a line
 /// for each source that holds the key, and ", overridden" in it for all but the first. With --json
 /// one object of a member for each key, see `JsonLines`: its value; with --source an object of its
@@ -32,7 +36,10 @@ void showOptions(const std::shared_ptr<SessionStore>& store,
 void diffSources(const std::shared_ptr<SessionStore>& store,
                  const std::vector<std::string>& arguments, CommandOutput& output);
 
-/// [PATTERN...] [--format properties|json]: what is effective, in a form that can be loaded again:
+/// What `exportOptions` takes.
+inline constexpr const char* exportUsage = "[PATTERN...] [--format properties|json]";
+
+/// What is effective, in a form that can be loaded again:
 /// a property file, or the JSON of `showOptions`. Secrets are left out, which is noted, and so is
 /// how many values lose their type in a property file.
 ///
@@ -41,7 +48,10 @@ void diffSources(const std::shared_ptr<SessionStore>& store,
 void exportOptions(const std::shared_ptr<SessionStore>& store,
                    const std::vector<std::string>& arguments, CommandOutput& output);
 
-/// FILE [--format properties|json]: sets everything that FILE holds, where `set` would, or nothing.
+/// What `importFile` takes.
+inline constexpr const char* importUsage = "FILE [--format properties|json]";
+
+/// Sets everything that FILE holds, where `set` would, or nothing.
 /// A file whose first byte that is no blank is { is JSON unless the option says otherwise.
 ///
 /// Throws what `readPropertyFile` throws, `CommandError` "FILE: " with the text of

@@ -1,9 +1,9 @@
+#include "host/console/OptionWords.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/look/JsonLines.hpp"
 #include "host/look/KeyPattern.hpp"
 #include "host/look/LookCommands.hpp"
 #include "host/look/PlainText.hpp"
-#include "host/look/WordOptions.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -56,15 +56,15 @@ std::vector<Option> holdersOf(SessionStore& store, const std::string& key, bool 
 
 void showOptions(const std::shared_ptr<SessionStore>& store,
                  const std::vector<std::string>& arguments, CommandOutput& output) {
-    const auto options = parseOptionsAmong(arguments, {{"--source", "--all", "--json", "--raw"}});
-    const bool raw = options.has("--raw");
-    const bool json = options.has("--json");
-    const bool all = options.has("--all");
-    const bool withSource = all || options.has("--source");
-    if (raw && options.flags.size() > 1) throw CommandError("--raw goes with no other option.");
+    const OptionWords given("show", showUsage, 0, arguments);
+    const bool raw = given.has("--raw");
+    const bool json = given.has("--json");
+    const bool all = given.has("--all");
+    const bool withSource = all || given.has("--source");
+    if (raw && (json || withSource)) throw CommandError("--raw goes with no other option.");
 
     const auto secrets = settings::secretKeys(store);
-    KeySelection selection(options.words, *store);
+    KeySelection selection(given.texts(), *store);
     std::optional<JsonLines> lines;
     if (json) lines.emplace(output);
     const ShowKey show = raw    ? bare(output)

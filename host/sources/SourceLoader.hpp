@@ -18,6 +18,7 @@ struct LoadedSources {
 
     std::vector<std::string> failures{};
     std::vector<std::string> notices{};  ///< "PATH: N remarks, see check" for files with remarks.
+    std::vector<std::string> names{};    ///< Of the sources that were added.
     WatchedFiles watchedFiles{};
 };
 

@@ -24,9 +24,13 @@ struct SourceRequest {
     std::string group{};
     int order = defaultOrder;
     bool writable = false;
-    std::string kind = "file";  ///< See `sourceKind`.
-    bool watched = false;       ///< It is read again when it changes, if it can be.
+    std::string kind = "file";    ///< See `sourceKind`.
+    bool watched = false;         ///< It is read again when it changes, if it can be.
+    bool mustBeReadable = false;  ///< A watched file that can't be read yet is a failure.
 };
+
+/// The order that `text` names; nothing when it is no number of 32 bits.
+std::optional<int> parseOrder(const std::string& text);
 
 /// What the making of a source may cost.
 struct SourceLimits {

@@ -115,6 +115,48 @@ TEST(Program, GivenLinesTakeThePlaceOfStandardInput) {
     EXPECT_EQ(runProgram({"-c", "set a 1", "-c", "get a"}, "get b\n").out, "1\n");
 }
 
+TEST(Program, CarriesOutOneCommandWhoseWordsAreTakenAsTheyAre) {
+    const TemporaryFile file("a\\ 'key=b\n");
+    const auto result = runProgram({file.path().string(), "--", "get", "a 'key"}, "set a 1\n");
+    EXPECT_EQ(result.out, "'b'\n");
+    EXPECT_EQ(result.err, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, TakesAMessageAsOneCommand) {
+    EXPECT_EQ(runProgram({"--", "send", "ConfigurationKeys", "{ }"}).out,
+              "velkor/configuration/ConfigurationKeysResponse {\"keys\":[]}\n");
+}
+
+TEST(Program, OneCommandHasOptionsOfItsOwn) {
+    EXPECT_EQ(runProgram({"--", "put", "a", "x y", "--dry-run"}).out,
+              "LAYER      NOW  THEN\n"
+              "override   -    'x y'\n"
+              "effective  -    'x y' (override)\n");
+}
+
+TEST(Program, OneCommandThatFailsDecidesTheExitStatus) {
+    for (const std::string command : {"nope", "#"}) {
+        const auto result = runProgram({"--", command});
+        EXPECT_EQ(result.err.rfind("velkor-config: Unknown command: " + command, 0), 0U);
+        EXPECT_EQ(result.exitCode, 1);
+    }
+}
+
+TEST(Program, OneCommandMayHaveARemark) {
+    EXPECT_EQ(runProgram({"--", "set", "a", "20s"}).err,
+              "velkor-config: set a: 20s was stored as 20; put stores the whole word\n");
+}
+
+TEST(Program, RefusesACommandWhereFilesAreNamed) {
+    const auto result = runProgram({"/no/file", "get", "a key"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err,
+              "velkor-config: get is a command and no file; say: velkor-config [OPTIONS] [FILE...] "
+              "-- get a\\ key, or -c \"get a\\ key\"\n");
+    EXPECT_EQ(result.exitCode, 2);
+}
+
 TEST(Program, EndsAtQuit) {
     const auto result = runProgram({}, "set a 1\nquit\nget a\n");
     EXPECT_EQ(result.out, "");
@@ -135,6 +177,27 @@ TEST(Program, AnAbsentKeyIsAnAnswerNotAFailure) {
     const auto result = runProgram({"-c", "get a"});
     EXPECT_EQ(result.out, "No configuration option with key: a\n");
     EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, SaysWhenSetStoresSomethingElseThanWasTyped) {
+    const auto result = runProgram({}, "set host 10.20.0.9\nset a 1\nget host\n");
+    EXPECT_EQ(result.out, "10.2\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 1: set host: 10.20.0.9 was stored as 10.2; put stores the whole "
+              "word\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, PutTellsQuotedWordsFromOthers) {
+    EXPECT_EQ(runProgram({"-c", "put a 5", "-c", "put b '5'", "-c", "list"}).out,
+              "a = 5\nb = '5'\n");
+}
+
+TEST(Program, PutFailsWhereTheValueDoesNotFit) {
+    const auto result = runProgram({"-c", "put a --type uint -1", "-c", "list"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err, "velkor-config: --type uint: not within 0 to 4294967295\n");
+    EXPECT_EQ(result.exitCode, 1);
 }
 
 TEST(Program, ReportsWhatASourceRefuses) {
@@ -202,6 +265,12 @@ TEST(Program, ShowsItsHelpOnStandardOutput) {
     EXPECT_NE(result.out.find("Usage: velkor-config [OPTIONS] [FILE...]"), std::string::npos);
     EXPECT_EQ(result.err, "");
     EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, RefusesAManualInAFormThatThereIsNot) {
+    const auto result = runProgram({"--manual", "html"});
+    EXPECT_EQ(result.err, "velkor-config: --manual: one of man, bash, usage is needed\n");
+    EXPECT_EQ(result.exitCode, 2);
 }
 
 TEST(Program, WritesALogChannelToStandardError) {

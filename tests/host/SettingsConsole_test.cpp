@@ -1,8 +1,11 @@
 #include <gtest/gtest.h>
 
+#include <fstream>
+#include <iterator>
 #include <string>
 
 #include "tests/host/ChildProcess.hpp"
+#include "tests/host/TerminalSession.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
 namespace velkor::host {
@@ -103,6 +106,20 @@ TEST_F(SettingsConsoleTest, NamesTheCommandAmongTheOthers) {
     EXPECT_EQ(run("help settings\n").out,
               "settings ([--undeclared] [KEY-PREFIX])\n"
               "List the settings that are declared, or the keys that are not.\n");
+}
+
+TEST_F(SettingsConsoleTest, KeepsNoSecretInItsHistory) {
+    TerminalSession terminal({"--source", "site=" + file.path().string()}, "dumb",
+                             {"XDG_STATE_HOME=" + file.parent().string()});
+    for (const char* line : {"set server.port 1\n", "set server.password othersecret\n",
+                             "send ConfigurationKeys\n", "quit\n"}) {
+        EXPECT_TRUE(terminal.shows("velkor> "));
+        terminal.type(line);
+    }
+    EXPECT_EQ(terminal.exitCode(), 0);
+    std::ifstream history(file.parent() / "velkor" / "history");
+    EXPECT_EQ(std::string(std::istreambuf_iterator<char>(history), {}),
+              "set server.port 1\nquit\n");
 }
 
 TEST(SettingsConsole, EndsBeforeTheFirstCommandWhenSettingsDoNotFit) {

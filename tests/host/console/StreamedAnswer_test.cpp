@@ -38,6 +38,17 @@ TEST_F(StreamedAnswerTest, ShowsTheFirstLineAtOnce) {
     EXPECT_EQ(answers.str(), "a\n");
 }
 
+TEST_F(StreamedAnswerTest, PaintsEachLineWhereThereAreColours) {
+    Output colours(answers, Output::Answers::coloured, messages);
+    StreamedAnswer painted(colours,
+                           [](std::string_view line) { return '<' + std::string(line) + '>'; });
+    painted.line("a");
+    painted.line("b");
+    painted.line("c");
+    painted.flush();
+    EXPECT_EQ(answers.str(), "<a>\n<b>\n<c>\n");
+}
+
 TEST_F(StreamedAnswerTest, ShowsWhatFollowsInBlocks) {
     answer.line("a");
     answer.line("b");

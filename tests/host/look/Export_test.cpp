@@ -138,7 +138,7 @@ TEST(Export, RefusesOtherFormats) {
     const auto result = runProgram({"-c", "export --format xml"});
     EXPECT_EQ(result.err, "velkor-config: --format xml: properties or json is needed\n");
     EXPECT_EQ(runProgram({"-c", "export --format"}).err,
-              "velkor-config: A value is needed behind: --format\n");
+              "velkor-config: export: --format needs properties|json.\n");
 }
 
 TEST(Export, SaysWhichPatternsMatchNothing) {
@@ -216,7 +216,8 @@ TEST(ImportFile, HasToBeThere) {
     EXPECT_NE(result.err.find("Property file could not be opened: /no/file: No such file"),
               std::string::npos);
     EXPECT_EQ(result.exitCode, 1);
-    EXPECT_EQ(runProgram({"-c", "import a b"}).err, "velkor-config: import takes one FILE.\n");
+    EXPECT_EQ(runProgram({"-c", "import a b"}).err,
+              "velkor-config: import takes FILE [--format properties|json]\n");
 }
 
 }  // namespace

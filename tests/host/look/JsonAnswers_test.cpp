@@ -65,10 +65,11 @@ TEST(JsonAnswers, OfMessagesWithoutTheirTypes) {
 }
 
 TEST(JsonAnswers, AreOfNoOtherArguments) {
-    EXPECT_EQ(runProgram({"-c", "sources x"}).err,
-              "velkor-config: sources takes no argument but --json.\n");
-    EXPECT_EQ(runProgram({"-c", "explain a b"}).err, "velkor-config: One KEY is needed.\n");
-    EXPECT_EQ(runProgram({"-c", "explain --jsno"}).err, "velkor-config: Unknown option: --jsno\n");
+    EXPECT_EQ(runProgram({"-c", "sources x"}).err, "velkor-config: sources takes [--json]\n");
+    EXPECT_EQ(runProgram({"-c", "explain a b"}).err, "velkor-config: explain takes KEY [--json]\n");
+    EXPECT_EQ(runProgram({"-c", "explain --jsno"}).err,
+              "velkor-config: explain knows no option --jsno; quote it where it is an ordinary "
+              "word.\n");
 }
 
 }  // namespace

@@ -91,7 +91,9 @@ INSTANTIATE_TEST_SUITE_P(
             "{\"source\":\"base\",\"value\":{\"type\":\"string\",\"value\":\"2\"}}]\n}\n"},
         ShowCase{"JsonOfNothing", "--json x", "{\n}\n", "No configuration option with key: x"},
         ShowCase{"RawAlone", "--raw --json", "", "--raw goes with no other option."},
-        ShowCase{"UnknownOption", "--rwa", "", "Unknown option: --rwa"},
+        ShowCase{"UnknownOption", "--rwa", "",
+                 "show knows no option --rwa; quote it where it is an ordinary word."},
+        ShowCase{"QuotedWord", "'--raw'", "", "No configuration option with key: --raw"},
         ShowCase{"WordsBehindTwoDashes", "-- --raw", "",
                  "No configuration option with key: --raw"}),
     nameOf);
