@@ -179,7 +179,7 @@ TEST_F(HostCommandsTest, UndoSuggestsNoKeys) {
 TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {
     const configuration::ConfigurationCommandProvider storeCommands(store, registry);
     const std::string help = run("help");
-    EXPECT_NE(help.find("explain                    KEY [--json]              Show every source"),
+    EXPECT_NE(help.find("explain                    KEY [OPTIONS]             Show every source"),
               std::string::npos);
     EXPECT_NE(help.find("velkor.configuration.set   2 arguments               Set a configuration "
                         "value.\n"),
