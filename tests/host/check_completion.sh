@@ -26,7 +26,7 @@ expect() {
 }
 
 expect '--source --set --state' velkor-config --s
-expect '--watch-files' velkor-config one.properties --w
+expect '--watch-files' velkor-config one.properties --wa
 expect 'one.properties' velkor-config o
 expect 'one.properties' velkor-config --state o
 expect '' velkor-config --env o

@@ -2,8 +2,8 @@
 # check_examples.sh PROGRAM DOCUMENT: each block of the document whose first line is "$ velkor-config
 # ..." or a pipe into it is carried out as it stands, and prints what stands below each command.
 # Standard error counts as well. Programs that ask for a terminal, and what is different each time,
-# are left out: a block without output, and one that shows a time or a name. The commands share a
-# copy of the examples.
+# are left out: a command without output that writes no file, and one that shows a time or a name.
+# The commands share a copy of the examples.
 set -eu
 program=$1
 document=$2
@@ -19,7 +19,7 @@ export PATH
 # One file for each command, and one for what it prints.
 awk -v folder="$folder" '
     function finish() {
-        if (command != "" && output != "" && output !~ /velkor> |[0-9]Z  / && count > 0) {
+        if (command != "" && (output != "" || command ~ / > /) && output !~ /velkor> |[0-9]Z  / && count > 0) {
             file = sprintf("%s/%03d", folder, count)
             printf "%s", command > (file ".sh")
             printf "%s", output > (file ".out")
