@@ -8,6 +8,7 @@
 #include <string_view>
 #include <utility>
 
+#include "host/BracketGuard.hpp"
 #include "host/Severities.hpp"
 
 namespace velkor::host {
@@ -23,8 +24,11 @@ constexpr const char* footer =
     "environment, and what 'set' writes overrides them all, unless an order says otherwise: the\n"
     "smaller order wins.\n"
     "With --env APP_ the variable APP_SERVER__MAX_SIZE is server.max_size.\n"
-    "On a terminal files are read again when they change, unless an option says otherwise.\n"
-    "SIZE is a number of bytes, also with KiB, MiB or GiB behind it.\n"
+    "On a terminal, and with --listen, files are read again when they change, unless an option\n"
+    "says otherwise.\n"
+    "With --listen commands come from -c, and with --console as they do without it. SIGINT and\n"
+    "SIGTERM end it.\n"
+    "SIZE is a number of bytes, also with KiB, MiB or GiB behind it. TIME has a unit: 250ms, 10s.\n"
     "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
     "separated by commas.\n"
     "\n"
@@ -91,18 +95,6 @@ void applySetting(SourceRequest& request, const std::string& setting, const std:
     }
 }
 
-// The parsing library takes a text in brackets for a list. A byte in front that no argument can
-// hold keeps it from looking so.
-constexpr char guard = '\0';
-
-std::string guarded(const std::string& argument) {
-    return !argument.empty() && argument.front() == '[' ? guard + argument : argument;
-}
-
-std::string unguarded(const std::string& text) {
-    return !text.empty() && text.front() == guard ? text.substr(1) : text;
-}
-
 SourceRequest environment(const std::string& prefix) {
     SourceRequest request{std::nullopt, prefix};
     request.order = SourceRequest::environmentOrder;
@@ -130,6 +122,7 @@ public:
             "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
         add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
+        listenOptions.emplace(app);
         app.footer(footer);
     }
 
@@ -158,6 +151,9 @@ public:
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
         collectSources(options);
+        options.serving = listenOptions->request();
+        if (options.serving)
+            options.serving->server.maxPropertyFileBytes = options.limits.fileBytes;
         return options;
     }
 
@@ -206,6 +202,7 @@ private:
     Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;
+    std::optional<ListenOptions> listenOptions;  // made last: the help shows them behind the others
 };
 
 }  // namespace

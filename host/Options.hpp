@@ -6,6 +6,7 @@
 #include <string>
 #include <vector>
 
+#include "host/serving/ListenOptions.hpp"
 #include "host/sources/SourceRequest.hpp"
 
 namespace velkor::host {
@@ -32,6 +33,7 @@ struct Options {
     std::optional<bool> watchesFiles{};  ///< Nothing: as fits the session.
     std::vector<std::string> lines{};    ///< Command lines; empty: they are read.
     std::vector<LogRequest> logs{};
+    std::optional<ListenRequest> serving{};  ///< Nothing: nobody is served.
     std::string information{};  ///< What --help or --version wants shown, instead of all else.
 };
 

@@ -33,6 +33,8 @@
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
+#include "host/serving/Serving.hpp"
+#include "host/serving/Termination.hpp"
 #include "host/sources/SourceLoader.hpp"
 #include "host/state/StateLayer.hpp"
 #include "messages/MessageService.hpp"
@@ -110,6 +112,11 @@ public:
         if (!settings::describe(store).empty()) settingsCommand.emplace(store, registry);
     }
 
+    /// Serves the store until what this gives is destroyed, and shows where.
+    std::shared_ptr<const void> serve(const http::ServerOptions& options) {
+        return host::serve(store, options, [this](const auto& line) { output.answer(line); });
+    }
+
     /// Carries out the given lines or, when there are none, those that are typed or read.
     bool run(const std::vector<std::string>& lines) {
         const auto source = makeLineSource(lines);
@@ -172,9 +179,21 @@ std::vector<SourceRequest> watched(std::vector<SourceRequest> sources, bool watc
     return sources;
 }
 
+/// Carries out the lines of the command line, then serves until a signal or the console ends it.
+/// Gives whether every line could be carried out.
+bool runServing(Session& session, const std::vector<std::string>& lines,
+                const ListenRequest& serving) {
+    const bool linesCarriedOut = lines.empty() || session.run(lines);
+    const Termination termination(serving.withConsole);
+    const auto server = session.serve(serving.server);
+    if (serving.withConsole) return session.run({}) && linesCarriedOut;
+    termination.await();
+    return linesCarriedOut;
+}
+
 ExitCode runSession(const Options& options, const DeclareSettings& declare, Output& output) {
     std::optional<LogSink> logSink;
-    if (!options.logs.empty()) logSink.emplace(std::cerr);
+    if (!options.logs.empty() || options.serving) logSink.emplace(std::cerr);
     for (const auto& log : options.logs) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }
@@ -184,10 +203,13 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
         return ExitCode::sourceNotLoaded;
     }
     session.assign(options.assignments);
-    const bool watches = options.watchesFiles.value_or(isInteractive(options.lines));
+    const bool watches =
+        options.watchesFiles.value_or(options.serving || isInteractive(options.lines));
     const bool allLoaded = session.load(watched(options.sources, watches));
     session.declareSettings(declare);
-    const bool allCarriedOut = session.run(options.lines);
+    const bool allCarriedOut = options.serving
+                                   ? runServing(session, options.lines, *options.serving)
+                                   : session.run(options.lines);
     if (!allLoaded) return ExitCode::sourceNotLoaded;
     return allCarriedOut ? ExitCode::fine : ExitCode::commandFailed;
 }

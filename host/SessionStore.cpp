@@ -18,7 +18,7 @@ void SessionStore::keepStateIn(std::shared_ptr<StateLayer> layer) {
 }
 
 Future<ConfigurationValue> SessionStore::get(const std::string& key) {
-    if (Interruption::isRequested()) throw Interrupted();
+    if (Interruption::isRequestedHere()) throw Interrupted();
     return ConfigurationImpl::get(key);
 }
 

@@ -26,7 +26,7 @@ public:
     /// The layer that lasts; null when there is none.
     StateLayer* state() const noexcept { return stateLayer.get(); }
 
-    /// As in the library; throws `Interrupted` once Ctrl-C was pressed.
+    /// As in the library; throws `Interrupted` once Ctrl-C was pressed, on the console's thread.
     Future<configuration::ConfigurationValue> get(const std::string& key) override;
 
     using Configuration::set;

@@ -9,6 +9,8 @@ namespace {
 std::atomic<bool> requested{false};
 static_assert(std::atomic<bool>::is_always_lock_free, "a signal handler sets it");
 
+thread_local bool commandsRunHere = false;
+
 void request(int) {
     requested = true;
 }
@@ -17,6 +19,7 @@ void request(int) {
 
 Interruption::Interruption() noexcept {
     requested = false;
+    commandsRunHere = true;
     struct sigaction action {};
     action.sa_handler = request;  // without SA_RESTART: a system call that waits gives up
     sigemptyset(&action.sa_mask);
@@ -26,10 +29,15 @@ Interruption::Interruption() noexcept {
 Interruption::~Interruption() {
     sigaction(SIGINT, &previous, nullptr);
     requested = false;
+    commandsRunHere = false;
 }
 
 bool Interruption::isRequested() noexcept {
     return requested;
+}
+
+bool Interruption::isRequestedHere() noexcept {
+    return commandsRunHere && requested;
 }
 
 bool Interruption::take() noexcept {

@@ -26,6 +26,10 @@ public:
     /// `Interruption`.
     static bool isRequested() noexcept;
 
+    /// As above, on the thread that carries out commands; false on all others, whose work Ctrl-C is
+    /// not about.
+    static bool isRequestedHere() noexcept;
+
     /// Clears the mark and gives whether it was set.
     static bool take() noexcept;
 

@@ -52,6 +52,23 @@ TEST_F(SessionStoreTest, EndsAListWhenItIsInterrupted) {
     EXPECT_EQ(registry->find("list")->run({}), "a = 1\n");
 }
 
+TEST_F(SessionStoreTest, IsInterruptedOnTheThreadOfTheConsoleOnly) {
+    store->set("a", 1);
+    const Interruption interruption;
+    std::raise(SIGINT);
+    std::string read;
+    std::thread request([&] {
+        try {
+            read = valueText(store->get("a").get());
+        } catch (const std::exception& error) {
+            read = error.what();
+        }
+    });
+    request.join();
+    EXPECT_EQ(read, "1");
+    EXPECT_THROW(store->get("a"), Interrupted);
+}
+
 TEST_F(SessionStoreTest, LetsALayerThatLastsTakeThePlaceOfOverride) {
     const auto state = std::make_shared<FakeState>();
     store->set("a", 1);

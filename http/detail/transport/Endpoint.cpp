@@ -35,9 +35,10 @@ std::optional<std::uint16_t> portIn(std::string_view text) {
 }  // namespace
 
 Endpoint::Endpoint(std::string_view text) {
-    if (text.substr(0, unixPrefix.size()) == unixPrefix) {
+    const bool hasNul = text.find('\0') != std::string_view::npos;
+    if (!hasNul && text.substr(0, unixPrefix.size()) == unixPrefix) {
         readPath(text.substr(unixPrefix.size()), text);
-    } else if (!readAddress(text)) {
+    } else if (hasNul || !readAddress(text)) {
         throw Refused("'" + std::string(text) +
                       "' is no address to listen on: give [ADDRESS:]PORT, with ADDRESS in digits, "
                       "or unix:PATH");
@@ -61,7 +62,7 @@ bool Endpoint::readAddress(std::string_view text) {
     const bool hasAddress = colon != std::string_view::npos;
     const auto port = portIn(hasAddress ? text.substr(colon + 1) : text);
     std::string host(hasAddress ? text.substr(0, colon) : std::string_view("127.0.0.1"));
-    if (!port || host.find('\0') != std::string::npos) return false;
+    if (!port) return false;
 
     if (host.size() > 2 && host.front() == '[' && host.back() == ']') {
         sockaddr_in6 socket{};

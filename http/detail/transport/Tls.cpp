@@ -3,6 +3,7 @@
 #include <openssl/err.h>
 #include <openssl/ssl.h>
 
+#include <cerrno>
 #include <fstream>
 #include <new>
 #include <system_error>
@@ -12,16 +13,17 @@
 namespace velkor::http::detail::transport {
 namespace {
 
-// What the system or OpenSSL has against `file`.
-std::string reasonOf(const std::string& file) {
+[[noreturn]] void refuse(const std::string& what, const std::string& file, const char* reason) {
     errno = 0;
-    if (!std::ifstream(file)) return std::generic_category().message(errno);
-    const char* const reason = ::ERR_reason_error_string(::ERR_peek_last_error());
-    return reason != nullptr ? reason : "it holds none";
+    const bool canBeRead = std::ifstream(file).good();
+    throw Refused("can't use the " + what + " " + file + ": " +
+                  (canBeRead ? reason : std::generic_category().message(errno)));
 }
 
-[[noreturn]] void refuse(const std::string& what, const std::string& file) {
-    throw Refused("can't use the " + what + " " + file + ": " + reasonOf(file));
+// What is wrong with a key that can be read.
+const char* keyProblem() {
+    const bool isAnothers = ERR_GET_LIB(::ERR_peek_error()) == ERR_LIB_X509;
+    return isAnothers ? "it is not that of the certificate" : "no key in PEM is in it";
 }
 
 // No one is there who could type a pass phrase.
@@ -45,10 +47,10 @@ std::shared_ptr<SSL_CTX> tlsContext(const std::string& certificateFile,
     ::SSL_CTX_set_default_passwd_cb(context.get(), noPassPhrase);
     ::ERR_clear_error();
     if (::SSL_CTX_use_certificate_chain_file(context.get(), certificateFile.c_str()) != 1) {
-        refuse("certificate", certificateFile);
+        refuse("certificate", certificateFile, "no certificate in PEM is in it");
     }
     if (::SSL_CTX_use_PrivateKey_file(context.get(), keyFile.c_str(), SSL_FILETYPE_PEM) != 1) {
-        refuse("key", keyFile);
+        refuse("key", keyFile, keyProblem());
     }
     return context;
 }

@@ -43,6 +43,7 @@ TEST(Journal, CanBeReadAsThatOfAnySource) {
     const auto source = SqliteSource::open(folder.file(), by("alice"));
     source->set("a", 1);
     source->unset("a");
+    source->committed().get();
 
     const auto changes = source->changes("a", 1);
 
