@@ -86,10 +86,9 @@ Response otherMethod(std::string_view path, const std::string& method) {
     if (allowed.empty()) {
         throw Problem(ProblemKind::notFound, "There is nothing at " + std::string(path));
     }
-    Response response =
-        method == "OPTIONS"
-            ? Response{204, {}, {}, {}}
-            : problemResponse(ProblemKind::methodNotAllowed, "Allowed here: " + allowed);
+    Response response = method == "OPTIONS" ? Response{204, {}, {}, {}}
+                                            : problemResponse(ProblemKind::methodNotAllowed,
+                                                              "Allowed here: " + allowed);
     response.headers.emplace_back("Allow", std::move(allowed));
     return response;
 }
@@ -186,9 +185,8 @@ private:
 
     void enqueue(const Route& route, Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
-        const bool isTaken = worker.post([this, &route, kept] {
-            answering(*kept, [&] { route.handle(context, *kept); });
-        });
+        const bool isTaken = worker.post(
+            [this, &route, kept] { answering(*kept, [&] { route.handle(context, *kept); }); });
         if (!isTaken) {
             kept->answer(problemResponse(ProblemKind::unavailable, "Too many requests wait."));
         }
