@@ -1,5 +1,7 @@
 """How serving begins and ends: refusals to start, signals, the console beside it."""
 
+import http.client
+import json
 import os
 import pty
 import resource
@@ -82,6 +84,27 @@ class EndTest(ServerTest):
             server.process.send_signal(signal.SIGTERM)
             server.process.send_signal(signal.SIGINT)
         self.assertEqual(server.wait(), 0)
+
+    def test_a_log_that_nobody_reads_holds_nobody(self):
+        server = self.serve("--allow-writes", stderr=subprocess.PIPE)
+        body = json.dumps({"changes": [{"key": "k" * 900, "unset": True}]})
+        connection = http.client.HTTPConnection("127.0.0.1", server.port, timeout=PATIENCE)
+        self.addCleanup(connection.close)
+        for _ in range(200):
+            connection.request("PATCH", "/config", body)
+            response = connection.getresponse()
+            self.assertEqual((response.status, response.read())[0], 200)
+        self.assertEqual(server.end(), 0)
+
+    def test_a_hangup_ends_it_and_takes_its_socket_away(self):
+        for arguments in [(), ("--console",)]:
+            for by in [signal.SIGHUP, signal.SIGINT, signal.SIGTERM]:
+                with self.subTest(arguments=arguments, signal=by):
+                    path = os.path.join(self.folder, "socket")
+                    server = self.serve(*arguments, listen=("unix:" + path,),
+                                        stdin=subprocess.PIPE)
+                    self.assertEqual(server.end(by), 0)
+                    self.assertFalse(os.path.exists(path))
 
     def test_a_client_in_the_middle_of_a_request_holds_nothing(self):
         server = self.serve()
