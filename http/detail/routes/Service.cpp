@@ -116,6 +116,11 @@ std::string argumentOf(const Route& route, std::string_view path) {
     return *std::move(argument);
 }
 
+// The address without the port.
+std::string machineOf(const Client& client) {
+    return client.address.substr(0, client.address.rfind(':'));
+}
+
 /// Leads requests through access and routing to what answers them. Immutable but for the worker,
 /// so safe for concurrent use.
 class Service final : public Handler {
@@ -129,6 +134,8 @@ public:
           context{store,
                   options,
                   access,
+                  keys,
+                  std::make_shared<ChangeHub>(),
                   metricsOfRoutes(),
                   std::move(counts),
                   messageService.dispatcherFor(messages::allRequestTypes()),
@@ -185,11 +192,10 @@ private:
 
     void enqueue(const Route& route, Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
-        const bool isTaken = worker.post(
-            [this, &route, kept] { answering(*kept, [&] { route.handle(context, *kept); }); });
-        if (!isTaken) {
-            kept->answer(problemResponse(ProblemKind::unavailable, "Too many requests wait."));
-        }
+        const auto kind = route.right == Right::write ? Worker::Kind::write : Worker::Kind::read;
+        worker.post(kind, machineOf(kept->request.client), [this, &route, kept] {
+            answering(*kept, [&] { route.handle(context, *kept); });
+        });
     }
 
     static std::string_view textOf(ProblemKind kind) {
@@ -212,6 +218,7 @@ private:
     const ServerOptions options;
     const Access access;
     const messages::MessageService messageService;
+    KeyList keys;
     const Context context;
     Worker worker{mostWaiting};  // the last member: it uses the others
 };
