@@ -86,10 +86,9 @@ Response otherMethod(std::string_view path, const std::string& method) {
     if (allowed.empty()) {
         throw Problem(ProblemKind::notFound, "There is nothing at " + std::string(path));
     }
-    Response response =
-        method == "OPTIONS"
-            ? Response{204, {}, {}, {}}
-            : problemResponse(ProblemKind::methodNotAllowed, "Allowed here: " + allowed);
+    Response response = method == "OPTIONS" ? Response{204, {}, {}, {}}
+                                            : problemResponse(ProblemKind::methodNotAllowed,
+                                                              "Allowed here: " + allowed);
     response.headers.emplace_back("Allow", std::move(allowed));
     return response;
 }
@@ -117,6 +116,11 @@ std::string argumentOf(const Route& route, std::string_view path) {
     return *std::move(argument);
 }
 
+// The address without the port.
+std::string machineOf(const Client& client) {
+    return client.address.substr(0, client.address.rfind(':'));
+}
+
 /// Leads requests through access and routing to what answers them. Immutable but for the worker,
 /// so safe for concurrent use.
 class Service final : public Handler {
@@ -130,6 +134,8 @@ public:
           context{store,
                   options,
                   access,
+                  keys,
+                  std::make_shared<ChangeHub>(),
                   metricsOfRoutes(),
                   std::move(counts),
                   messageService.dispatcherFor(messages::allRequestTypes()),
@@ -186,12 +192,10 @@ private:
 
     void enqueue(const Route& route, Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
-        const bool isTaken = worker.post([this, &route, kept] {
+        const auto kind = route.right == Right::write ? Worker::Kind::write : Worker::Kind::read;
+        worker.post(kind, machineOf(kept->request.client), [this, &route, kept] {
             answering(*kept, [&] { route.handle(context, *kept); });
         });
-        if (!isTaken) {
-            kept->answer(problemResponse(ProblemKind::unavailable, "Too many requests wait."));
-        }
     }
 
     static std::string_view textOf(ProblemKind kind) {
@@ -214,6 +218,7 @@ private:
     const ServerOptions options;
     const Access access;
     const messages::MessageService messageService;
+    KeyList keys;
     const Context context;
     Worker worker{mostWaiting};  // the last member: it uses the others
 };
