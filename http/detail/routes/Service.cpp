@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <exception>
 #include <new>
+#include <optional>
 #include <stdexcept>
 #include <string_view>
 #include <utility>
@@ -164,6 +165,15 @@ public:
         answering(call, [&] { letIn(call); });
     }
 
+    std::optional<Response> objection(const Request& head) override {
+        std::optional<Response> found;
+        Call call{head, PendingAnswer([&](Answer&& given) { found = std::get<Response>(given); },
+                                      context.metrics, routes().size())};
+        answering(call, [&] { enter(call); });
+        call.answer.withdraw();
+        return found;
+    }
+
     Response refusal(int status) const override {
         const ProblemKind kind = problemOf(status);
         return problemResponse(kind, textOf(kind));
@@ -195,17 +205,28 @@ private:
         WriteRecord(call).answer(call.answer, std::move(response));
     }
 
+    // Finds out what is asked for, by whom, and whether they may; false when that was answered.
+    bool enter(Call& call) {
+        const Request& request = call.request;
+        const std::string_view path = targetOf(request.target).path;
+        call.route = routeAt(path, methodOf(request));
+        access.requireOwnName(request);
+        if (call.route == nullptr) {
+            call.answer(otherMethod(path, request.method));
+            return false;
+        }
+        call.answer.belongsTo(static_cast<std::size_t>(call.route - routes().data()));
+        if (!call.route->isForAnyone) Access::requireOwnSite(request);
+        call.visitor = access.visitorOf(request);
+        access.requireRight(call.visitor, call.route->right);
+        return true;
+    }
+
     void letIn(Call& call) {
+        if (!enter(call)) return;
         const Request& request = call.request;
         const Target target = targetOf(request.target);
-        call.route = routeAt(target.path, methodOf(request));
-        access.requireOwnName(request);
-        if (call.route == nullptr) return call.answer(otherMethod(target.path, request.method));
         const Route& route = *call.route;
-        call.answer.belongsTo(static_cast<std::size_t>(call.route - routes().data()));
-        if (!route.isForAnyone) Access::requireOwnSite(request);
-        call.visitor = access.visitorOf(request);
-        access.requireRight(call.visitor, route.right);
         if (!route.isForAnyone && !target.query.empty()) {
             call.parameters = parsedQuery(target.query);
             requireKnown(route, call.parameters);
@@ -238,7 +259,8 @@ private:
             case ProblemKind::headersTooLarge:
                 return "The headers are too large.";
             case ProblemKind::unavailable:
-                return "There are too many connections or streams.";
+                return "There are too many connections or streams, or too much is kept for "
+                       "clients.";
             default:
                 return "The request can't be answered.";
         }
