@@ -33,6 +33,7 @@
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/console/Watches.hpp"
+#include "host/serving/DroppingBuffer.hpp"
 #include "host/serving/Serving.hpp"
 #include "host/serving/Termination.hpp"
 #include "host/sources/SourceLoader.hpp"
@@ -192,8 +193,13 @@ bool runServing(Session& session, const std::vector<std::string>& lines,
 }
 
 ExitCode runSession(const Options& options, const DeclareSettings& declare, Output& output) {
+    // Clients must not wait for whoever reads the log.
+    DroppingBuffer errors(STDERR_FILENO);
+    std::ostream records(&errors);
     std::optional<LogSink> logSink;
-    if (!options.logs.empty() || options.serving) logSink.emplace(std::cerr);
+    if (!options.logs.empty() || options.serving) {
+        logSink.emplace(options.serving ? records : std::cerr);
+    }
     for (const auto& log : options.logs) {
         common::DiagnosticLogger::enable(log.channel, log.severities);
     }

@@ -4,14 +4,18 @@
 
 namespace velkor::host {
 
-/// How a program that serves is ended: from now on SIGTERM does not end the process at once, and
-/// without a console neither does SIGINT. They are for the thread that makes it, since no other of
-/// the program takes signals. It is for the rest of the process: a second one, which may come while
-/// everything is released, changes nothing. Made once.
+/// How a program that serves is ended: from now on SIGTERM, SIGINT and SIGHUP, unless the last one
+/// is ignored, do not end the process at once but let it release everything. They are for the
+/// thread that makes it, since no other of the program takes signals. It is for the rest of the
+/// process: a second one, which may come meanwhile, changes nothing. Made once.
+///
+/// What takes longer than a second to be released, such as a large file that is being read for a
+/// client, is given up: the process ends then, with status 0.
 class Termination {
 public:
-    /// With a console, SIGTERM puts the end of all input in the place of standard input, and
-    /// interrupts what waits for it; SIGINT is the console's. Throws `std::system_error`.
+    /// With a console, the signals put the end of all input in the place of standard input, and
+    /// interrupt what waits for it; SIGINT does so unless a command of the console takes it, as
+    /// Ctrl-C. Throws `std::system_error`. A thread that waits for SIGINT stays with the process.
     explicit Termination(bool withConsole);
     Termination(const Termination&) = delete;
     Termination& operator=(const Termination&) = delete;

@@ -106,6 +106,10 @@ Future<bool> SqliteSource::committed() {
     return committer->queue().committed();
 }
 
+configuration::SourceState SqliteSource::state() const {
+    return committer->diskState();
+}
+
 std::vector<JournalEntry> SqliteSource::history(const std::string& keyOrPrefix, std::size_t limit) {
     return committer->stateFile().history(keyOrPrefix, limit);
 }

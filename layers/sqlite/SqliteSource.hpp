@@ -12,6 +12,7 @@
 #include "configuration/sources/DurableSource.hpp"
 #include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/JournaledSource.hpp"
+#include "configuration/sources/MonitoredSource.hpp"
 #include "framework/Future.hpp"
 #include "framework/common/Export.hpp"
 #include "layers/LiveSource.hpp"
@@ -51,7 +52,8 @@ class PreparedWrite;
 class VELKOR_EXPORT SqliteSource final : public LiveSource,
                                          public configuration::ForgettingSource,
                                          public configuration::DurableSource,
-                                         public configuration::JournaledSource {
+                                         public configuration::JournaledSource,
+                                         public configuration::MonitoredSource {
     struct Key {};
 
 public:
@@ -93,6 +95,9 @@ public:
     /// cause when some of them are refused, or when some were that this thread wrote since it last
     /// asked. Resolved on the thread of the source, with no mutex held; a continuation runs there.
     Future<bool> committed() override;
+
+    /// Well until the disk refuses a write, and again once it has taken one.
+    configuration::SourceState state() const override;
 
     /// At most `limit` writes that are on the disk, newest first: those of one key; with a prefix
     /// that ends in "." those of all keys that it begins; with an empty text all. Waits for the

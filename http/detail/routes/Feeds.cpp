@@ -152,8 +152,7 @@ std::unique_ptr<EventFeed> watchFeed(const std::shared_ptr<ConfigurationImpl>& s
 }
 
 std::unique_ptr<EventFeed> changeFeed(const std::shared_ptr<ConfigurationImpl>& store,
-                                      const std::string& prefix,
-                                      std::shared_ptr<Metrics> metrics) {
+                                      const std::string& prefix, std::shared_ptr<Metrics> metrics) {
     return std::make_unique<ChangeFeed>(store, prefix, std::move(metrics));
 }
 

@@ -12,9 +12,8 @@ namespace velkor::http::detail {
 /// The value of `key`, if there is one, and then the newest one after changes. Shares no store:
 /// the stream is over when the store goes. Values of secret keys are masked by what is secret when
 /// they are shown.
-std::unique_ptr<EventFeed> watchFeed(
-    const std::shared_ptr<configuration::ConfigurationImpl>& store, const std::string& key,
-    std::shared_ptr<Metrics> metrics);
+std::unique_ptr<EventFeed> watchFeed(const std::shared_ptr<configuration::ConfigurationImpl>& store,
+                                     const std::string& key, std::shared_ptr<Metrics> metrics);
 
 /// What changes from now on among the keys that `prefix` begins, the newest of each key; otherwise
 /// as above.

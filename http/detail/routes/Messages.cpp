@@ -89,8 +89,8 @@ void answerAddFile(const Context& context, Call& call) {
 }
 
 void answerUnknownType(const Context&, Call& call) {
-    throw Problem(ProblemKind::notFound, "Unknown message type: " +
-                                             std::string(messageTypePrefix) + call.argument);
+    throw Problem(ProblemKind::notFound,
+                  "Unknown message type: " + std::string(messageTypePrefix) + call.argument);
 }
 
 }  // namespace velkor::http::detail

@@ -35,8 +35,8 @@ struct PageOfKeys {
 // Those behind `cursor`, if there is one.
 PageOfKeys pageOf(const std::set<std::string>& all, const std::string& prefix,
                   const std::string* cursor, std::size_t limit) {
-    auto position = cursor == nullptr || *cursor < prefix ? all.lower_bound(prefix)
-                                                          : all.upper_bound(*cursor);
+    auto position =
+        cursor == nullptr || *cursor < prefix ? all.lower_bound(prefix) : all.upper_bound(*cursor);
     PageOfKeys page;
     for (; position != all.end() && beginsWith(*position, prefix); ++position) {
         if (page.keys.size() == limit) {
@@ -85,10 +85,9 @@ void writeItem(JsonWriter& json, const Option& option, const Declarations& decla
 
 Response optionPage(const Context& context, const Call& call) {
     const std::string* const prefix = find(call.parameters, "prefix");
-    const PageOfKeys page =
-        pageOf(context.store->keys().get(), prefix == nullptr ? std::string() : *prefix,
-               find(call.parameters, "cursor"),
-               limitOf(call.parameters, "limit", usualPage, largestPage));
+    const PageOfKeys page = pageOf(
+        context.store->keys().get(), prefix == nullptr ? std::string() : *prefix,
+        find(call.parameters, "cursor"), limitOf(call.parameters, "limit", usualPage, largestPage));
     const auto reading = context.store->read(page.keys).get();
     // Behind the reading: what is declared secret by then is not shown.
     const Declarations declarations = declarationsOf(settings::describe(context.store));

@@ -4,6 +4,7 @@
 #include <atomic>
 #include <exception>
 #include <new>
+#include <optional>
 #include <stdexcept>
 #include <string_view>
 #include <utility>
@@ -86,10 +87,9 @@ Response otherMethod(std::string_view path, const std::string& method) {
     if (allowed.empty()) {
         throw Problem(ProblemKind::notFound, "There is nothing at " + std::string(path));
     }
-    Response response =
-        method == "OPTIONS"
-            ? Response{204, {}, {}, {}}
-            : problemResponse(ProblemKind::methodNotAllowed, "Allowed here: " + allowed);
+    Response response = method == "OPTIONS" ? Response{204, {}, {}, {}}
+                                            : problemResponse(ProblemKind::methodNotAllowed,
+                                                              "Allowed here: " + allowed);
     response.headers.emplace_back("Allow", std::move(allowed));
     return response;
 }
@@ -117,6 +117,11 @@ std::string argumentOf(const Route& route, std::string_view path) {
     return *std::move(argument);
 }
 
+// The address without the port.
+std::string machineOf(const Client& client) {
+    return client.address.substr(0, client.address.rfind(':'));
+}
+
 /// Leads requests through access and routing to what answers them. Immutable but for the worker,
 /// so safe for concurrent use.
 class Service final : public Handler {
@@ -141,6 +146,21 @@ public:
         answering(call, [&] { letIn(call); });
     }
 
+    std::optional<Response> objection(const Request& head) override {
+        try {
+            access.requireOwnName(head);
+            const Target target = targetOf(head.target);
+            const Route* const route = routeAt(target.path, methodOf(head));
+            if (route == nullptr) return otherMethod(target.path, head.method);
+            requireAccess(*route, head);
+        } catch (const std::bad_alloc&) {
+            throw;
+        } catch (...) {
+            return problemResponse(std::current_exception());
+        }
+        return std::nullopt;
+    }
+
     Response refusal(int status) const override {
         const ProblemKind kind = problemOf(status);
         return problemResponse(kind, textOf(kind));
@@ -162,6 +182,12 @@ private:
         }
     }
 
+    // Who sends `request`, who may use `route`.
+    std::string requireAccess(const Route& route, const Request& request) const {
+        if (!route.isForAnyone) Access::requireOwnSite(request);
+        return access.requireRight(request, route.right);
+    }
+
     void letIn(Call& call) {
         const Request& request = call.request;
         access.requireOwnName(request);
@@ -169,8 +195,7 @@ private:
         const Route* const route = routeAt(target.path, methodOf(request));
         if (route == nullptr) return call.answer(otherMethod(target.path, request.method));
         call.answer.belongsTo(static_cast<std::size_t>(route - routes().data()));
-        if (!route->isForAnyone) Access::requireOwnSite(request);
-        call.who = access.requireRight(request, route->right);
+        call.who = requireAccess(*route, request);
         if (!route->isForAnyone && !target.query.empty()) {
             call.parameters = parsedQuery(target.query);
             requireKnown(*route, call.parameters);
@@ -186,12 +211,10 @@ private:
 
     void enqueue(const Route& route, Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
-        const bool isTaken = worker.post([this, &route, kept] {
+        const auto kind = route.right == Right::write ? Worker::Kind::write : Worker::Kind::read;
+        worker.post(kind, machineOf(kept->request.client), [this, &route, kept] {
             answering(*kept, [&] { route.handle(context, *kept); });
         });
-        if (!isTaken) {
-            kept->answer(problemResponse(ProblemKind::unavailable, "Too many requests wait."));
-        }
     }
 
     static std::string_view textOf(ProblemKind kind) {
@@ -205,7 +228,8 @@ private:
             case ProblemKind::headersTooLarge:
                 return "The headers are too large.";
             case ProblemKind::unavailable:
-                return "There are too many connections or streams.";
+                return "There are too many connections or streams, or too much is kept for "
+                       "clients.";
             default:
                 return "The request can't be answered.";
         }

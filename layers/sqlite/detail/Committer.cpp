@@ -121,6 +121,7 @@ void Committer::commit(const ChangeTable& changeTable) {
     } catch (...) {
         return refuse(changeTable, std::current_exception());
     }
+    disk.noteCommit();
     writes.finish();
 }
 
@@ -139,6 +140,7 @@ void Committer::begin(const ChangeTable& changeTable) {
 
 void Committer::refuse(const ChangeTable& changeTable, std::exception_ptr reason) {
     WriteQueue::Refusal refusal{std::move(reason)};
+    disk.noteRefusal(refusal.reason);
     report(refusal.reason);
     writes.postponeExpiry();
     untilDone([&] {

@@ -14,6 +14,7 @@
 #include "configuration/ConfigurationValue.hpp"
 #include "configuration/sources/ValueTable.hpp"
 #include "layers/sqlite/SqliteOptions.hpp"
+#include "layers/sqlite/detail/DiskHealth.hpp"
 #include "layers/sqlite/detail/StateFile.hpp"
 #include "layers/sqlite/detail/Write.hpp"
 #include "layers/sqlite/detail/WriteQueue.hpp"
@@ -68,6 +69,9 @@ public:
     WriteQueue& queue() noexcept { return writes; }
     StateFile& stateFile() noexcept { return file; }
 
+    /// Whether the disk took what was written last.
+    configuration::SourceState diskState() const { return disk.state(); }
+
 private:
     void commit(const ChangeTable& changeTable);
     void begin(const ChangeTable& changeTable);
@@ -77,6 +81,7 @@ private:
     const std::function<Time()> clock;
     StateFile file;
     WriteQueue writes;
+    DiskHealth disk;
     std::atomic<std::thread::id> runner{};
     bool alone = false;  // used by the thread in `run` alone
 };

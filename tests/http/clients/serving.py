@@ -17,13 +17,13 @@ class Server:
     """The program while it serves. What it says on standard error is kept in `errors`."""
 
     def __init__(self, *arguments, listen=("127.0.0.1:0",), stdin=subprocess.DEVNULL,
-                 preexec_fn=None):
+                 stderr=None, preexec_fn=None):
         command = [PROGRAM]
         for endpoint in listen:
             command += ["--listen", endpoint]
         self.errors = tempfile.TemporaryFile("w+")
         self.process = subprocess.Popen([*command, *arguments], stdin=stdin, text=True,
-                                        stdout=subprocess.PIPE, stderr=self.errors,
+                                        stdout=subprocess.PIPE, stderr=stderr or self.errors,
                                         preexec_fn=preexec_fn)
         self.urls = [self._next_url() for _ in listen]
         self.url = self.urls[0].rstrip("/")
@@ -52,8 +52,9 @@ class Server:
         self.process.kill()
         self.process.wait()
         self.process.stdout.close()
-        if self.process.stdin:
-            self.process.stdin.close()
+        for stream in [self.process.stdin, self.process.stderr]:
+            if stream:
+                stream.close()
         self.errors.close()
 
 

@@ -1,5 +1,7 @@
 """How serving begins and ends: refusals to start, signals, the console beside it."""
 
+import http.client
+import json
 import os
 import pty
 import resource
@@ -45,7 +47,9 @@ class RefusalTest(ServerTest):
     def test_endpoints_must_be_free_and_understood(self):
         self.assert_refused("no address to listen on", "--listen", "nowhere")
         with socket.create_server(("127.0.0.1", 0)) as taken:
-            self.assert_refused("can't listen", "--listen", str(taken.getsockname()[1]))
+            status, messages = start("--listen", str(taken.getsockname()[1]))
+        self.assertEqual(status, 1)
+        self.assertRegex(messages, r"^velkor-config: can't listen on 127\.0\.0\.1:\d+: .*\n$")
 
     def test_limits_must_make_sense(self):
         self.assert_refused("threads must be", "--listen", "0", "--listen-threads", "0")
@@ -82,6 +86,27 @@ class EndTest(ServerTest):
             server.process.send_signal(signal.SIGTERM)
             server.process.send_signal(signal.SIGINT)
         self.assertEqual(server.wait(), 0)
+
+    def test_a_log_that_nobody_reads_holds_nobody(self):
+        server = self.serve("--allow-writes", stderr=subprocess.PIPE)
+        body = json.dumps({"changes": [{"key": "k" * 900, "unset": True}]})
+        connection = http.client.HTTPConnection("127.0.0.1", server.port, timeout=PATIENCE)
+        self.addCleanup(connection.close)
+        for _ in range(200):
+            connection.request("PATCH", "/config", body)
+            response = connection.getresponse()
+            self.assertEqual((response.status, response.read())[0], 200)
+        self.assertEqual(server.end(), 0)
+
+    def test_a_hangup_ends_it_and_takes_its_socket_away(self):
+        for arguments in [(), ("--console",)]:
+            for by in [signal.SIGHUP, signal.SIGINT, signal.SIGTERM]:
+                with self.subTest(arguments=arguments, signal=by):
+                    path = os.path.join(self.folder, "socket")
+                    server = self.serve(*arguments, listen=("unix:" + path,),
+                                        stdin=subprocess.PIPE)
+                    self.assertEqual(server.end(by), 0)
+                    self.assertFalse(os.path.exists(path))
 
     def test_a_client_in_the_middle_of_a_request_holds_nothing(self):
         server = self.serve()
@@ -161,19 +186,27 @@ class ConsoleTest(ServerTest):
         server = self.serve("--console", stdin=subprocess.PIPE)
         self.assertEqual(server.end(), 0)
 
-    def test_sigterm_ends_it_on_a_terminal(self):
+    def test_signals_end_it_on_a_terminal(self):
+        for by in [signal.SIGTERM, signal.SIGHUP, signal.SIGINT]:
+            with self.subTest(signal=by):
+                self.check_end_on_a_terminal(by)
+
+    def check_end_on_a_terminal(self, by):
+        path = os.path.join(self.folder, "socket")
         terminal, other = pty.openpty()
         self.addCleanup(os.close, terminal)
-        process = subprocess.Popen([PROGRAM, "--listen", "0", "--console"], stdin=other,
-                                   stdout=other, stderr=subprocess.DEVNULL, start_new_session=True)
+        process = subprocess.Popen([PROGRAM, "--listen", "0", "--listen", "unix:" + path,
+                                    "--console"], stdin=other, stdout=other,
+                                   stderr=subprocess.DEVNULL, start_new_session=True)
         os.close(other)
         self.addCleanup(process.kill)
         shown = b""
         while b"velkor> " not in shown:
             shown += os.read(terminal, 4096)
         self.assertIn(b"Listening on http://127.0.0.1:", shown)
-        process.send_signal(signal.SIGTERM)
+        process.send_signal(by)
         self.assertEqual(process.wait(PATIENCE), 0)
+        self.assertFalse(os.path.exists(path))
 
 
 if __name__ == "__main__":

@@ -207,6 +207,35 @@ TEST_F(Commit, ThatIsRefusedStandsInTheLog) {
     EXPECT_THAT(log.messages(), ElementsAre(textOfRefusal("database or disk is full")));
 }
 
+TEST_F(Commit, ThatIsRefusedMakesTheSourceUnwell) {
+    const auto source = open();
+    disk.answerWrites(SQLITE_FULL);
+    source->set("a", 2);
+    EXPECT_NE(refusalOf(source->committed()), "");
+
+    const auto state = source->state();
+
+    EXPECT_FALSE(state.isWell);
+    EXPECT_TRUE(state.since);
+    EXPECT_EQ(state.lastError, textOfRefusal("database or disk is full"));
+}
+
+TEST_F(Commit, ThatIsTakenMakesTheSourceWellAgain) {
+    const auto source = open();
+    EXPECT_TRUE(source->state().isWell);
+    disk.answerWrites(SQLITE_FULL);
+    source->set("a", 2);
+    EXPECT_NE(refusalOf(source->committed()), "");
+    disk.answerWrites(SQLITE_OK);
+    source->set("a", 3);
+    source->committed().get();
+
+    const auto state = source->state();
+
+    EXPECT_TRUE(state.isWell);
+    EXPECT_EQ(state.lastError, textOfRefusal("database or disk is full"));
+}
+
 TEST_F(Commit, IsTriedAgainForLaterWrites) {
     const auto source = open();
     disk.answerWrites(SQLITE_FULL);
