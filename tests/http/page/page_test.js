@@ -109,8 +109,8 @@ test('a key is set, unset again, and its history tells both', async (t) => {
     await openDetails(tab, 'http.port');
     await tab.getByLabel('Type').selectOption('int');
     await setTo(tab, '8181');
-    await showsText(tab, '.done', 'Set in state.');
     await showsValue(tab, 'http.port', '8181');
+    await showsText(tab, '.done', 'Set in state.');
     await showsText(tab, '#details-layers', '8080');
 
     await tab.getByRole('button', { name: 'Unset in state' }).click();
@@ -177,6 +177,23 @@ test('the form follows its key, but never takes away what is being entered', asy
     assert.equal(await tab.getByLabel('Value', { exact: true }).inputValue(), 'Good day');
 });
 
+test('what is set here is no change meanwhile, even when it shows before the answer', async (t) => {
+    const { tab } = await openWritable(new Bench(t));
+    await openDetails(tab, 'http.motd');
+    let answered;
+    const said = new Promise((resolve) => { answered = resolve; });
+    await tab.route('**/config', async (route) => {
+        const response = await route.fetch();
+        await showsValue(tab, 'http.motd', 'Hello');
+        answered(await tab.locator('form.set').innerText());
+        await route.fulfill({ response });
+    });
+    await setTo(tab, 'Hello');
+    assert.doesNotMatch(await said, /meanwhile/);
+    await showsText(tab, '.done', 'Set in state.');
+    assert.equal(await tab.getByLabel('Value', { exact: true }).inputValue(), 'Hello');
+});
+
 test('checking a change leaves the store alone', async (t) => {
     const { tab } = await openWritable(new Bench(t));
     await openDetails(tab, 'http.motd');
@@ -199,6 +216,29 @@ test('a refused write shows what the server says, beside the field', async (t) =
     await showsText(tab, '#value-problem', detail);
     assert.equal(await tab.getByLabel('Value', { exact: true }).getAttribute('aria-invalid'), 'true');
     assert.equal(await row(tab, 'http.motd').getByRole('gridcell').nth(1).textContent(), 'Welcome');
+});
+
+test('what the process has declared of a key is shown, and that it does not take a value', async (t) => {
+    const bench = new Bench(t);
+    const tab = await bench.open(await bench.serveDeclared());
+    assert.match(await row(tab, 'http.port').getByRole('gridcell').nth(3).textContent(), /65535/);
+    await openDetails(tab, 'http.port');
+    await showsText(tab, '#details-about', 'Where clients connect');
+    await setTo(tab, '70000');
+    await showsText(tab, '#details-setting', 'Not taken by the process: ');
+    assert.deepEqual(await flaws(tab), []);
+});
+
+test('a secret is set without being shown', async (t) => {
+    const bench = new Bench(t);
+    const tab = await bench.open(await bench.serveDeclared());
+    await showsValue(tab, 'db.password', 'secret');
+    await openDetails(tab, 'db.password');
+    assert.equal(await tab.getByLabel('Value', { exact: true }).inputValue(), '');
+    assert.equal(await tab.getByLabel('Value', { exact: true }).getAttribute('type'), 'password');
+    await setTo(tab, 'entirely new');
+    await showsText(tab, '.done', 'Set in ');
+    assert.doesNotMatch(await tab.locator('body').innerText(), /entirely new|hidden from all/);
 });
 
 test('where nothing may be written nothing can be entered', async (t) => {

@@ -22,10 +22,15 @@ export class Server {
     #process;
     #ended;
 
-    static async start(args, port = 0) {
+    static start(args, port = 0) {
+        return Server.run(process.env.VELKOR_CONFIG_PROGRAM,
+            ['--listen', `127.0.0.1:${port}`, '--log', 'velkor::http=fatal,error', ...args]);
+    }
+
+    /// Runs `program`, which says where it listens.
+    static async run(program, args) {
         const server = new Server();
-        server.#process = spawn(process.env.VELKOR_CONFIG_PROGRAM,
-            ['--listen', `127.0.0.1:${port}`, '--log', 'velkor::http=fatal,error', ...args], { stdio: ['ignore', 'pipe', 'inherit'] });
+        server.#process = spawn(program, args, { stdio: ['pipe', 'pipe', 'inherit'] });
         server.#ended = new Promise((resolve) => server.#process.once('exit', resolve));
         for await (const line of createInterface(server.#process.stdout)) {
             server.url = line.replace('Listening on ', '');
@@ -75,6 +80,13 @@ export class Bench {
 
     async serve(args, port) {
         const server = await Server.start(args, port);
+        this.#test.after(() => server.stop());
+        return server;
+    }
+
+    /// A process that has declared settings.
+    async serveDeclared() {
+        const server = await Server.run(process.env.VELKOR_DECLARING_PROGRAM, []);
         this.#test.after(() => server.stop());
         return server;
     }
