@@ -4,6 +4,7 @@
 #include <atomic>
 #include <exception>
 #include <new>
+#include <optional>
 #include <stdexcept>
 #include <string_view>
 #include <utility>
@@ -147,6 +148,21 @@ public:
         answering(call, [&] { letIn(call); });
     }
 
+    std::optional<Response> objection(const Request& head) override {
+        try {
+            access.requireOwnName(head);
+            const Target target = targetOf(head.target);
+            const Route* const route = routeAt(target.path, methodOf(head));
+            if (route == nullptr) return otherMethod(target.path, head.method);
+            requireAccess(*route, head);
+        } catch (const std::bad_alloc&) {
+            throw;
+        } catch (...) {
+            return problemResponse(std::current_exception());
+        }
+        return std::nullopt;
+    }
+
     Response refusal(int status) const override {
         const ProblemKind kind = problemOf(status);
         return problemResponse(kind, textOf(kind));
@@ -168,6 +184,12 @@ private:
         }
     }
 
+    // Who sends `request`, who may use `route`.
+    std::string requireAccess(const Route& route, const Request& request) const {
+        if (!route.isForAnyone) Access::requireOwnSite(request);
+        return access.requireRight(request, route.right);
+    }
+
     void letIn(Call& call) {
         const Request& request = call.request;
         access.requireOwnName(request);
@@ -175,8 +197,7 @@ private:
         const Route* const route = routeAt(target.path, methodOf(request));
         if (route == nullptr) return call.answer(otherMethod(target.path, request.method));
         call.answer.belongsTo(static_cast<std::size_t>(route - routes().data()));
-        if (!route->isForAnyone) Access::requireOwnSite(request);
-        call.who = access.requireRight(request, route->right);
+        call.who = requireAccess(*route, request);
         if (!route->isForAnyone && !target.query.empty()) {
             call.parameters = parsedQuery(target.query);
             requireKnown(*route, call.parameters);
@@ -209,7 +230,8 @@ private:
             case ProblemKind::headersTooLarge:
                 return "The headers are too large.";
             case ProblemKind::unavailable:
-                return "There are too many connections or streams.";
+                return "There are too many connections or streams, or too much is kept for "
+                       "clients.";
             default:
                 return "The request can't be answered.";
         }

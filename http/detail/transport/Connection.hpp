@@ -35,6 +35,7 @@ public:
                Limits::Place&& givenPlace)
         : loop(servingLoop),
           shared(std::move(sharedByAll)),
+          share(shared->budget),
           client{arrival.from.clientText(), arrival.secure},
           place(std::move(givenPlace)),
           isWelcome(place),
@@ -63,6 +64,7 @@ public:
         if (std::exchange(phase, Phase::ended) == Phase::ended) return;
         feed.reset();
         wire.close();
+        share.take(0);
         streamPlace.reset();
         place.reset();
         loop.forget(*this);
@@ -97,6 +99,9 @@ private:
 
     // For a client to go once it has been told so.
     static constexpr Milliseconds leaveTime{2000};
+
+    // After which it is looked whether there is room for an event.
+    static constexpr Milliseconds roomTime{100};
 
     // Beyond this size a body is written by itself rather than copied.
     static constexpr std::size_t mostCopied = std::size_t{16} << 10U;
@@ -152,8 +157,25 @@ private:
             case RequestParser::State::complete:
                 return answer();
             case RequestParser::State::incomplete:
-                return parser.takeExpectation() ? invite() : read();
+                return readMore();
         }
+    }
+
+    // Reads on if there is nothing against the request so far.
+    void readMore() {
+        RequestParser& parser = reading->parser;
+        if (const Request* const head = parser.takeHead()) {
+            if (auto objection = shared->handler->objection(*head)) {
+                staysOpen = false;
+                return send(std::move(*objection));
+            }
+        }
+        if (!share.tryTake(parser.bodySize())) {
+            ++counts().answersRefused;
+            return refuse(503);
+        }
+        if (parser.takeExpectation()) return invite();
+        read();
     }
 
     void read() {
@@ -213,6 +235,10 @@ private:
     }
 
     void send(Response&& response) {
+        if (!share.tryTake(isHead ? 0 : response.body.size())) {
+            ++counts().answersRefused;
+            return send(shared->handler->refusal(503));
+        }
         const Staying kept = isOld ? Staying::said : Staying::usual;
         std::string text = headOf(response, staysOpen ? kept : Staying::none, loop.date());
         if (!isHead && response.body.size() <= mostCopied) {
@@ -260,9 +286,16 @@ private:
     }
 
     void showNext() {
+        share.take(0);
+        waitsForRoom = !shared->budget.hasRoom();
+        if (waitsForRoom) {
+            phase = Phase::streaming;
+            return expireAfter(roomTime);
+        }
         std::optional<std::string> event = feed->next();
         if (event) {
             ++counts().eventsWritten;
+            share.take(event->size());
             return showText(std::move(*event));
         }
         if (feed->isOver()) {
@@ -340,6 +373,7 @@ private:
                 wire.cancel();
                 return refuse(408);
             case Phase::streaming:
+                if (waitsForRoom) return showNext();
                 return showText(": \n\n");
             case Phase::sending:
             case Phase::showing:
@@ -352,6 +386,7 @@ private:
 
     Loop& loop;
     const std::shared_ptr<Shared> shared;
+    Budget::Share share;  // of the bytes of the present request, answer or event
     const Client client;
     Limits::Place place;
     const bool isWelcome;
@@ -359,6 +394,7 @@ private:
     bool staysOpen = false;
     bool isHead = false;  // of the present request
     bool isOld = false;
+    bool waitsForRoom = false;  // of a stream: for that of its next event
     Wire wire;
     std::unique_ptr<Reading> reading;
     std::string unwritten;

@@ -23,6 +23,7 @@ void checkLimits(const ServerOptions& options) {
     const std::pair<const char*, long long> limits[] = {
         {"maxHeaderBytes", static_cast<long long>(options.maxHeaderBytes)},
         {"maxBodyBytes", static_cast<long long>(options.maxBodyBytes)},
+        {"maxBufferedBytes", static_cast<long long>(options.maxBufferedBytes)},
         {"maxJsonDepth", static_cast<long long>(options.maxJsonDepth)},
         {"maxJsonContainers", static_cast<long long>(options.maxJsonContainers)},
         {"requestTimeout", options.requestTimeout.count()},

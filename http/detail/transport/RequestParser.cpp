@@ -42,6 +42,7 @@ public:
     Request request;
     bool isOld = false;
     bool isExpected = false;  // the client waits for "100 Continue"
+    bool isHeadTaken = false;
 
 private:
     void on_request_impl(beast::http::verb /*verb*/, beast::string_view method,
@@ -185,6 +186,16 @@ bool RequestParser::takeExpectation() noexcept {
     Message& message = *reading->message;
     const bool hasBegun = !message.request.body.empty();
     return message.is_header_done() && std::exchange(message.isExpected, false) && !hasBegun;
+}
+
+const Request* RequestParser::takeHead() noexcept {
+    Message& message = *reading->message;
+    const bool isNew = message.is_header_done() && !std::exchange(message.isHeadTaken, true);
+    return isNew ? &message.request : nullptr;
+}
+
+std::size_t RequestParser::bodySize() const noexcept {
+    return reading->message->request.body.size();
 }
 
 bool RequestParser::keepsAlive() const noexcept {

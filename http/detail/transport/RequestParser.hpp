@@ -40,6 +40,13 @@ public:
     /// Whether the client waits for "100 Continue" before it sends the body. Says so once.
     bool takeExpectation() noexcept;
 
+    /// The request as far as it has been read, once its head has been; null before, and when it has
+    /// been given already. Its client is missing.
+    const Request* takeHead() noexcept;
+
+    /// Bytes of the body so far.
+    std::size_t bodySize() const noexcept;
+
     /// Of a complete request: whether the connection may stay open, and whether it asks for no
     /// body.
     bool keepsAlive() const noexcept;
