@@ -135,7 +135,9 @@ TEST_F(RoutingTest, HasATextForWhatTheTransportRefuses) {
         {408, "408 /problems/timeout The request was not complete in time."},
         {413, "413 /problems/too-large The body is too large."},
         {431, "431 /problems/headers-too-large The headers are too large."},
-        {503, "503 /problems/unavailable There are too many connections or streams."}};
+        {503,
+         "503 /problems/unavailable There are too many connections or streams, or too much is kept "
+         "for clients."}};
     for (const auto& [status, text] : cases) {
         EXPECT_EQ(problemIn(service().refusal(status)), text);
     }
