@@ -94,7 +94,7 @@ Response ready(const Context& context, const Call&) {
 Response metricsText(const Context& context, const Call&) {
     std::string text;
     writeMetric(text, "velkor_keys", "gauge", "Keys of the store.",
-                context.store->keys().get().size());
+                context.keys.of(*context.store)->size());
     writeLayers(context, text);
     context.metrics->writeRequests(text);
     writeValues(*context.metrics, text);

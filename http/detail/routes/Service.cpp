@@ -135,6 +135,8 @@ public:
           context{store,
                   options,
                   access,
+                  keys,
+                  std::make_shared<ChangeHub>(),
                   metricsOfRoutes(),
                   std::move(counts),
                   messageService.dispatcherFor(messages::allRequestTypes()),
@@ -238,6 +240,7 @@ private:
     const ServerOptions options;
     const Access access;
     const messages::MessageService messageService;
+    KeyList keys;
     const Context context;
     Worker worker{mostWaiting};  // the last member: it uses the others
 };

@@ -90,12 +90,9 @@ TEST_F(PatchTest, MasksSecrets) {
     }
 }
 
-TEST_F(PatchTest, TakesKeysOfAnyBytes) {
-    EXPECT_EQ(patch("{\"key\":\"a\xFF\",\"value\":{\"type\":\"int\",\"value\":1}}").body,
-              R"({"dryRun":false,"changes":[{"key":"a)"
-              "\xEF\xBF\xBD"
-              R"(","href":"/config/a%FF","source":"override"}]})");
-    EXPECT_TRUE(store->has("a\xFF").get());
+TEST_F(PatchTest, RefusesBodiesThatAreNoUtf8) {
+    EXPECT_EQ(patch("{\"key\":\"a\xC3(\",\"value\":{\"type\":\"int\",\"value\":1}}").status, 400);
+    EXPECT_TRUE(store->keys().get().empty());
 }
 
 TEST_F(PatchTest, WaitsForTheLayersThatItWroteAndNotForTheWorker) {
@@ -240,7 +237,6 @@ TEST(ChangeRequest, RefusesValuesThatAreNotOfTheirType) {
                                                                  {"int", "null"},
                                                                  {"int", "[1]"},
                                                                  {"int", "{}"},
-                                                                 {"int", "99999999999999999999"},
                                                                  {"uint", "-1"},
                                                                  {"uint", "4294967296"},
                                                                  {"double", R"("0.5")"},
@@ -251,7 +247,7 @@ TEST(ChangeRequest, RefusesValuesThatAreNotOfTheirType) {
                                                                  {"string", "null"},
                                                                  {"string", "{}"},
                                                                  {"ustring", "5"},
-                                                                 {"ustring", "\"\xFF\""},
+                                                                 {"ustring", "[]"},
                                                                  {"intArray", "1"},
                                                                  {"intArray", R"([1,"2"])"},
                                                                  {"intArray", "[null]"},
