@@ -80,13 +80,14 @@ Response alive(const Context&, const Call&) {
     return plainText(200, "alive\n");
 }
 
-Response ready(const Context& context, const Call&) {
+Response ready(const Context& context, const Call& call) {
     std::string names;
     forEachSource(context, [&](const SourceDescription& layer, ConfigurationSource& source) {
         if (!isWell(source)) names += (names.empty() ? "" : ", ") + layer.name;
     });
     if (names.empty()) return plainText(200, "ready\n");
-    Response response = plainText(503, "not ready: " + names + "\n");
+    const bool mayKnow = call.visitor.right >= Right::read;
+    Response response = plainText(503, mayKnow ? "not ready: " + names + "\n" : "not ready\n");
     response.headers.emplace_back("Retry-After", "1");
     return response;
 }

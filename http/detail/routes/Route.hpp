@@ -34,13 +34,16 @@ struct Context {
     messages::JsonLimits jsonLimits;
 };
 
-/// One request that has been let in.
+struct Route;
+
+/// One request.
 struct Call {
     Request request;
     PendingAnswer answer;
     Parameters parameters{};
     std::string argument{};  ///< What the path says behind that of the route, decoded.
-    std::string who{};       ///< See `Access::requireRight`.
+    Visitor visitor{};
+    const Route* route = nullptr;  ///< Null while it is not known, and where there is none.
 };
 
 /// Where a route is worked on.

@@ -171,11 +171,35 @@ TEST_F(PatchTest, LeavesARecordOfKeysAndNoValues) {
     patch(set("a", 77), "?dry-run");
     patch(R"({"key":"c","unset":true,"source":"x"})");
     patch("{}");
+    patch(R"({"key":"d","unset":true,"source":"x"})", "?dry-run");
     EXPECT_EQ(log.messages(),
               (std::vector<std::string>{
                   "write: PATCH /config by anybody from 127.0.0.1:50312: a, b -> 200",
-                  "write: PATCH /config by anybody from 127.0.0.1:50312: c -> 409"}));
+                  "write: PATCH /config by anybody from 127.0.0.1:50312: c -> 409",
+                  "write: PATCH /config by anybody from 127.0.0.1:50312 -> 400",
+                  "write: PATCH /config by anybody from 127.0.0.1:50312 -> 409"}));
     EXPECT_EQ(log.records().front().severity, common::warning);
+}
+
+TEST_F(PatchTest, RefusesAKeyThatIsGivenTwice) {
+    EXPECT_EQ(problemIn(patch(set("a", 1) + "," + set("b", 1) + "," + set("a", 2))),
+              "400 /problems/bad-request A key is given twice: a");
+    EXPECT_FALSE(store->has("a").get());
+}
+
+TEST_F(PatchTest, RefusesTheMaskOfASecret) {
+    const auto setMask = [&](const std::string& key, const std::string& type) {
+        return problemIn(
+            patch(R"({"key":")" + key + R"(","value":{"type":")" + type + R"(","value":"•••"}})"));
+    };
+    const settings::Setting<std::string> secret(store, "password", "d", settings::secret());
+    for (const char* const type : {"string", "ustring"}) {
+        EXPECT_EQ(setMask("password", type),
+                  "400 /problems/bad-request The value is what is shown in the place of a secret: "
+                  "password");
+        EXPECT_EQ(setMask("other", type).substr(0, 3), "200");
+    }
+    EXPECT_FALSE(store->has("password").get());
 }
 
 TEST_F(PatchTest, CutsLongRecords) {

@@ -85,6 +85,16 @@ TEST_F(RoutingTest, RefusesWhatIsNotEncodedRight) {
               "400 /problems/bad-request The path is not percent-encoded right.");
 }
 
+TEST_F(RoutingTest, CutsWhatProblemsRepeat) {
+    const std::string problem = problemIn(get("/" + std::string(289, 'a') + "\xC3\xA4" + "b"));
+    EXPECT_EQ(problem.size(), std::string("404 /problems/not-found ").size() + 300 + 3 - 1 + 0);
+    EXPECT_EQ(problem.substr(problem.size() - 4), "a...");
+    EXPECT_LT(
+        message("ConfigurationSet", R"({"key":")" + std::string(9999, 'k') + R"(","source":"x"})")
+            .body.size(),
+        500U);
+}
+
 TEST_F(RoutingTest, SendsThePageWithItsHeaders) {
     const Response page = get("/");
     EXPECT_EQ(page.status, 200);
@@ -99,7 +109,9 @@ TEST_F(RoutingTest, HasATextForWhatTheTransportRefuses) {
         {408, "408 /problems/timeout The request was not complete in time."},
         {413, "413 /problems/too-large The body is too large."},
         {431, "431 /problems/headers-too-large The headers are too large."},
-        {503, "503 /problems/unavailable There are too many connections or streams."}};
+        {503,
+         "503 /problems/unavailable There are too many connections or streams, or too much is kept "
+         "for clients."}};
     for (const auto& [status, text] : cases) {
         EXPECT_EQ(problemIn(service().refusal(status)), text);
     }
