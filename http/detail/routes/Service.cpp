@@ -166,11 +166,12 @@ public:
     }
 
     std::optional<Response> objection(const Request& head) override {
-        if (isAllowed(head)) return std::nullopt;
-        // As a whole request is refused: at once, counted, and with a record.
-        const auto given = std::make_shared<Answer>(refusal(503));
-        handle(Request(head), [given](Answer&& answer) { *given = std::move(answer); });
-        return std::get<Response>(std::move(*given));
+        std::optional<Response> found;
+        Call call{head, PendingAnswer([&](Answer&& given) { found = std::get<Response>(given); },
+                                      context.metrics, routes().size())};
+        answering(call, [&] { enter(call); });
+        call.answer.withdraw();
+        return found;
     }
 
     Response refusal(int status) const override {
@@ -194,21 +195,6 @@ private:
         }
     }
 
-    // Whether `letIn` would go beyond access.
-    bool isAllowed(const Request& request) const {
-        try {
-            const Target target = targetOf(request.target);
-            access.requireOwnName(request);
-            const Route* const route = routeAt(target.path, methodOf(request));
-            if (route == nullptr) return false;
-            if (!route->isForAnyone) Access::requireOwnSite(request);
-            access.requireRight(access.visitorOf(request), route->right);
-            return true;
-        } catch (const Problem&) {
-            return false;
-        }
-    }
-
     // Attempts to write leave a record as well.
     void refuse(Call& call, Response&& response) {
         const bool isWrite = call.route != nullptr && call.route->right == Right::write;
@@ -219,17 +205,28 @@ private:
         WriteRecord(call).answer(call.answer, std::move(response));
     }
 
+    // Finds out what is asked for, by whom, and whether they may; false when that was answered.
+    bool enter(Call& call) {
+        const Request& request = call.request;
+        const std::string_view path = targetOf(request.target).path;
+        call.route = routeAt(path, methodOf(request));
+        access.requireOwnName(request);
+        if (call.route == nullptr) {
+            call.answer(otherMethod(path, request.method));
+            return false;
+        }
+        call.answer.belongsTo(static_cast<std::size_t>(call.route - routes().data()));
+        if (!call.route->isForAnyone) Access::requireOwnSite(request);
+        call.visitor = access.visitorOf(request);
+        access.requireRight(call.visitor, call.route->right);
+        return true;
+    }
+
     void letIn(Call& call) {
+        if (!enter(call)) return;
         const Request& request = call.request;
         const Target target = targetOf(request.target);
-        call.route = routeAt(target.path, methodOf(request));
-        access.requireOwnName(request);
-        if (call.route == nullptr) return call.answer(otherMethod(target.path, request.method));
         const Route& route = *call.route;
-        call.answer.belongsTo(static_cast<std::size_t>(call.route - routes().data()));
-        if (!route.isForAnyone) Access::requireOwnSite(request);
-        call.visitor = access.visitorOf(request);
-        access.requireRight(call.visitor, route.right);
         if (!route.isForAnyone && !target.query.empty()) {
             call.parameters = parsedQuery(target.query);
             requireKnown(route, call.parameters);
