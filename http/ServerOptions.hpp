@@ -71,7 +71,7 @@ struct ServerOptions {
     std::chrono::milliseconds commentInterval{15'000};
 
     /// Open connections in all, and from one address (an IPv6 network of 64 bits counts as one,
-    /// unix sockets do not count): more are answered with 503.
+    /// as does 127.0.0.0/8; unix sockets do not count): more are answered with 503.
     std::size_t maxConnections = 2'000;
     std::size_t maxConnectionsPerAddress = 1'100;
 

@@ -165,7 +165,9 @@ private:
     void readMore() {
         RequestParser& parser = reading->parser;
         if (const Request* const head = parser.takeHead()) {
-            if (auto objection = shared->handler->objection(*head)) {
+            Request known = *head;
+            known.client = client;
+            if (auto objection = shared->handler->objection(known)) {
                 staysOpen = false;
                 return send(std::move(*objection));
             }
