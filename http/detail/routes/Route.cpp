@@ -23,8 +23,8 @@ void watchKey(const Context& context, Call& call) {
 
 void watchPrefix(const Context& context, Call& call) {
     const std::string* const prefix = find(call.parameters, "prefix");
-    call.answer(
-        changeFeed(context.store, prefix == nullptr ? std::string() : *prefix, context.metrics));
+    call.answer(changeFeed(context.store, prefix == nullptr ? std::string() : *prefix,
+                           context.changes, context.metrics));
 }
 
 std::vector<Route> allRoutes() {

@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <atomic>
+#include <chrono>
+#include <cstdint>
 #include <exception>
 #include <new>
 #include <optional>
@@ -16,6 +18,7 @@
 #include "http/detail/routes/Problem.hpp"
 #include "http/detail/routes/Route.hpp"
 #include "http/detail/routes/Worker.hpp"
+#include "http/detail/routes/WriteRecord.hpp"
 
 namespace velkor::http::detail {
 
@@ -122,6 +125,20 @@ std::string machineOf(const Client& client) {
     return client.address.substr(0, client.address.rfind(':'));
 }
 
+/// Keeps the records of those who have no right at all from filling the log: one a second.
+class Strangers {
+public:
+    bool mayBeNoted() noexcept {
+        using std::chrono::steady_clock;
+        const auto now = std::chrono::duration_cast<std::chrono::seconds>(
+            steady_clock::now().time_since_epoch());
+        return last.exchange(now.count()) != now.count();
+    }
+
+private:
+    std::atomic<std::int64_t> last{0};
+};
+
 /// Leads requests through access and routing to what answers them. Immutable but for the worker,
 /// so safe for concurrent use.
 class Service final : public Handler {
@@ -135,6 +152,8 @@ public:
           context{store,
                   options,
                   access,
+                  keys,
+                  std::make_shared<ChangeHub>(),
                   metricsOfRoutes(),
                   std::move(counts),
                   messageService.dispatcherFor(messages::allRequestTypes()),
@@ -147,18 +166,12 @@ public:
     }
 
     std::optional<Response> objection(const Request& head) override {
-        try {
-            access.requireOwnName(head);
-            const Target target = targetOf(head.target);
-            const Route* const route = routeAt(target.path, methodOf(head));
-            if (route == nullptr) return otherMethod(target.path, head.method);
-            requireAccess(*route, head);
-        } catch (const std::bad_alloc&) {
-            throw;
-        } catch (...) {
-            return problemResponse(std::current_exception());
-        }
-        return std::nullopt;
+        std::optional<Response> found;
+        Call call{head, PendingAnswer([&](Answer&& given) { found = std::get<Response>(given); },
+                                      context.metrics, routes().size())};
+        answering(call, [&] { enter(call); });
+        call.answer.withdraw();
+        return found;
     }
 
     Response refusal(int status) const override {
@@ -170,51 +183,69 @@ public:
 
 private:
     // Runs `work`, and answers with what it throws. Without memory the answer is that of a request
-    // that was given up.
+    // that had no turn.
     template <class Work>
-    static void answering(Call& call, Work&& work) {
+    void answering(Call& call, Work&& work) {
         try {
             work();
         } catch (const std::bad_alloc&) {
             return;
         } catch (...) {
-            call.answer(problemResponse(std::current_exception()));
+            refuse(call, problemResponse(std::current_exception()));
         }
     }
 
-    // Who sends `request`, who may use `route`.
-    std::string requireAccess(const Route& route, const Request& request) const {
-        if (!route.isForAnyone) Access::requireOwnSite(request);
-        return access.requireRight(request, route.right);
+    // Attempts to write leave a record as well.
+    void refuse(Call& call, Response&& response) {
+        const bool isWrite = call.route != nullptr && call.route->right == Right::write;
+        const bool isKnown = call.visitor.right != Right::none;
+        if (!isWrite || (!isKnown && !strangers.mayBeNoted())) {
+            return call.answer(std::move(response));
+        }
+        WriteRecord(call).answer(call.answer, std::move(response));
+    }
+
+    // Finds out what is asked for, by whom, and whether they may; false when that was answered.
+    bool enter(Call& call) {
+        const Request& request = call.request;
+        const std::string_view path = targetOf(request.target).path;
+        call.route = routeAt(path, methodOf(request));
+        access.requireOwnName(request);
+        if (call.route == nullptr) {
+            call.answer(otherMethod(path, request.method));
+            return false;
+        }
+        call.answer.belongsTo(static_cast<std::size_t>(call.route - routes().data()));
+        if (!call.route->isForAnyone) Access::requireOwnSite(request);
+        call.visitor = access.visitorOf(request);
+        access.requireRight(call.visitor, call.route->right);
+        return true;
     }
 
     void letIn(Call& call) {
+        if (!enter(call)) return;
         const Request& request = call.request;
-        access.requireOwnName(request);
         const Target target = targetOf(request.target);
-        const Route* const route = routeAt(target.path, methodOf(request));
-        if (route == nullptr) return call.answer(otherMethod(target.path, request.method));
-        call.answer.belongsTo(static_cast<std::size_t>(route - routes().data()));
-        call.who = requireAccess(*route, request);
-        if (!route->isForAnyone && !target.query.empty()) {
+        const Route& route = *call.route;
+        if (!route.isForAnyone && !target.query.empty()) {
             call.parameters = parsedQuery(target.query);
-            requireKnown(*route, call.parameters);
+            requireKnown(route, call.parameters);
         }
-        call.argument = argumentOf(*route, target.path);
-        if (route->isStream && request.method == "HEAD") {
+        call.argument = argumentOf(route, target.path);
+        if (route.isStream && request.method == "HEAD") {
             return call.answer(Response{200, "text/event-stream", {}, {}});
         }
-        const bool isLight = route->place == Place::caller && request.body.size() <= smallBody;
-        if (isLight) return route->handle(context, call);
-        enqueue(*route, call);
+        const bool isLight = route.place == Place::caller && request.body.size() <= smallBody;
+        if (isLight) return route.handle(context, call);
+        enqueue(call);
     }
 
-    void enqueue(const Route& route, Call& call) {
+    void enqueue(Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
-        const auto kind = route.right == Right::write ? Worker::Kind::write : Worker::Kind::read;
-        worker.post(kind, machineOf(kept->request.client), [this, &route, kept] {
-            answering(*kept, [&] { route.handle(context, *kept); });
-        });
+        const bool isWrite = kept->route->right == Right::write;
+        worker.post(
+            isWrite ? Worker::Kind::write : Worker::Kind::read, machineOf(kept->request.client),
+            [this, kept] { answering(*kept, [&] { kept->route->handle(context, *kept); }); });
     }
 
     static std::string_view textOf(ProblemKind kind) {
@@ -238,6 +269,8 @@ private:
     const ServerOptions options;
     const Access access;
     const messages::MessageService messageService;
+    KeyList keys;
+    Strangers strangers;
     const Context context;
     Worker worker{mostWaiting};  // the last member: it uses the others
 };

@@ -1,9 +1,15 @@
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <memory>
 #include <string>
+#include <vector>
 
+#include "configuration/sources/MonitoredSource.hpp"
 #include "http/Refused.hpp"
 #include "tests/http/routes/ServiceTesting.hpp"
+#include "tests/support/HookedSource.hpp"
+#include "tests/support/LogCapture.hpp"
 #include "tests/support/TemporaryFile.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -11,11 +17,18 @@ namespace velkor::http::detail {
 namespace {
 
 using velkor::testing::Headers;
+using velkor::testing::LogCapture;
 using velkor::testing::problemIn;
 using velkor::testing::TemporaryFile;
 using velkor::testing::thrownText;
 
 constexpr const char* change = R"({"changes":[{"key":"k","value":{"type":"int","value":1}}]})";
+
+class UnwellSource final : public velkor::testing::HookedSource,
+                           public configuration::MonitoredSource {
+public:
+    configuration::SourceState state() const override { return {false}; }
+};
 
 class AccessTest : public velkor::testing::ServiceTest {
 protected:
@@ -166,6 +179,37 @@ TEST_F(TokenAccessTest, SaysWhetherTheClientMayWrite) {
     };
     EXPECT_EQ(mayWrite("www"), R"({"mayWrite":true,)");
     EXPECT_EQ(mayWrite("rrr"), R"({"mayWrite":false)");
+}
+
+TEST_F(TokenAccessTest, NamesTheLayersThatAreNotWellToReadersOnly) {
+    const auto source = std::make_shared<UnwellSource>();
+    store->addSource("sick", "", 1, true, source).get();
+    EXPECT_EQ(get("/readyz").body, "not ready\n");
+    EXPECT_EQ(get("/readyz", bearer("x")).body, "not ready\n");
+    EXPECT_EQ(get("/readyz", bearer("rrr")).body, "not ready: sick\n");
+}
+
+TEST_F(TokenAccessTest, LeavesARecordOfThoseWhoMayNotWrite) {
+    const LogCapture log("velkor::http");
+    patchWith(bearer("rrr"));
+    patchWith(bearer("rrr"));
+    EXPECT_EQ(log.messages(), (std::vector<std::string>{
+                                  "write: PATCH /config by token 1 from 127.0.0.1:50312 -> 403",
+                                  "write: PATCH /config by token 1 from 127.0.0.1:50312 -> 403"}));
+}
+
+TEST_F(TokenAccessTest, LeavesFewRecordsOfThoseWhoMayDoNothing) {
+    const LogCapture log("velkor::http");
+    const auto begin = std::chrono::steady_clock::now();
+    for (int i = 0; i < 50; ++i) patchWith({});
+    for (int i = 0; i < 50; ++i) patchWith({{"origin", "http://example.org"}});
+    get("/config");
+    const auto elapsed =
+        std::chrono::duration_cast<std::chrono::seconds>(std::chrono::steady_clock::now() - begin);
+    EXPECT_LE(log.messages().size(), static_cast<std::size_t>(elapsed.count()) + 2);
+    ASSERT_FALSE(log.messages().empty());
+    EXPECT_EQ(log.messages().front(),
+              "write: PATCH /config by nobody known from 127.0.0.1:50312 -> 401");
 }
 
 TEST_F(AccessTest, RefusesToStartWithoutTheTokensThatAreNamed) {

@@ -225,9 +225,45 @@ TEST_F(FeedsTest, ShowTheNewestOfEachKeyToASlowReader) {
                "\",\"value\":{\"type\":\"int\",\"value\":" + std::to_string(value) +
                "},\"source\":\"override\"}\n\n";
     };
-    // The first one was handed over before the others came.
-    EXPECT_EQ(events,
-              (std::vector<std::string>{change("n.a", 1), change("n.b", 9), change("n.a", 9)}));
+    EXPECT_EQ(events, (std::vector<std::string>{change("n.a", 9), change("n.b", 9)}));
+}
+
+TEST_F(FeedsTest, GiveUpAReaderThatLeavesTooManyKeysWaiting) {
+    const auto slow = started("/changes");
+    const auto other = started("/changes?prefix=other");
+    for (int i = 0; i < 1000; ++i) store->set("k" + std::to_string(i), 1).get();
+    EXPECT_FALSE(slow->isOver());
+    store->set("k0", 2).get();
+    EXPECT_NE(slow->next(), std::nullopt);
+    store->set("k1000", 1).get();
+    store->set("k1001", 1).get();
+    EXPECT_EQ(slow->next(), std::nullopt);
+    EXPECT_TRUE(slow->isOver());
+    store->set("other", 1).get();
+    EXPECT_NE(other->next(), std::nullopt);
+}
+
+TEST_F(FeedsTest, GiveUpAReaderThatWaitsForNothingElse) {
+    const auto slow = started("/changes");
+    EXPECT_EQ(slow->next(), std::nullopt);
+    for (int i = 0; i < 1001; ++i) store->set("k" + std::to_string(i), 1).get();
+    EXPECT_EQ(ready, 1);
+    EXPECT_TRUE(slow->isOver());
+}
+
+TEST_F(FeedsTest, WatchTheStoreOnceForAllThatShowChanges) {
+    const auto first = started("/changes?prefix=a");
+    {
+        const auto second = started("/changes?prefix=b");
+        store->set("b", 1).get();
+        EXPECT_NE(second->next(), std::nullopt);
+    }
+    store->set("a", 1).get();
+    EXPECT_NE(first->next(), std::nullopt);
+    const auto third = started("/changes");
+    store->set("b", 2).get();
+    EXPECT_EQ(first->next(), std::nullopt);
+    EXPECT_NE(third->next(), std::nullopt);
 }
 
 TEST_F(FeedsTest, ShowTheChangesOfAPatchTogether) {

@@ -103,7 +103,8 @@ TEST_F(LayersTest, AreNotListedWhenTheyGoMeanwhile) {
     std::vector<std::string> names;
     const ServerOptions none;
     const Access access(none);
-    const Context context{store, none, access, nullptr, nullptr, nullptr, {}};
+    KeyList keys;
+    const Context context{store, none, access, keys, nullptr, nullptr, nullptr, nullptr, {}};
     forEachSource(context, [&](const auto& layer, auto&) {
         names.push_back(layer.name);
         store->removeSource("first").get();

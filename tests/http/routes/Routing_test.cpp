@@ -85,6 +85,42 @@ TEST_F(RoutingTest, RefusesWhatIsNotEncodedRight) {
               "400 /problems/bad-request The path is not percent-encoded right.");
 }
 
+TEST_F(RoutingTest, CutsWhatProblemsRepeat) {
+    // The 300th byte is the first of a character of two.
+    const std::string path = "/" + std::string(278, 'a');
+    EXPECT_EQ(problemIn(get(path + "\xC3\xA4" + "b")),
+              "404 /problems/not-found There is nothing at " + path + "...");
+    EXPECT_LT(
+        message("ConfigurationSet", R"({"key":")" + std::string(9999, 'k') + R"(","source":"x"})")
+            .body.size(),
+        500U);
+}
+
+TEST_F(RoutingTest, ObjectsToHeadsAsToWholeRequests) {
+    options.allowWrites = false;
+    const auto objection = [&](Request&& head) {
+        const auto found = service().objection(head);
+        return found ? problemIn(*found) : "none";
+    };
+    EXPECT_EQ(objection(request("PATCH", "/config")),
+              "403 /problems/forbidden Nobody may write here.");
+    EXPECT_EQ(objection(request("POST", "/nothing")),
+              "404 /problems/not-found There is nothing at /nothing");
+    EXPECT_EQ(objection(request("POST", "/config")),
+              "405 /problems/method-not-allowed Allowed here: GET, HEAD, PATCH");
+    EXPECT_EQ(objection(request("GET", "/config", "", {{"host", "example.org"}})),
+              "403 /problems/forbidden No name of this server: example.org");
+    EXPECT_EQ(objection(request("POST", "/velkor/configuration/ConfigurationGet")), "none");
+}
+
+TEST_F(RoutingTest, CountsAnObjectionAsAnAnswer) {
+    service().objection(request("POST", "/healthz"));
+    service().objection(request("POST", "/velkor/configuration/ConfigurationGet"));
+    const std::string text = get("/metrics").body;
+    EXPECT_NE(text.find("route=\"none\",status=\"405\"} 1\n"), std::string::npos);
+    EXPECT_EQ(text.find("ConfigurationGet"), std::string::npos);
+}
+
 TEST_F(RoutingTest, SendsThePageWithItsHeaders) {
     const Response page = get("/");
     EXPECT_EQ(page.status, 200);
@@ -99,7 +135,9 @@ TEST_F(RoutingTest, HasATextForWhatTheTransportRefuses) {
         {408, "408 /problems/timeout The request was not complete in time."},
         {413, "413 /problems/too-large The body is too large."},
         {431, "431 /problems/headers-too-large The headers are too large."},
-        {503, "503 /problems/unavailable There are too many connections or streams."}};
+        {503,
+         "503 /problems/unavailable There are too many connections or streams, or too much is "
+         "kept for clients."}};
     for (const auto& [status, text] : cases) {
         EXPECT_EQ(problemIn(service().refusal(status)), text);
     }
