@@ -97,6 +97,14 @@ TEST(Requests, ForTheHeadGetNoBody) {
     EXPECT_EQ(client.ask("GET /").body, "GET / ");
 }
 
+TEST(Requests, ForTheHeadDoNotTakeTheBodyFromALaterRefusal) {
+    const Serving serving;
+    HttpClient client(serving.port());
+    EXPECT_EQ(client.ask("HEAD /here").status, 200);
+    client.send("nonsense\r\n\r\n");
+    EXPECT_EQ(client.answer().body, "refused with 400");
+}
+
 TEST(Requests, WithoutAnythingToSayGetNoLength) {
     const Serving serving({}, [](Request&&, const ScriptedHandler::Reply& answer) {
         Response nothing;
