@@ -120,6 +120,7 @@ private:
             known.client = client;
             if (auto objection = shared->handler->objection(known)) {
                 staysOpen = false;
+                isHead = parser.isHead();
                 return send(std::move(*objection));
             }
         }
@@ -166,8 +167,8 @@ private:
                 boost::asio::dispatch(*context, [self, answer = std::move(answer)]() mutable {
                     // Only here, on its thread, may this be the last reference.
                     const auto connection = self.lock();
-                    if (connection)
-                        static_cast<Connection&>(*connection).onAnswer(std::move(answer));
+                    if (!connection) return;
+                    static_cast<Connection&>(*connection).onAnswer(std::move(answer));
                 });
             });
     }
@@ -183,8 +184,10 @@ private:
         });
     }
 
+    // Whatever was asked for, and be it unknown.
     void refuse(int status) {
         staysOpen = false;
+        isHead = false;
         send(shared->handler->refusal(status));
     }
 
