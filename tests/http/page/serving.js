@@ -94,6 +94,7 @@ export class Bench {
     /// A new page; nothing that it reports may be left when the test ends.
     async openTab(look = {}) {
         const context = await browser.newContext(look);
+        context.setDefaultTimeout(120_000);  // of a busy machine
         this.#test.after(() => context.close());
         const tab = await context.newPage();
         tab.complaints = [];
