@@ -49,6 +49,7 @@ Response changedResponse(const Context& context, const std::vector<AppliedChange
 
 std::vector<std::string> sourcesOf(const std::vector<AppliedChange>& changes) {
     std::vector<std::string> names;
+    names.reserve(changes.size());
     for (const AppliedChange& change : changes) names.push_back(change.source);
     std::sort(names.begin(), names.end());
     names.erase(std::unique(names.begin(), names.end()), names.end());
