@@ -2,7 +2,8 @@
 
 namespace velkor::http {
 
-Refused::Refused(const std::string& text) : std::runtime_error(text) {}
+Refused::Refused(const std::string& text, Cause refusedFor)
+    : std::runtime_error(text), reason(refusedFor) {}
 Refused::~Refused() = default;
 
 }  // namespace velkor::http

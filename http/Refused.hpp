@@ -11,10 +11,21 @@ namespace velkor::http {
 /// text is meant for the operator; `ServerOptions` and `Server` say which there are.
 class VELKOR_EXPORT Refused : public std::runtime_error {
 public:
-    explicit Refused(const std::string& text);
+    /// What stands against it.
+    enum class Cause {
+        options,  ///< What was asked for, which is wrong at any time.
+        system    ///< What the system refuses now: the address is taken, for example.
+    };
+
+    explicit Refused(const std::string& text, Cause refusedFor = Cause::options);
     Refused(const Refused&) = default;
     Refused& operator=(const Refused&) = default;
     ~Refused() override;
+
+    Cause cause() const noexcept { return reason; }
+
+private:
+    Cause reason;
 };
 
 }  // namespace velkor::http

@@ -34,7 +34,9 @@ public:
     /// - "TLS needs both a certificate and a key"
     /// - "can't use the certificate FILE: REASON", "can't use the key FILE: REASON"
     /// - "threads must be 1 to 64"
-    /// - "NAME must be at least 1" of a limit that is 0
+    /// - "NAME must be at least 1" of a limit that is 0; "NAME must be at least 1 ms" and "NAME
+    /// must
+    ///   be at most 24 h" of a time
     ///
     /// and what is said of the files that other options name. Throws `std::invalid_argument` for a
     /// null store, `std::system_error` when the system starts no thread.

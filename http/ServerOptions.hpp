@@ -47,6 +47,11 @@ struct ServerOptions {
     /// Bytes of a request's body: more are answered with 413.
     std::size_t maxBodyBytes = std::size_t{1} << 20U;
 
+    /// Bytes that the large bodies, answers and events (above 16 KiB each) of all clients may take
+    /// together until they are read or written: for more, requests are answered with 503, and
+    /// events wait. One alone may be larger.
+    std::size_t maxBufferedBytes = std::size_t{64} << 20U;
+
     /// How deep objects and arrays of a body may be nested, and how many there may be of them.
     std::size_t maxJsonDepth = 64;
     std::size_t maxJsonContainers = 65536;
@@ -66,7 +71,7 @@ struct ServerOptions {
     std::chrono::milliseconds commentInterval{15'000};
 
     /// Open connections in all, and from one address (an IPv6 network of 64 bits counts as one,
-    /// unix sockets do not count): more are answered with 503.
+    /// as does 127.0.0.0/8; unix sockets do not count): more are answered with 503.
     std::size_t maxConnections = 2'000;
     std::size_t maxConnectionsPerAddress = 1'100;
 

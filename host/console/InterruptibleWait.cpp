@@ -6,6 +6,7 @@
 
 #include <cerrno>
 #include <memory>
+#include <optional>
 #include <system_error>
 #include <utility>
 
@@ -43,14 +44,19 @@ private:
 
 bool resultUnlessInterrupted(Future<bool>&& pending) {
     const auto settled = std::make_shared<Event>();
-    Future<bool> result = pending.then([settled](Future<bool>&& outcome) {
+    // Taken over rather than thrown where it is resolved: an error belongs to the caller alone
+    // then.
+    const auto outcome = std::make_shared<std::optional<Future<bool>>>();
+    Future<bool> taken = pending.then([settled, outcome](Future<bool>&& resolved) {
+        outcome->emplace(std::move(resolved));
         settled->happen();
-        return outcome.get();
+        return true;
     });
     while (!settled->hasComeSoon()) {
         if (Interruption::isRequested()) throw Interrupted();
     }
-    return result.get();
+    taken.get();
+    return (*outcome)->get();
 }
 
 }  // namespace velkor::host

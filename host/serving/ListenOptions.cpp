@@ -57,6 +57,8 @@ constexpr std::tuple quantities{
                           "Most open connections"),
     quantity<std::size_t>("--max-connections-per-address", &ServerOptions::maxConnectionsPerAddress,
                           "Most open connections from one address"),
+    quantity<ByteSize>("--max-buffered-bytes", &ServerOptions::maxBufferedBytes,
+                       "Most bytes of large bodies, answers and events of all clients"),
     quantity<std::size_t>("--max-streams", &ServerOptions::maxStreams, "Most open event streams"),
 };
 

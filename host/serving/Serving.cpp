@@ -42,6 +42,7 @@ std::shared_ptr<const void> serve(const std::shared_ptr<configuration::Configura
         }
         return server;
     } catch (const http::Refused& refused) {
+        if (refused.cause() == http::Refused::Cause::system) throw;
         throw UsageError(refused.what());
     }
 }

@@ -15,7 +15,8 @@ namespace velkor::host {
 ///
 /// The process may open as many files from now on as the system lets it.
 ///
-/// Throws `UsageError` with the reason when the server refuses to start, see `http::Server`;
+/// Throws `UsageError` with the reason when the server refuses to start, see `http::Server`,
+/// which itself passes on when it is the system that refuses;
 /// "--listen needs velkor::http, which this velkor-config was built without" when that is so.
 std::shared_ptr<const void> serve(const std::shared_ptr<configuration::ConfigurationImpl>& store,
                                   const http::ServerOptions& options,

@@ -6,6 +6,7 @@
 
 #include <cerrno>
 #include <system_error>
+#include <thread>
 
 namespace velkor::host {
 
@@ -46,6 +47,23 @@ bool isIgnored(int signal) {
     return ::sigaction(signal, nullptr, &action) == 0 && action.sa_handler == SIG_IGN;
 }
 
+// While a line is edited on a terminal, Ctrl-C is a key, and SIGINT is held back from the thread
+// that edits: it comes from elsewhere then, and from here as SIGTERM.
+void passOnInterrupts() {
+    sigset_t all;
+    sigset_t before;
+    sigfillset(&all);
+    ::pthread_sigmask(SIG_SETMASK, &all, &before);
+    std::thread([] {
+        sigset_t interrupt;
+        sigemptyset(&interrupt);
+        sigaddset(&interrupt, SIGINT);
+        int signal = 0;
+        while (::sigwait(&interrupt, &signal) == 0) ::kill(::getpid(), SIGTERM);
+    }).detach();
+    ::pthread_sigmask(SIG_SETMASK, &before, nullptr);
+}
+
 }  // namespace
 
 Termination::Termination(bool withConsole) {
@@ -63,6 +81,7 @@ Termination::Termination(bool withConsole) {
     for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
         if (sigismember(&awaited, signal) == 1) handle(signal, endInput);
     }
+    passOnInterrupts();
 }
 
 void Termination::await() const noexcept {

@@ -14,8 +14,8 @@ namespace velkor::host {
 class Termination {
 public:
     /// With a console, the signals put the end of all input in the place of standard input, and
-    /// interrupt what waits for it; SIGINT does so unless the console takes it. Throws
-    /// `std::system_error`.
+    /// interrupt what waits for it; SIGINT does so unless a command of the console takes it, as
+    /// Ctrl-C. Throws `std::system_error`. A thread that waits for SIGINT stays with the process.
     explicit Termination(bool withConsole);
     Termination(const Termination&) = delete;
     Termination& operator=(const Termination&) = delete;

@@ -88,8 +88,12 @@ public:
     /// connection: what may take long is done on the handler's own.
     virtual void handle(Request&& request, std::function<void(Answer&&)> answer) = 0;
 
+    /// Why a request is not answered, known from its head alone: asked before a body is read that
+    /// hasn't come yet. The same is found by `handle`, which is not called then.
+    virtual std::optional<Response> objection(const Request& head) = 0;
+
     /// The answer to what the transport refuses by itself: 400 (no HTTP), 408, 413, 431, 503 (too
-    /// many connections or streams). From any thread of the transport.
+    /// many connections or streams, too much for the memory). From any thread of the transport.
     virtual Response refusal(int status) const = 0;
 
     /// Ends the handler's own threads, once all connections are closed; `handle` is not called any
@@ -109,6 +113,7 @@ struct TransportCounts {
     Count eventsWritten{0};
     Count requestsRead{0};
     Count requestsRefused{0};   ///< By the transport itself: no HTTP, or too large.
+    Count answersRefused{0};    ///< No room for them, or for the bodies of their requests.
     Count requestsTimedOut{0};  ///< Not complete in time.
     Count writesTimedOut{0};    ///< Answers and events that the client did not take in time.
     Count bytesRead{0};

@@ -46,6 +46,9 @@ class SetForm {
     /// Shows the value that the item has now, unless another one is being entered: then it is told.
     renew() {
         if (this.#item === undefined || this.#isSecret) return;
+        const isEntered = this.#type.value === this.#held.type &&
+            this.#field.value === writeValue(this.#held, this.#asJson.checked);
+        if (isEntered) return;
         if (this.#field.value !== this.#shown) {
             this.#changed.textContent = `It has changed meanwhile: ${showContent(this.#held.value) || 'empty text'}`;
             return;
@@ -105,8 +108,10 @@ class SetForm {
         field.value = type === 'bool' && text !== 'true' ? 'false' : text;
         field.addEventListener('input', () => this.#describe());
         this.#asJson.parentElement.hidden = !(isArray(type) || isText(type));
+        const hadFocus = document.activeElement === this.#field;
         this.#field.replaceWith(field);
         this.#field = field;
+        if (hadFocus) field.focus();
         this.#describe();
     }
 

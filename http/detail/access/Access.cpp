@@ -69,32 +69,26 @@ void Access::requireOwnSite(const Request& request) {
     throw Problem(ProblemKind::forbidden, "Pages of another origin may not come here.");
 }
 
-bool Access::mayWrite(const Request& request) const {
-    if (!allowWrites || !tokens) return allowWrites;
-    const auto holder = holderOf(request);
-    return holder && holder->right == Right::write;
-}
-
-std::string Access::requireRight(const Request& request, Right needed) const {
-    std::string who = "anybody";
-    if (needed == Right::none) return who;
-    Right given = Right::write;
+Visitor Access::visitorOf(const Request& request) const {
+    Visitor visitor{Right::write, "anybody"};
     if (tokens) {
-        const auto holder = holderOf(request);
-        if (!holder) throw Problem(ProblemKind::unauthorised, "A token that is known is needed.");
-        given = holder->right;
-        who = "token " + std::to_string(holder->number);
+        const auto authorization = request.header("authorization");
+        const auto holder =
+            tokens->holderOf(authorization ? bearerToken(*authorization) : std::string_view());
+        if (!holder) return {};
+        visitor = {holder->right, "token " + std::to_string(holder->number)};
     }
-    if (needed == Right::write && !allowWrites) {
-        throw Problem(ProblemKind::forbidden, "Nobody may write here.");
-    }
-    if (needed > given) throw Problem(ProblemKind::forbidden, "The token may only read.");
-    return who;
+    if (!allowWrites) visitor.right = std::min(visitor.right, Right::read);
+    return visitor;
 }
 
-std::optional<TokenHolder> Access::holderOf(const Request& request) const {
-    const auto authorization = request.header("authorization");
-    return authorization ? tokens->holderOf(bearerToken(*authorization)) : std::nullopt;
+void Access::requireRight(const Visitor& visitor, Right needed) const {
+    if (needed <= visitor.right) return;
+    if (visitor.right == Right::none) {
+        throw Problem(ProblemKind::unauthorised, "A token that is known is needed.");
+    }
+    throw Problem(ProblemKind::forbidden,
+                  allowWrites ? "The token may only read." : "Nobody may write here.");
 }
 
 }  // namespace velkor::http::detail

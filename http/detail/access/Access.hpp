@@ -11,6 +11,12 @@
 
 namespace velkor::http::detail {
 
+/// Who sends a request.
+struct Visitor {
+    Right right = Right::none;
+    std::string name = "nobody known";  ///< "token 2"; "anybody" where there are no tokens.
+};
+
 /// Decides who may do what. Immutable: safe for concurrent use.
 class Access {
 public:
@@ -26,17 +32,14 @@ public:
     /// forbidden.
     static void requireOwnSite(const Request& request);
 
-    /// Whether the sender of `request` may write.
-    bool mayWrite(const Request& request) const;
+    /// Who sends `request`, and what that may do: nobody writes where writing isn't allowed at all.
+    Visitor visitorOf(const Request& request) const;
 
-    /// Lets requests pass whose sender has the right `needed`, and gives who that is: "token 2",
-    /// or "anybody" where there are no tokens. Throws `Problem`: unauthorised without a token that
-    /// is known, forbidden if it doesn't give that right, or nobody may write.
-    std::string requireRight(const Request& request, Right needed) const;
+    /// Lets a visitor pass who has the right `needed`. Throws `Problem`: unauthorised without any
+    /// right, otherwise forbidden.
+    void requireRight(const Visitor& visitor, Right needed) const;
 
 private:
-    std::optional<TokenHolder> holderOf(const Request& request) const;
-
     const bool allowWrites;
     const bool behindProxy;
     const OwnNames names;

@@ -28,8 +28,8 @@ std::optional<std::string_view> nameIn(std::string_view host) {
                      : bracket == std::string_view::npos ? host.size()
                                                          : bracket + 1;
     const std::string_view port = host.substr(end);
-    const bool isPort = port.empty() || (port.front() == ':' &&
-                                         std::all_of(port.begin() + 1, port.end(), isDigit));
+    const bool isPort =
+        port.empty() || (port.front() == ':' && std::all_of(port.begin() + 1, port.end(), isDigit));
     return isPort ? std::optional(host.substr(0, end)) : std::nullopt;
 }
 
@@ -52,8 +52,7 @@ bool isSameName(std::string_view left, std::string_view right) noexcept {
                       [](char a, char b) { return lower(a) == lower(b); });
 }
 
-OwnNames::OwnNames(const ServerOptions& options)
-    : names{"127.0.0.1", "localhost", "[::1]"} {
+OwnNames::OwnNames(const ServerOptions& options) : names{"127.0.0.1", "localhost", "[::1]"} {
     names.insert(names.end(), options.names.begin(), options.names.end());
     for (const std::string_view endpoint : options.endpoints) {
         if (endpoint.substr(0, unixPrefix.size()) == unixPrefix) continue;
@@ -68,9 +67,8 @@ bool OwnNames::contain(std::string_view host) const {
     const auto name = nameIn(host);
     if (!name) return false;
     const auto isOwn = [&](std::string_view called) {
-        return std::any_of(names.begin(), names.end(), [&](const std::string& each) {
-            return isSameName(each, called);
-        });
+        return std::any_of(names.begin(), names.end(),
+                           [&](const std::string& each) { return isSameName(each, called); });
     };
     if (isOwn(*name)) return true;
     const std::string address = canonicalAddress(*name);

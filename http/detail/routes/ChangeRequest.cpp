@@ -180,7 +180,8 @@ std::vector<Change> parsedChanges(const std::string& text, const messages::JsonL
     requireMembers(*body, {"changes"}, "The body");
     const Var* const member = findMember(*body, "changes");
     const Array* const array = member == nullptr ? nullptr : arrayIn(*member);
-    if (array == nullptr || array->size() == 0) refuse("changes", "is missing or no list of changes");
+    if (array == nullptr || array->size() == 0)
+        refuse("changes", "is missing or no list of changes");
     std::vector<Change> changes;
     changes.reserve(array->size());
     for (const Var& element : *array) {

@@ -76,14 +76,13 @@ Sources durableSources(ConfigurationImpl& store, const std::vector<std::string>&
 void answerOnceCommitted(const Sources& sources, WriteRecord record, PendingAnswer answer,
                          Response response) {
     if (sources.empty()) return record.answer(answer, std::move(response));
-    const auto awaited = std::make_shared<AwaitedCommits>(
-        sources.size(), std::move(record), std::move(answer), std::move(response));
+    const auto awaited = std::make_shared<AwaitedCommits>(sources.size(), std::move(record),
+                                                          std::move(answer), std::move(response));
     for (const auto& source : sources) {
-        dynamic_cast<DurableSource&>(*source).committed().then(
-            [awaited](Future<bool>&& committed) {
-                awaited->settle(std::move(committed));
-                return true;
-            });
+        dynamic_cast<DurableSource&>(*source).committed().then([awaited](Future<bool>&& committed) {
+            awaited->settle(std::move(committed));
+            return true;
+        });
     }
 }
 

@@ -1,5 +1,6 @@
 #include "http/detail/routes/Feeds.hpp"
 
+#include <cstddef>
 #include <cstdint>
 #include <exception>
 #include <new>
@@ -7,9 +8,11 @@
 #include <utility>
 #include <vector>
 
+#include "http/detail/routes/ChangeHub.hpp"
 #include "http/detail/routes/Items.hpp"
 #include "http/detail/routes/JsonWriter.hpp"
 #include "http/detail/routes/Mailbox.hpp"
+#include "http/detail/routes/PendingChanges.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::http::detail {
@@ -20,23 +23,26 @@ using configuration::ConfigurationImpl;
 using configuration::ConfigurationValue;
 using configuration::OptionChange;
 
-/// Events made of what a publisher of the store delivers.
-template <class T>
-class StoreFeed : public EventFeed {
-public:
-    using Source = std::shared_ptr<reactive_streams::PublisherAPI<T>>;
+// Of a client that is slower than that the stream ends: it begins again, and reads all there is.
+constexpr std::size_t mostPendingKeys = 1000;
 
-    StoreFeed(Source source, Asking whenAsking, std::shared_ptr<Metrics> counts,
-              Metrics::Count Metrics::*openCount)
-        : publisher(std::move(source)),
-          asking(whenAsking),
+std::string eventText(std::uint64_t id, const std::string& json) {
+    return "id: " + std::to_string(id) + "\ndata: " + json + "\n\n";
+}
+
+class WatchFeed final : public EventFeed {
+public:
+    WatchFeed(const std::shared_ptr<ConfigurationImpl>& watched, const std::string& watchedKey,
+              std::shared_ptr<Metrics> counts)
+        : store(watched),
+          keys{watchedKey},
           metrics(std::move(counts)),
-          open((*metrics).*openCount) {
-        ++open;
+          publisher(watched->watchOption(watchedKey)) {
+        ++metrics->watchesOpen;
     }
 
-    ~StoreFeed() override {
-        --open;
+    ~WatchFeed() override {
+        --metrics->watchesOpen;
         try {
             // A watch that has had no subscriber would stay: only one can cancel it.
             if (mailbox == nullptr) subscribe([] {});
@@ -46,8 +52,8 @@ public:
         }
     }
 
-    StoreFeed(const StoreFeed&) = delete;
-    StoreFeed& operator=(const StoreFeed&) = delete;
+    WatchFeed(const WatchFeed&) = delete;
+    WatchFeed& operator=(const WatchFeed&) = delete;
 
     void start(std::function<void()> onReady) override { subscribe(std::move(onReady)); }
 
@@ -56,40 +62,18 @@ public:
         metrics->valuesConflated += mailbox->takeConflated();
         if (!value) return std::nullopt;
         ++metrics->valuesDelivered;
-        return "id: " + std::to_string(++lastId) + "\ndata: " + json(*std::move(value)) + "\n\n";
+        return eventText(++lastId, json(*std::move(value)));
     }
 
     bool isOver() const override { return mailbox->isOver(); }
 
-protected:
-    /// What is shown of `value`, on one line.
-    virtual std::string json(T&& value) = 0;
-
 private:
     void subscribe(std::function<void()> onReady) {
-        mailbox = std::make_shared<Mailbox<T>>(asking, std::move(onReady));
+        mailbox = std::make_shared<Mailbox<ConfigurationValue>>(std::move(onReady));
         std::exchange(publisher, nullptr)->subscribe(mailbox);
     }
 
-    Source publisher;
-    const Asking asking;
-    const std::shared_ptr<Metrics> metrics;
-    Metrics::Count& open;
-    std::shared_ptr<Mailbox<T>> mailbox;
-    std::uint64_t lastId = 0;
-};
-
-class WatchFeed final : public StoreFeed<ConfigurationValue> {
-public:
-    WatchFeed(const std::shared_ptr<ConfigurationImpl>& watched, const std::string& watchedKey,
-              std::shared_ptr<Metrics> counts)
-        : StoreFeed(watched->watchOption(watchedKey), Asking::always, std::move(counts),
-                    &Metrics::watchesOpen),
-          store(watched),
-          keys{watchedKey} {}
-
-private:
-    std::string json(ConfigurationValue&& delivered) override {
+    std::string json(ConfigurationValue&& delivered) const {
         const auto alive = store.lock();
         const bool hidden = alive == nullptr || settings::isSecret(alive, keys.front());
         JsonWriter writer;
@@ -114,18 +98,51 @@ private:
 
     const std::weak_ptr<ConfigurationImpl> store;
     const std::vector<std::string> keys;  // the one
+    const std::shared_ptr<Metrics> metrics;
+    std::shared_ptr<reactive_streams::PublisherAPI<ConfigurationValue>> publisher;
+    std::shared_ptr<Mailbox<ConfigurationValue>> mailbox;
+    std::uint64_t lastId = 0;
 };
 
-class ChangeFeed final : public StoreFeed<OptionChange> {
+class ChangeFeed final : public EventFeed {
 public:
     ChangeFeed(const std::shared_ptr<ConfigurationImpl>& watched, const std::string& prefix,
-               std::shared_ptr<Metrics> counts)
-        : StoreFeed(watched->watchChanges(prefix), Asking::whenTaken, std::move(counts),
-                    &Metrics::changeStreamsOpen),
-          store(watched) {}
+               std::shared_ptr<ChangeHub> changeHub, std::shared_ptr<Metrics> counts)
+        : store(watched),
+          hub(std::move(changeHub)),
+          metrics(std::move(counts)),
+          changes(std::make_shared<PendingChanges>(prefix, mostPendingKeys)) {
+        hub->join(*watched, changes);
+        ++metrics->changeStreamsOpen;
+    }
+
+    ~ChangeFeed() override {
+        --metrics->changeStreamsOpen;
+        changes->abandon();
+        try {
+            hub->leave(changes);
+        } catch (...) {
+            return;  // it is left out when the next change comes
+        }
+    }
+
+    ChangeFeed(const ChangeFeed&) = delete;
+    ChangeFeed& operator=(const ChangeFeed&) = delete;
+
+    void start(std::function<void()> onReady) override { changes->start(std::move(onReady)); }
+
+    std::optional<std::string> next() override {
+        const SharedChange change = changes->take();
+        metrics->valuesConflated += changes->takeConflated();
+        if (change == nullptr) return std::nullopt;
+        ++metrics->valuesDelivered;
+        return eventText(++lastId, json(*change));
+    }
+
+    bool isOver() const override { return changes->isOver(); }
 
 private:
-    std::string json(OptionChange&& change) override {
+    std::string json(const OptionChange& change) const {
         const auto alive = store.lock();
         const bool hidden = alive == nullptr || settings::isSecret(alive, change.key);
         JsonWriter writer;
@@ -142,6 +159,10 @@ private:
     }
 
     const std::weak_ptr<ConfigurationImpl> store;
+    const std::shared_ptr<ChangeHub> hub;
+    const std::shared_ptr<Metrics> metrics;
+    const std::shared_ptr<PendingChanges> changes;
+    std::uint64_t lastId = 0;
 };
 
 }  // namespace
@@ -153,8 +174,9 @@ std::unique_ptr<EventFeed> watchFeed(const std::shared_ptr<ConfigurationImpl>& s
 
 std::unique_ptr<EventFeed> changeFeed(const std::shared_ptr<ConfigurationImpl>& store,
                                       const std::string& prefix,
+                                      const std::shared_ptr<ChangeHub>& hub,
                                       std::shared_ptr<Metrics> metrics) {
-    return std::make_unique<ChangeFeed>(store, prefix, std::move(metrics));
+    return std::make_unique<ChangeFeed>(store, prefix, hub, std::move(metrics));
 }
 
 }  // namespace velkor::http::detail

@@ -80,13 +80,14 @@ Response alive(const Context&, const Call&) {
     return plainText(200, "alive\n");
 }
 
-Response ready(const Context& context, const Call&) {
+Response ready(const Context& context, const Call& call) {
     std::string names;
     forEachSource(context, [&](const SourceDescription& layer, ConfigurationSource& source) {
         if (!isWell(source)) names += (names.empty() ? "" : ", ") + layer.name;
     });
     if (names.empty()) return plainText(200, "ready\n");
-    Response response = plainText(503, "not ready: " + names + "\n");
+    const bool mayKnow = call.visitor.right >= Right::read;
+    Response response = plainText(503, mayKnow ? "not ready: " + names + "\n" : "not ready\n");
     response.headers.emplace_back("Retry-After", "1");
     return response;
 }
@@ -94,7 +95,7 @@ Response ready(const Context& context, const Call&) {
 Response metricsText(const Context& context, const Call&) {
     std::string text;
     writeMetric(text, "velkor_keys", "gauge", "Keys of the store.",
-                context.store->keys().get().size());
+                context.keys.of(*context.store)->size());
     writeLayers(context, text);
     context.metrics->writeRequests(text);
     writeValues(*context.metrics, text);

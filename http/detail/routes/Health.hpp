@@ -7,7 +7,7 @@ namespace velkor::http::detail {
 /// GET /healthz: the process is alive.
 Response alive(const Context& context, const Call& call);
 
-/// GET /readyz: whether all layers are well, and which are not.
+/// GET /readyz: whether all layers are well; to those who may read also which are not.
 Response ready(const Context& context, const Call& call);
 
 /// GET /metrics: what there is to count, as Prometheus reads it.

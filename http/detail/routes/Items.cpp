@@ -21,10 +21,10 @@ std::string utcText(std::chrono::system_clock::time_point time) {
     std::tm parts{};
     ::gmtime_r(&seconds, &parts);
     std::array<char, 64> text{};
-    const int size = std::snprintf(
-        text.data(), text.size(), "%04d-%02d-%02dT%02d:%02d:%02d.%03dZ", parts.tm_year + 1900,
-        parts.tm_mon + 1, parts.tm_mday, parts.tm_hour, parts.tm_min, parts.tm_sec,
-        static_cast<int>(milliseconds.count()));
+    const int size =
+        std::snprintf(text.data(), text.size(), "%04d-%02d-%02dT%02d:%02d:%02d.%03dZ",
+                      parts.tm_year + 1900, parts.tm_mon + 1, parts.tm_mday, parts.tm_hour,
+                      parts.tm_min, parts.tm_sec, static_cast<int>(milliseconds.count()));
     return {text.data(), static_cast<std::size_t>(size)};
 }
 

@@ -85,7 +85,8 @@ JsonWriter& JsonWriter::boolean(bool content) {
 }
 
 JsonWriter& JsonWriter::value(const configuration::ConfigurationValue& content) {
-    beginObject().member("type", configuration::typeTags[static_cast<std::size_t>(content.which())]);
+    beginObject().member("type",
+                         configuration::typeTags[static_cast<std::size_t>(content.which())]);
     name("value");
     boost::apply_visitor([this](const auto& held) { write(held); }, content);
     return endObject();

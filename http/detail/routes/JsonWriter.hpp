@@ -15,6 +15,9 @@ namespace velkor::http::detail {
 /// closed, and that members have names.
 class JsonWriter {
 public:
+    /// With room for a short text.
+    JsonWriter() { out.reserve(256); }
+
     JsonWriter& beginObject() { return open('{'); }
     JsonWriter& endObject() { return close('}'); }
     JsonWriter& beginArray() { return open('['); }
@@ -51,11 +54,8 @@ public:
         return name(plain).text(content);
     }
 
-    /// What has been written; the writer is empty afterwards.
-    std::string take() { return std::exchange(out, {}); }
-
-    /// Makes room for a text of `size` bytes.
-    void reserve(std::size_t size) { out.reserve(size); }
+    /// What has been written; the writer is done.
+    std::string take() { return std::move(out); }
 
 private:
     JsonWriter& open(char bracket) {

@@ -116,7 +116,7 @@ void forEachSource(
 
 Response sourceList(const Context& context, const Call& call) {
     JsonWriter json;
-    json.beginObject().member("mayWrite", context.access.mayWrite(call.request));
+    json.beginObject().member("mayWrite", call.visitor.right == Right::write);
     json.name("sources").beginArray();
     forEachSource(context, [&](const SourceDescription& description, ConfigurationSource& source) {
         writeSource(json, description, source);

@@ -18,9 +18,8 @@ Response settingList(const Context& context, const Call& call);
 Response changeHistory(const Context& context, const Call& call);
 
 /// Calls `visit` with each layer of the store, in their order. One that goes meanwhile is left out.
-void forEachSource(
-    const Context& context,
-    const std::function<void(const configuration::SourceDescription&,
-                             configuration::ConfigurationSource&)>& visit);
+void forEachSource(const Context& context,
+                   const std::function<void(const configuration::SourceDescription&,
+                                            configuration::ConfigurationSource&)>& visit);
 
 }  // namespace velkor::http::detail

@@ -74,7 +74,7 @@ void answerKeys(const Context& context, Call& call) {
 }
 
 void answerSet(const Context& context, Call& call) {
-    WriteRecord record("ConfigurationSet", call);
+    WriteRecord record(call);
     record.add(memberOf(context, call.request.body, "key"));
     Response response = dispatched<ConfigurationSet>(context, call.request.body);
     if (response.status != 200) return record.answer(call.answer, std::move(response));
@@ -83,14 +83,14 @@ void answerSet(const Context& context, Call& call) {
 }
 
 void answerAddFile(const Context& context, Call& call) {
-    WriteRecord record("AddPropertyFileSource", call);
+    WriteRecord record(call);
     record.add(memberOf(context, call.request.body, "name"));
     record.answer(call.answer, dispatched<AddPropertyFileSource>(context, call.request.body));
 }
 
 void answerUnknownType(const Context&, Call& call) {
-    throw Problem(ProblemKind::notFound, "Unknown message type: " +
-                                             std::string(messageTypePrefix) + call.argument);
+    throw Problem(ProblemKind::notFound,
+                  "Unknown message type: " + std::string(messageTypePrefix) + call.argument);
 }
 
 }  // namespace velkor::http::detail

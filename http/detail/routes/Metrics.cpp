@@ -83,8 +83,7 @@ void Metrics::writeSeconds(const Row& row, std::string& out) {
     std::uint64_t count = 0;
     for (std::size_t i = 0; i < row.buckets.size(); ++i) {
         count += row.buckets[i];
-        const std::string end =
-            i < bucketEnds.size() ? seconds(bucketEnds[i], 1'000'000) : "+Inf";
+        const std::string end = i < bucketEnds.size() ? seconds(bucketEnds[i], 1'000'000) : "+Inf";
         lines.append(requestSeconds).append("_bucket").append(label).append(",le=\"");
         lines.append(end).append("\"} ").append(std::to_string(count)).append("\n");
     }

@@ -37,8 +37,8 @@ private:
     static constexpr std::array<int, 13> statuses{200, 204, 400, 401, 403, 404, 405,
                                                   408, 409, 413, 422, 503, 500};
     /// Microseconds, each the end of a bucket.
-    static constexpr std::array<std::uint64_t, 8> bucketEnds{10,     50,      250,     1'000,
-                                                             10'000, 100'000, 1'000'000, 10'000'000};
+    static constexpr std::array<std::uint64_t, 8> bucketEnds{
+        10, 50, 250, 1'000, 10'000, 100'000, 1'000'000, 10'000'000};
 
     struct Row {
         std::string name;

@@ -1,8 +1,6 @@
 #include "http/detail/routes/Options.hpp"
 
 #include <algorithm>
-#include <set>
-#include <unordered_map>
 #include <utility>
 
 #include "configuration/StoreErrors.hpp"
@@ -10,7 +8,6 @@
 #include "http/detail/routes/JsonWriter.hpp"
 #include "http/detail/routes/Problem.hpp"
 #include "settings/Describe.hpp"
-#include "settings/Secrets.hpp"
 
 namespace velkor::http::detail {
 
@@ -33,10 +30,11 @@ struct PageOfKeys {
 };
 
 // Those behind `cursor`, if there is one.
-PageOfKeys pageOf(const std::set<std::string>& all, const std::string& prefix,
-                  const std::string* cursor, std::size_t limit) {
-    auto position = cursor == nullptr || *cursor < prefix ? all.lower_bound(prefix)
-                                                          : all.upper_bound(*cursor);
+PageOfKeys pageOf(const KeyList::Keys& all, const std::string& prefix, const std::string* cursor,
+                  std::size_t limit) {
+    auto position = cursor == nullptr || *cursor < prefix
+                        ? std::lower_bound(all.begin(), all.end(), prefix)
+                        : std::upper_bound(all.begin(), all.end(), *cursor);
     PageOfKeys page;
     for (; position != all.end() && beginsWith(*position, prefix); ++position) {
         if (page.keys.size() == limit) {
@@ -48,36 +46,28 @@ PageOfKeys pageOf(const std::set<std::string>& all, const std::string& prefix,
     return page;
 }
 
-// Of several declarations of a key the first one that says something.
-void writeDeclared(JsonWriter& json, const Description& description) {
-    if (!description.constraint.empty()) json.member("constraint", description.constraint);
-    if (!description.description.empty()) json.member("description", description.description);
+void writeDeclared(JsonWriter& json, const Description& declared) {
+    if (!declared.constraint.empty()) json.member("constraint", declared.constraint);
+    if (!declared.description.empty()) json.member("description", declared.description);
+    if (declared.secret) json.member("secret", true);
 }
 
-using Declarations = std::unordered_map<std::string, Description>;
-
-void addTo(Declarations& declarations, Description&& description) {
-    Description& known = declarations.try_emplace(description.key).first->second;
-    if (known.constraint.empty()) known.constraint = std::move(description.constraint);
-    if (known.description.empty()) known.description = std::move(description.description);
-    known.secret = known.secret || description.secret;
+// What all settings of `key` say together.
+Description declaredOf(const Context& context, const std::string& key) {
+    Description all;
+    for (Description& each : settings::describe(context.store, key)) {
+        if (all.constraint.empty()) all.constraint = std::move(each.constraint);
+        if (all.description.empty()) all.description = std::move(each.description);
+        all.secret = all.secret || each.secret;
+    }
+    return all;
 }
 
-Declarations declarationsOf(std::vector<Description>&& descriptions) {
-    Declarations declarations;
-    for (Description& description : descriptions) addTo(declarations, std::move(description));
-    return declarations;
-}
-
-void writeItem(JsonWriter& json, const Option& option, const Declarations& declarations) {
-    const auto declared = declarations.find(option.key);
-    const bool isDeclared = declared != declarations.end();
-    const bool isSecret = isDeclared && declared->second.secret;
+void writeItem(JsonWriter& json, const Option& option, const Description& declared) {
     json.beginObject();
     writeKey(json, option.key);
-    json.name("value").value(option.value, isSecret).member("source", option.source);
-    if (isDeclared) writeDeclared(json, declared->second);
-    if (isSecret) json.member("secret", true);
+    json.name("value").value(option.value, declared.secret).member("source", option.source);
+    writeDeclared(json, declared);
     json.endObject();
 }
 
@@ -85,17 +75,14 @@ void writeItem(JsonWriter& json, const Option& option, const Declarations& decla
 
 Response optionPage(const Context& context, const Call& call) {
     const std::string* const prefix = find(call.parameters, "prefix");
-    const PageOfKeys page =
-        pageOf(context.store->keys().get(), prefix == nullptr ? std::string() : *prefix,
-               find(call.parameters, "cursor"),
-               limitOf(call.parameters, "limit", usualPage, largestPage));
+    const PageOfKeys page = pageOf(
+        *context.keys.of(*context.store), prefix == nullptr ? std::string() : *prefix,
+        find(call.parameters, "cursor"), limitOf(call.parameters, "limit", usualPage, largestPage));
     const auto reading = context.store->read(page.keys).get();
-    // Behind the reading: what is declared secret by then is not shown.
-    const Declarations declarations = declarationsOf(settings::describe(context.store));
     JsonWriter json;
     json.beginObject().name("items").beginArray();
     for (const auto& option : reading.options) {
-        if (option) writeItem(json, *option, declarations);
+        if (option) writeItem(json, *option, declaredOf(context, option->key));
     }
     json.endArray();
     if (page.hasMore) json.member("next", percentEncoded(page.keys.back()));
@@ -109,9 +96,7 @@ Response optionLayers(const Context& context, const Call& call) {
     if (options.empty()) {
         throw Problem(ProblemKind::notFound, configuration::store_errors::noSuchOption + key);
     }
-    const Declarations declarations = declarationsOf(settings::describe(context.store, key));
-    const Description declared =
-        declarations.empty() ? Description() : declarations.begin()->second;
+    const Description declared = declaredOf(context, key);
     JsonWriter json;
     json.beginObject();
     writeKey(json, key);
@@ -122,7 +107,6 @@ Response optionLayers(const Context& context, const Call& call) {
     }
     json.endArray();
     writeDeclared(json, declared);
-    if (declared.secret) json.member("secret", true);
     json.endObject();
     return jsonResponse(json.take());
 }

@@ -12,7 +12,7 @@ namespace velkor::http::detail {
 namespace {
 
 using Digest = std::array<unsigned char, SHA256_DIGEST_LENGTH>;
-constexpr std::size_t base64Size = (SHA256_DIGEST_LENGTH + 2) / 3 * 4;
+constexpr std::size_t base64Size = (std::size_t{SHA256_DIGEST_LENGTH} + 2) / 3 * 4;
 
 std::string joined() {
     std::string html;

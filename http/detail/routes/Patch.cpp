@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <exception>
 #include <new>
+#include <string_view>
+#include <unordered_set>
 #include <utility>
 
 #include "http/detail/routes/ChangeRequest.hpp"
@@ -47,6 +49,7 @@ Response changedResponse(const Context& context, const std::vector<AppliedChange
 
 std::vector<std::string> sourcesOf(const std::vector<AppliedChange>& changes) {
     std::vector<std::string> names;
+    names.reserve(changes.size());
     for (const AppliedChange& change : changes) names.push_back(change.source);
     std::sort(names.begin(), names.end());
     names.erase(std::unique(names.begin(), names.end()), names.end());
@@ -54,7 +57,7 @@ std::vector<std::string> sourcesOf(const std::vector<AppliedChange>& changes) {
 }
 
 void write(const Context& context, Call& call, const std::vector<Change>& changes) {
-    WriteRecord record("PATCH /config", call);
+    WriteRecord record(call);
     for (const Change& change : changes) record.add(change.key);
     std::vector<AppliedChange> applied;
     try {
@@ -68,11 +71,34 @@ void write(const Context& context, Call& call, const std::vector<Change>& change
                         std::move(call.answer), changedResponse(context, applied, false));
 }
 
+// Which a client that sends back what it was shown would write over the secret.
+bool isMask(const configuration::ConfigurationValue& value) {
+    const auto* const narrow = boost::get<std::string>(&value);
+    const auto* const wide = boost::get<std::u16string>(&value);
+    return (narrow != nullptr && *narrow == settings::secretMark) ||
+           (wide != nullptr && *wide == u"•••");
+}
+
+void requireSound(const Context& context, const std::vector<Change>& changes) {
+    std::unordered_set<std::string_view> seen;
+    for (const Change& change : changes) {
+        if (!seen.insert(change.key).second) {
+            throw Problem(ProblemKind::badRequest, "A key is given twice: " + change.key);
+        }
+        if (change.value && isMask(*change.value) &&
+            settings::isSecret(context.store, change.key)) {
+            throw Problem(ProblemKind::badRequest,
+                          "The value is what is shown in the place of a secret: " + change.key);
+        }
+    }
+}
+
 }  // namespace
 
 void patchOptions(const Context& context, Call& call) {
     const bool dryRun = isDryRun(call);
     const auto changes = parsedChanges(call.request.body, context.jsonLimits);
+    requireSound(context, changes);
     if (!dryRun) return write(context, call, changes);
     call.answer(changedResponse(context, context.store->apply(changes, true).get(), true));
 }

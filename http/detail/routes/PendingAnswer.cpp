@@ -22,7 +22,7 @@ PendingAnswer::PendingAnswer(Function function, std::shared_ptr<Metrics> counts,
 PendingAnswer::~PendingAnswer() {
     if (metrics == nullptr || !give) return;
     try {
-        (*this)(problemResponse(ProblemKind::unavailable, "The request was given up."));
+        (*this)(problemResponse(ProblemKind::unavailable, "The server is too busy."));
     } catch (...) {
         return;  // nobody is left to be told
     }

@@ -26,6 +26,9 @@ public:
     /// Counts the answer for the route with that number.
     void belongsTo(std::size_t routeNumber) noexcept { route = routeNumber; }
 
+    /// Owes nothing any more: somebody else answers.
+    void withdraw() noexcept { give = nullptr; }
+
     /// Gives the answer, unless one was given before.
     void operator()(Answer&& answer);
 

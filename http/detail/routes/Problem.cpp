@@ -69,13 +69,22 @@ ProblemKind kindOf(Refusal refusal) {
     return ProblemKind::internal;
 }
 
+// A text may repeat what the client sent, which can be long.
+std::string abbreviated(std::string_view detail) {
+    constexpr std::size_t mostBytes = 300;
+    if (detail.size() <= mostBytes) return std::string(detail);
+    std::size_t end = mostBytes;
+    while (end > 0 && (static_cast<unsigned char>(detail[end]) & 0xC0U) == 0x80U) --end;
+    return std::string(detail.substr(0, end)) + "...";
+}
+
 }  // namespace
 
 Response problemResponse(ProblemKind kind, std::string_view detail) {
     const ProblemRow& row = rowOf(kind);
     JsonWriter json;
     json.beginObject().member("type", row.type).member("title", row.title);
-    json.name("status").number(row.status).member("detail", detail).endObject();
+    json.name("status").number(row.status).member("detail", abbreviated(detail)).endObject();
     Response response{row.status, "application/problem+json", json.take(), {}};
     if (kind == ProblemKind::unauthorised) {
         response.headers.emplace_back("WWW-Authenticate", "Bearer");

@@ -36,7 +36,8 @@ public:
     ProblemKind kind;
 };
 
-/// The answer: an object of "type", "title", "status" and `detail`, as application/problem+json,
+/// The answer: an object of "type", "title", "status" and `detail`, of which at most 300
+/// bytes are shown, as application/problem+json,
 /// with the headers that belong to its status.
 Response problemResponse(ProblemKind kind, std::string_view detail);
 

@@ -24,7 +24,7 @@ void watchKey(const Context& context, Call& call) {
 void watchPrefix(const Context& context, Call& call) {
     const std::string* const prefix = find(call.parameters, "prefix");
     call.answer(changeFeed(context.store, prefix == nullptr ? std::string() : *prefix,
-                           context.metrics));
+                           context.changes, context.metrics));
 }
 
 std::vector<Route> allRoutes() {

@@ -12,6 +12,8 @@
 #include "http/detail/Exchange.hpp"
 #include "http/detail/access/Access.hpp"
 #include "http/detail/access/Right.hpp"
+#include "http/detail/routes/ChangeHub.hpp"
+#include "http/detail/routes/KeyList.hpp"
 #include "http/detail/routes/Metrics.hpp"
 #include "http/detail/routes/PendingAnswer.hpp"
 #include "http/detail/routes/Target.hpp"
@@ -24,19 +26,24 @@ struct Context {
     std::shared_ptr<configuration::ConfigurationImpl> store;
     const ServerOptions& options;
     const Access& access;
+    KeyList& keys;
+    std::shared_ptr<ChangeHub> changes;
     std::shared_ptr<Metrics> metrics;
     std::shared_ptr<const TransportCounts> transport;
     std::shared_ptr<const messages::MessageDispatcher> dispatcher;
     messages::JsonLimits jsonLimits;
 };
 
-/// One request that has been let in.
+struct Route;
+
+/// One request.
 struct Call {
     Request request;
     PendingAnswer answer;
     Parameters parameters{};
     std::string argument{};  ///< What the path says behind that of the route, decoded.
-    std::string who{};       ///< See `Access::requireRight`.
+    Visitor visitor{};
+    const Route* route = nullptr;  ///< Null while it is not known, and where there is none.
 };
 
 /// Where a route is worked on.

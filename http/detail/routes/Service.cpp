@@ -2,8 +2,11 @@
 
 #include <algorithm>
 #include <atomic>
+#include <chrono>
+#include <cstdint>
 #include <exception>
 #include <new>
+#include <optional>
 #include <stdexcept>
 #include <string_view>
 #include <utility>
@@ -15,6 +18,7 @@
 #include "http/detail/routes/Problem.hpp"
 #include "http/detail/routes/Route.hpp"
 #include "http/detail/routes/Worker.hpp"
+#include "http/detail/routes/WriteRecord.hpp"
 
 namespace velkor::http::detail {
 
@@ -86,10 +90,9 @@ Response otherMethod(std::string_view path, const std::string& method) {
     if (allowed.empty()) {
         throw Problem(ProblemKind::notFound, "There is nothing at " + std::string(path));
     }
-    Response response =
-        method == "OPTIONS"
-            ? Response{204, {}, {}, {}}
-            : problemResponse(ProblemKind::methodNotAllowed, "Allowed here: " + allowed);
+    Response response = method == "OPTIONS" ? Response{204, {}, {}, {}}
+                                            : problemResponse(ProblemKind::methodNotAllowed,
+                                                              "Allowed here: " + allowed);
     response.headers.emplace_back("Allow", std::move(allowed));
     return response;
 }
@@ -117,6 +120,25 @@ std::string argumentOf(const Route& route, std::string_view path) {
     return *std::move(argument);
 }
 
+// The address without the port.
+std::string machineOf(const Client& client) {
+    return client.address.substr(0, client.address.rfind(':'));
+}
+
+/// Keeps the records of those who have no right at all from filling the log: one a second.
+class Strangers {
+public:
+    bool mayBeNoted() noexcept {
+        using std::chrono::steady_clock;
+        const auto now = std::chrono::duration_cast<std::chrono::seconds>(
+            steady_clock::now().time_since_epoch());
+        return last.exchange(now.count()) != now.count();
+    }
+
+private:
+    std::atomic<std::int64_t> last{0};
+};
+
 /// Leads requests through access and routing to what answers them. Immutable but for the worker,
 /// so safe for concurrent use.
 class Service final : public Handler {
@@ -130,6 +152,8 @@ public:
           context{store,
                   options,
                   access,
+                  keys,
+                  std::make_shared<ChangeHub>(),
                   metricsOfRoutes(),
                   std::move(counts),
                   messageService.dispatcherFor(messages::allRequestTypes()),
@@ -141,6 +165,15 @@ public:
         answering(call, [&] { letIn(call); });
     }
 
+    std::optional<Response> objection(const Request& head) override {
+        std::optional<Response> found;
+        Call call{head, PendingAnswer([&](Answer&& given) { found = std::get<Response>(given); },
+                                      context.metrics, routes().size())};
+        answering(call, [&] { enter(call); });
+        call.answer.withdraw();
+        return found;
+    }
+
     Response refusal(int status) const override {
         const ProblemKind kind = problemOf(status);
         return problemResponse(kind, textOf(kind));
@@ -150,48 +183,69 @@ public:
 
 private:
     // Runs `work`, and answers with what it throws. Without memory the answer is that of a request
-    // that was given up.
+    // that had no turn.
     template <class Work>
-    static void answering(Call& call, Work&& work) {
+    void answering(Call& call, Work&& work) {
         try {
             work();
         } catch (const std::bad_alloc&) {
             return;
         } catch (...) {
-            call.answer(problemResponse(std::current_exception()));
+            refuse(call, problemResponse(std::current_exception()));
         }
+    }
+
+    // Attempts to write leave a record as well.
+    void refuse(Call& call, Response&& response) {
+        const bool isWrite = call.route != nullptr && call.route->right == Right::write;
+        const bool isKnown = call.visitor.right != Right::none;
+        if (!isWrite || (!isKnown && !strangers.mayBeNoted())) {
+            return call.answer(std::move(response));
+        }
+        WriteRecord(call).answer(call.answer, std::move(response));
+    }
+
+    // Finds out what is asked for, by whom, and whether they may; false when that was answered.
+    bool enter(Call& call) {
+        const Request& request = call.request;
+        const std::string_view path = targetOf(request.target).path;
+        call.route = routeAt(path, methodOf(request));
+        access.requireOwnName(request);
+        if (call.route == nullptr) {
+            call.answer(otherMethod(path, request.method));
+            return false;
+        }
+        call.answer.belongsTo(static_cast<std::size_t>(call.route - routes().data()));
+        if (!call.route->isForAnyone) Access::requireOwnSite(request);
+        call.visitor = access.visitorOf(request);
+        access.requireRight(call.visitor, call.route->right);
+        return true;
     }
 
     void letIn(Call& call) {
+        if (!enter(call)) return;
         const Request& request = call.request;
-        access.requireOwnName(request);
         const Target target = targetOf(request.target);
-        const Route* const route = routeAt(target.path, methodOf(request));
-        if (route == nullptr) return call.answer(otherMethod(target.path, request.method));
-        call.answer.belongsTo(static_cast<std::size_t>(route - routes().data()));
-        if (!route->isForAnyone) Access::requireOwnSite(request);
-        call.who = access.requireRight(request, route->right);
-        if (!route->isForAnyone && !target.query.empty()) {
+        const Route& route = *call.route;
+        if (!route.isForAnyone && !target.query.empty()) {
             call.parameters = parsedQuery(target.query);
-            requireKnown(*route, call.parameters);
+            requireKnown(route, call.parameters);
         }
-        call.argument = argumentOf(*route, target.path);
-        if (route->isStream && request.method == "HEAD") {
+        call.argument = argumentOf(route, target.path);
+        if (route.isStream && request.method == "HEAD") {
             return call.answer(Response{200, "text/event-stream", {}, {}});
         }
-        const bool isLight = route->place == Place::caller && request.body.size() <= smallBody;
-        if (isLight) return route->handle(context, call);
-        enqueue(*route, call);
+        const bool isLight = route.place == Place::caller && request.body.size() <= smallBody;
+        if (isLight) return route.handle(context, call);
+        enqueue(call);
     }
 
-    void enqueue(const Route& route, Call& call) {
+    void enqueue(Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
-        const bool isTaken = worker.post([this, &route, kept] {
-            answering(*kept, [&] { route.handle(context, *kept); });
-        });
-        if (!isTaken) {
-            kept->answer(problemResponse(ProblemKind::unavailable, "Too many requests wait."));
-        }
+        const bool isWrite = kept->route->right == Right::write;
+        worker.post(
+            isWrite ? Worker::Kind::write : Worker::Kind::read, machineOf(kept->request.client),
+            [this, kept] { answering(*kept, [&] { kept->route->handle(context, *kept); }); });
     }
 
     static std::string_view textOf(ProblemKind kind) {
@@ -205,7 +259,8 @@ private:
             case ProblemKind::headersTooLarge:
                 return "The headers are too large.";
             case ProblemKind::unavailable:
-                return "There are too many connections or streams.";
+                return "There are too many connections or streams, or too much is kept for "
+                       "clients.";
             default:
                 return "The request can't be answered.";
         }
@@ -214,6 +269,8 @@ private:
     const ServerOptions options;
     const Access access;
     const messages::MessageService messageService;
+    KeyList keys;
+    Strangers strangers;
     const Context context;
     Worker worker{mostWaiting};  // the last member: it uses the others
 };

@@ -4,26 +4,28 @@
 
 namespace velkor::http::detail {
 
-Worker::Worker(std::size_t most) : mostWaiting(most) {
+Worker::Worker(std::size_t most) : writes(most), reads(most) {
     thread.emplace([this] { run(); });
 }
 
-bool Worker::post(Job job) {
+void Worker::post(Kind kind, const std::string& owner, Job job) {
+    std::optional<Job> dropped;
     {
         const common::MutexLock lock(mutex);
-        if (isStopping || jobs.size() >= mostWaiting) return false;
-        jobs.push_back(std::move(job));
+        if (isStopping) return;
+        dropped = (kind == Kind::write ? writes : reads).push(owner, std::move(job));
     }
     changed.notify_one();
-    return true;
 }
 
 void Worker::stop() noexcept {
-    std::deque<Job> dropped;
     {
+        FairQueue droppedWrites(0);
+        FairQueue droppedReads(0);
         const common::MutexLock lock(mutex);
         isStopping = true;
-        dropped.swap(jobs);
+        std::swap(droppedWrites, writes);
+        std::swap(droppedReads, reads);
     }
     changed.notify_one();
     thread.reset();
@@ -35,11 +37,9 @@ void Worker::run() {
 
 Worker::Job Worker::nextJob() {
     common::MutexLock lock(mutex);
-    while (jobs.empty() && !isStopping) lock.wait(changed);
-    if (jobs.empty()) return nullptr;
-    Job first = std::move(jobs.front());
-    jobs.pop_front();
-    return first;
+    while (writes.empty() && reads.empty() && !isStopping) lock.wait(changed);
+    if (isStopping) return nullptr;
+    return writes.empty() ? reads.pop() : writes.pop();
 }
 
 }  // namespace velkor::http::detail

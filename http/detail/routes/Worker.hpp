@@ -2,46 +2,48 @@
 
 #include <condition_variable>
 #include <cstddef>
-#include <deque>
-#include <functional>
 #include <optional>
+#include <string>
 
 #include "framework/common/Mutex.hpp"
+#include "http/detail/routes/FairQueue.hpp"
 #include "layers/OwnThread.hpp"
 
 namespace velkor::http::detail {
 
-/// A thread that does one job after the other, in their order. Thread-safe; jobs run, and are
-/// destroyed, under no lock.
+/// A thread that does one job after the other: those that write before those that read, and among
+/// them in turn those of each owner. Thread-safe; jobs run, and are destroyed, under no lock.
 class Worker {
 public:
     /// What is to be done; it throws nothing.
-    using Job = std::function<void()>;
+    using Job = FairQueue::Job;
 
-    /// Starts the thread; at most `most` jobs wait. Throws `std::system_error` when the system
-    /// refuses.
+    enum class Kind { write, read };
+
+    /// Starts the thread; at most `most` jobs of each kind wait. Throws `std::system_error` when
+    /// the system refuses.
     explicit Worker(std::size_t most);
     ~Worker() { stop(); }
 
     Worker(const Worker&) = delete;
     Worker& operator=(const Worker&) = delete;
 
-    /// Lets `job` be done; false, and nothing has happened, when too many wait or the thread has
-    /// ended.
-    bool post(Job job) VELKOR_EXCLUDES(mutex);
+    /// Lets `job` of `owner` be done. Where too many wait, the newest job of whoever has the most
+    /// waiting is destroyed instead, which may be this one, as all are once the thread has ended.
+    void post(Kind kind, const std::string& owner, Job job) VELKOR_EXCLUDES(mutex);
 
     /// Ends the thread once it has done the job it is at, for which it waits; those that wait are
-    /// destroyed. May be called several times, by one thread at a time, and not by a job.
+    /// destroyed before. May be called several times, by one thread at a time, and not by a job.
     void stop() noexcept VELKOR_EXCLUDES(mutex);
 
 private:
     void run() VELKOR_EXCLUDES(mutex);
     Job nextJob() VELKOR_EXCLUDES(mutex);
 
-    const std::size_t mostWaiting;
     common::Mutex mutex;
     std::condition_variable changed;
-    std::deque<Job> jobs VELKOR_GUARDED_BY(mutex);
+    FairQueue writes VELKOR_GUARDED_BY(mutex);
+    FairQueue reads VELKOR_GUARDED_BY(mutex);
     bool isStopping VELKOR_GUARDED_BY(mutex) = false;
     std::optional<layers::OwnThread> thread;  // the last member: it uses the others
 };

@@ -14,8 +14,11 @@ constexpr std::size_t mostBytes = 1000;
 
 }  // namespace
 
-WriteRecord::WriteRecord(std::string what, const Call& call)
-    : begin(std::move(what) + " by " + call.who + " from " + call.request.client.address + ": ") {}
+WriteRecord::WriteRecord(const Call& call) {
+    begin.append(call.route->method).append(" ").append(call.route->path);
+    begin.append(" by ").append(call.visitor.name);
+    begin.append(" from ").append(call.request.client.address);
+}
 
 void WriteRecord::add(const std::string& key) {
     std::string name = percentEncoded(key);
@@ -23,7 +26,7 @@ void WriteRecord::add(const std::string& key) {
         ++unnamed;
         return;
     }
-    if (!keys.empty()) keys += ", ";
+    keys += keys.empty() ? ": " : ", ";
     keys += name;
 }
 

@@ -11,8 +11,8 @@ namespace velkor::http::detail {
 /// values: "write: PATCH /config by token 2 from 127.0.0.1:50312: a, b -> 200".
 class WriteRecord {
 public:
-    /// Of what the sender of `call` does, called `what`.
-    WriteRecord(std::string what, const Call& call);
+    /// Of what the sender of `call` does at its route.
+    explicit WriteRecord(const Call& call);
 
     /// Names a key that is written. Of many the first ones are named, and the number of the others.
     /// Escaped as in a path: one record is one line.

@@ -122,7 +122,10 @@ std::uint16_t Endpoint::port() const noexcept {
 
 std::optional<Endpoint::Origin> Endpoint::origin() const noexcept {
     if (isUnix()) return std::nullopt;
-    if (family() == AF_INET) return Origin(AF_INET, as<sockaddr_in>(address).sin_addr.s_addr);
+    if (family() == AF_INET) {
+        const in_addr_t own = htonl(INADDR_LOOPBACK);
+        return Origin(AF_INET, isLocal() ? own : as<sockaddr_in>(address).sin_addr.s_addr);
+    }
     const auto socket = as<sockaddr_in6>(address);
     std::uint64_t network = 0;
     std::memcpy(&network, &socket.sin6_addr, sizeof network);

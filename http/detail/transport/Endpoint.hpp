@@ -41,8 +41,8 @@ public:
     /// The port; 0 of a unix socket.
     std::uint16_t port() const noexcept;
 
-    /// What counts as one address: an IPv4 address, an IPv6 network of 64 bits. None of a unix
-    /// socket.
+    /// What counts as one address: an IPv4 address, all of 127.0.0.0/8, an IPv6 network of 64
+    /// bits. None of a unix socket.
     using Origin = std::pair<int, std::uint64_t>;
     std::optional<Origin> origin() const noexcept;
 

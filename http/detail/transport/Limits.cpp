@@ -65,7 +65,7 @@ Limits::Place::~Place() {
 }
 
 Limits::Place::Place(Place&& other) noexcept
-    : limits(std::move(other.limits)), kind(other.kind), origin(other.origin) {}
+    : limits(std::move(other.limits)), kind(other.kind), origin(std::move(other.origin)) {}
 
 Limits::Place& Limits::Place::operator=(Place&& other) noexcept {
     std::swap(limits, other.limits);

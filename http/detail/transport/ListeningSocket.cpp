@@ -90,7 +90,7 @@ int ListeningSocket::accept(Arrival& arrival) const {
 }
 
 void ListeningSocket::refuse(const std::string& reason) const {
-    throw Refused("can't listen on " + where.text() + ": " + reason);
+    throw Refused("can't listen on " + where.text() + ": " + reason, Refused::Cause::system);
 }
 
 void ListeningSocket::refuse(int error) const {

@@ -1,5 +1,6 @@
 #include "http/detail/transport/OptionRules.hpp"
 
+#include <chrono>
 #include <cstddef>
 #include <string>
 #include <utility>
@@ -19,21 +20,34 @@ void checkReach(const ServerOptions& options, const Endpoint& endpoint) {
     if (options.tokenFile.empty()) throw Refused(who + "a file of tokens");
 }
 
+void checkTimes(const ServerOptions& options) {
+    const std::pair<const char*, std::chrono::milliseconds> times[] = {
+        {"requestTimeout", options.requestTimeout},
+        {"writeTimeout", options.writeTimeout},
+        {"idleTimeout", options.idleTimeout},
+        {"commentInterval", options.commentInterval}};
+    for (const auto& [name, time] : times) {
+        if (time < std::chrono::milliseconds(1)) {
+            throw Refused(std::string(name) + " must be at least 1 ms");
+        }
+        if (time > std::chrono::hours(24)) {
+            throw Refused(std::string(name) + " must be at most 24 h");
+        }
+    }
+}
+
 void checkLimits(const ServerOptions& options) {
-    const std::pair<const char*, long long> limits[] = {
-        {"maxHeaderBytes", static_cast<long long>(options.maxHeaderBytes)},
-        {"maxBodyBytes", static_cast<long long>(options.maxBodyBytes)},
-        {"maxJsonDepth", static_cast<long long>(options.maxJsonDepth)},
-        {"maxJsonContainers", static_cast<long long>(options.maxJsonContainers)},
-        {"requestTimeout", options.requestTimeout.count()},
-        {"writeTimeout", options.writeTimeout.count()},
-        {"idleTimeout", options.idleTimeout.count()},
-        {"commentInterval", options.commentInterval.count()},
-        {"maxConnections", static_cast<long long>(options.maxConnections)},
-        {"maxConnectionsPerAddress", static_cast<long long>(options.maxConnectionsPerAddress)},
-        {"maxStreams", static_cast<long long>(options.maxStreams)}};
+    const std::pair<const char*, std::size_t> limits[] = {
+        {"maxHeaderBytes", options.maxHeaderBytes},
+        {"maxBodyBytes", options.maxBodyBytes},
+        {"maxBufferedBytes", options.maxBufferedBytes},
+        {"maxJsonDepth", options.maxJsonDepth},
+        {"maxJsonContainers", options.maxJsonContainers},
+        {"maxConnections", options.maxConnections},
+        {"maxConnectionsPerAddress", options.maxConnectionsPerAddress},
+        {"maxStreams", options.maxStreams}};
     for (const auto& [name, limit] : limits) {
-        if (limit < 1) throw Refused(std::string(name) + " must be at least 1");
+        if (limit == 0) throw Refused(std::string(name) + " must be at least 1");
     }
 }
 
@@ -46,6 +60,7 @@ void checkOptions(const ServerOptions& options) {
         throw Refused("threads must be 1 to 64");
     }
     checkLimits(options);
+    checkTimes(options);
     for (const std::string& text : options.endpoints) checkReach(options, Endpoint(text));
 }
 

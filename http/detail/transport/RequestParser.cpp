@@ -42,6 +42,7 @@ public:
     Request request;
     bool isOld = false;
     bool isExpected = false;  // the client waits for "100 Continue"
+    bool isHeadTaken = false;
 
 private:
     void on_request_impl(beast::http::verb /*verb*/, beast::string_view method,
@@ -76,7 +77,29 @@ private:
         }
     }
 
-    void on_header_impl(error_code& /*code*/) override { isHeadRead = true; }
+    void on_header_impl(error_code& /*code*/) override {
+        isHeadRead = true;
+        takeHostFromTarget();
+    }
+
+    // A target may name the host as well ("http://host/path"), which then holds.
+    void takeHostFromTarget() {
+        if (request.target.front() == '/') return;
+        const std::string target = request.target;
+        constexpr std::string_view mark = "://";
+        const std::size_t scheme = target.find(mark);
+        const bool isAbsolute = beast::iequals(target.substr(0, scheme), "http") ||
+                                beast::iequals(target.substr(0, scheme), "https");
+        if (scheme == std::string::npos || !isAbsolute) return;
+        const std::size_t host = scheme + mark.size();
+        const std::size_t path = std::min(target.find_first_of("/?", host), target.size());
+        request.target = target.substr(path);
+        if (path == target.size() || target[path] == '?') request.target.insert(0, "/");
+        auto& headers = request.headers;
+        const auto isHost = [](const auto& header) { return header.first == "host"; };
+        headers.erase(std::remove_if(headers.begin(), headers.end(), isHost), headers.end());
+        headers.emplace_back("host", target.substr(host, path - host));
+    }
 
     void on_body_init_impl(const boost::optional<std::uint64_t>& length,
                            error_code& /*code*/) override {
@@ -137,6 +160,8 @@ public:
             const bool inHead = !message->is_header_done();
             const std::size_t now =
                 message->put({bytes.data() + taken, bytes.size() - taken}, code);
+            // What is taken of the head is whole headers.
+            if (inHead && isFolded(bytes.substr(taken, now))) code = error::bad_obs_fold;
             taken += now;
             if (inHead) headBytes += now;
             // Only now: the head is to be counted alone.
@@ -151,6 +176,12 @@ public:
     int status = 0;  // of the refusal; 0: none
 
 private:
+    // A header that goes on in the next line: others might read two of it.
+    static bool isFolded(std::string_view head) {
+        return head.find("\r\n ") != std::string_view::npos ||
+               head.find("\r\n\t") != std::string_view::npos;
+    }
+
     // The rest, `left` bytes, is part of the head, or of a line between chunks.
     error_code lineLimit(std::size_t left) const {
         const std::size_t before = message->is_header_done() ? 0 : headBytes;
@@ -185,6 +216,16 @@ bool RequestParser::takeExpectation() noexcept {
     Message& message = *reading->message;
     const bool hasBegun = !message.request.body.empty();
     return message.is_header_done() && std::exchange(message.isExpected, false) && !hasBegun;
+}
+
+const Request* RequestParser::takeHead() noexcept {
+    Message& message = *reading->message;
+    const bool isNew = message.is_header_done() && !std::exchange(message.isHeadTaken, true);
+    return isNew ? &message.request : nullptr;
+}
+
+std::size_t RequestParser::bodySize() const noexcept {
+    return reading->message->request.body.size();
 }
 
 bool RequestParser::keepsAlive() const noexcept {

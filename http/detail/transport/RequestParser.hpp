@@ -11,9 +11,9 @@ namespace velkor::http::detail::transport {
 /// Reads requests, one after the other, from pieces of bytes.
 ///
 /// Refused are, beside what is no HTTP/1.0 or 1.1: a transfer coding other than "chunked", any in
-/// HTTP/1.0, one together with a length, a length that is given twice (all 400: whoever stands
-/// between might read another request than we do), a head that is too large, with its trailers and
-/// the extensions of its chunks (431), and a body that is (413).
+/// HTTP/1.0, one together with a length, a length that is given twice, a folded line (all 400:
+/// whoever stands between might read another request than we do), a head that is too large, with
+/// its trailers and the extensions of its chunks (431), and a body that is (413).
 class RequestParser {
 public:
     enum class State {
@@ -39,6 +39,13 @@ public:
 
     /// Whether the client waits for "100 Continue" before it sends the body. Says so once.
     bool takeExpectation() noexcept;
+
+    /// The request as far as it has been read, once its head has been; null before, and when it has
+    /// been given already. Its client is missing.
+    const Request* takeHead() noexcept;
+
+    /// Bytes of the body so far.
+    std::size_t bodySize() const noexcept;
 
     /// Of a complete request: whether the connection may stay open, and whether it asks for no
     /// body.

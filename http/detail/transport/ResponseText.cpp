@@ -39,8 +39,11 @@ std::string_view reasonOf(int status) {
     return "";
 }
 
-bool hasNoBody(int status) {
-    return status == 204 || status == 304;
+constexpr std::string_view streamType = "text/event-stream";
+
+// The head of a stream may be asked for alone; a stream has no length.
+bool hasLength(const Response& response) {
+    return response.status != 204 && response.status != 304 && response.contentType != streamType;
 }
 
 void add(std::string& head, std::string_view name, std::string_view value) {
@@ -64,7 +67,7 @@ std::string headOf(const Response& response, Staying staying, std::string_view d
     std::string head = beginning(response.status, date);
     if (!response.contentType.empty()) add(head, "Content-Type", response.contentType);
     for (const auto& [name, value] : response.headers) add(head, name, value);
-    if (!hasNoBody(response.status)) {
+    if (hasLength(response)) {
         add(head, "Content-Length", std::to_string(response.body.size()));
     }
     if (staying == Staying::none) add(head, "Connection", "close");
@@ -75,7 +78,7 @@ std::string headOf(const Response& response, Staying staying, std::string_view d
 
 std::string streamHead(std::string_view date) {
     std::string head = beginning(200, date);
-    add(head, "Content-Type", "text/event-stream");
+    add(head, "Content-Type", streamType);
     add(head, "X-Accel-Buffering", "no");  // a proxy is to pass on each event at once
     add(head, "Connection", "close");
     head.append("\r\n");

@@ -7,6 +7,7 @@
 
 #include "http/ServerOptions.hpp"
 #include "http/detail/Exchange.hpp"
+#include "http/detail/transport/Budget.hpp"
 #include "http/detail/transport/Limits.hpp"
 
 namespace velkor::http::detail::transport {
@@ -20,12 +21,14 @@ struct Shared {
           counts(std::move(counted)),
           limits(std::make_shared<Limits>(options.maxConnections, options.maxConnectionsPerAddress,
                                           options.maxStreams, counts)),
+          budget(options.maxBufferedBytes),
           tls(std::move(tlsContext)) {}
 
     const ServerOptions options;
     const std::shared_ptr<Handler> handler;
     const std::shared_ptr<TransportCounts> counts;
     const std::shared_ptr<Limits> limits;
+    Budget budget;
     const std::shared_ptr<SSL_CTX> tls;  ///< Null without TLS.
 };
 

@@ -116,11 +116,14 @@ void Committer::run(const ChangeTable& changeTable) {
 
 void Committer::commit(const ChangeTable& changeTable) {
     begin(changeTable);
+    // Whoever is told of a failure has it alone then: it isn't under way here any more.
+    std::exception_ptr failure;
     try {
         file.commit(writes.batch(), clock());
     } catch (...) {
-        return refuse(changeTable, std::current_exception());
+        failure = std::current_exception();
     }
+    if (failure) return refuse(changeTable, std::move(failure));
     disk.noteCommit();
     writes.finish();
 }

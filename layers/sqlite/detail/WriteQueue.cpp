@@ -55,7 +55,10 @@ void tellAll(WriteQueue::Waiters& waiters, Resolve resolve) noexcept {
 }  // namespace
 
 void WriteQueue::Refusal::tell() noexcept {
-    tellAll(waiters, [this](Waiter& each) { each.promise.setException(reason); });
+    tellAll(waiters, [this](Waiter& each) {
+        const bool isLast = &each == &waiters.back();
+        each.promise.setException(isLast ? std::move(reason) : reason);
+    });
 }
 
 WriteQueue::WriteQueue(std::int64_t newestChange, Deadlines::Map&& initialDeadlines)

@@ -52,7 +52,7 @@ public:
         bool isDone = false;
         Waiters waiters{};
 
-        /// Fails what they wait for.
+        /// Fails what they wait for; the reason is theirs alone afterwards, if there are any.
         void tell() noexcept;
     };
 

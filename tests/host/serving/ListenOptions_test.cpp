@@ -115,6 +115,7 @@ const LimitCase limitCases[] = {
     {"--max-connections", "7", "2000", number<&ServerOptions::maxConnections>, 7},
     {"--max-connections-per-address", "5", "1100", number<&ServerOptions::maxConnectionsPerAddress>,
      5},
+    {"--max-buffered-bytes", "2MiB", "64MiB", number<&ServerOptions::maxBufferedBytes>, 2U << 20U},
     {"--max-streams", "9", "1500", number<&ServerOptions::maxStreams>, 9},
 };
 

@@ -47,7 +47,9 @@ class RefusalTest(ServerTest):
     def test_endpoints_must_be_free_and_understood(self):
         self.assert_refused("no address to listen on", "--listen", "nowhere")
         with socket.create_server(("127.0.0.1", 0)) as taken:
-            self.assert_refused("can't listen", "--listen", str(taken.getsockname()[1]))
+            status, messages = start("--listen", str(taken.getsockname()[1]))
+        self.assertEqual(status, 1)
+        self.assertRegex(messages, r"^velkor-config: can't listen on 127\.0\.0\.1:\d+: .*\n$")
 
     def test_limits_must_make_sense(self):
         self.assert_refused("threads must be", "--listen", "0", "--listen-threads", "0")
@@ -184,19 +186,27 @@ class ConsoleTest(ServerTest):
         server = self.serve("--console", stdin=subprocess.PIPE)
         self.assertEqual(server.end(), 0)
 
-    def test_sigterm_ends_it_on_a_terminal(self):
+    def test_signals_end_it_on_a_terminal(self):
+        for by in [signal.SIGTERM, signal.SIGHUP, signal.SIGINT]:
+            with self.subTest(signal=by):
+                self.check_end_on_a_terminal(by)
+
+    def check_end_on_a_terminal(self, by):
+        path = os.path.join(self.folder, "socket")
         terminal, other = pty.openpty()
         self.addCleanup(os.close, terminal)
-        process = subprocess.Popen([PROGRAM, "--listen", "0", "--console"], stdin=other,
-                                   stdout=other, stderr=subprocess.DEVNULL, start_new_session=True)
+        process = subprocess.Popen([PROGRAM, "--listen", "0", "--listen", "unix:" + path,
+                                    "--console"], stdin=other, stdout=other,
+                                   stderr=subprocess.DEVNULL, start_new_session=True)
         os.close(other)
         self.addCleanup(process.kill)
         shown = b""
         while b"velkor> " not in shown:
             shown += os.read(terminal, 4096)
         self.assertIn(b"Listening on http://127.0.0.1:", shown)
-        process.send_signal(signal.SIGTERM)
+        process.send_signal(by)
         self.assertEqual(process.wait(PATIENCE), 0)
+        self.assertFalse(os.path.exists(path))
 
 
 if __name__ == "__main__":

@@ -22,10 +22,15 @@ export class Server {
     #process;
     #ended;
 
-    static async start(args, port = 0) {
+    static start(args, port = 0) {
+        return Server.run(process.env.VELKOR_CONFIG_PROGRAM,
+            ['--listen', `127.0.0.1:${port}`, '--log', 'velkor::http=fatal,error', ...args]);
+    }
+
+    /// Runs `program`, which says where it listens.
+    static async run(program, args) {
         const server = new Server();
-        server.#process = spawn(process.env.VELKOR_CONFIG_PROGRAM,
-            ['--listen', `127.0.0.1:${port}`, '--log', 'velkor::http=fatal,error', ...args], { stdio: ['ignore', 'pipe', 'inherit'] });
+        server.#process = spawn(program, args, { stdio: ['pipe', 'pipe', 'inherit'] });
         server.#ended = new Promise((resolve) => server.#process.once('exit', resolve));
         for await (const line of createInterface(server.#process.stdout)) {
             server.url = line.replace('Listening on ', '');
@@ -79,9 +84,17 @@ export class Bench {
         return server;
     }
 
+    /// A process that has declared settings.
+    async serveDeclared() {
+        const server = await Server.run(process.env.VELKOR_DECLARING_PROGRAM, []);
+        this.#test.after(() => server.stop());
+        return server;
+    }
+
     /// A new page; nothing that it reports may be left when the test ends.
     async openTab(look = {}) {
         const context = await browser.newContext(look);
+        context.setDefaultTimeout(120_000);  // of a busy machine
         this.#test.after(() => context.close());
         const tab = await context.newPage();
         tab.complaints = [];

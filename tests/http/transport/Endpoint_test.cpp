@@ -83,6 +83,7 @@ TEST(Endpoint, CountsAnAddressOrANetworkAsOneOrigin) {
     EXPECT_NE(origin("1.2.3.4:1"), origin("1.2.3.5:1"));
     EXPECT_EQ(origin("[1:2:3:4:5::]:1"), origin("[1:2:3:4:6::]:1"));
     EXPECT_NE(origin("[1:2:3:4::]:1"), origin("[1:2:3:5::]:1"));
+    EXPECT_EQ(origin("127.0.0.1:1"), origin("127.9.9.9:1"));
     EXPECT_NE(origin("0.0.0.0:1"), origin("[::1]:1"));
     EXPECT_FALSE(origin("unix:/a"));
 }

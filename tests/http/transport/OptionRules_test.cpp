@@ -61,9 +61,18 @@ TEST(OptionRules, WantRoomInEveryLimit) {
     ServerOptions options;
     options.maxStreams = 0;
     EXPECT_EQ(complaint(options), "maxStreams must be at least 1");
-    options.maxStreams = 1;
-    options.idleTimeout = std::chrono::milliseconds(-1);
-    EXPECT_EQ(complaint(options), "idleTimeout must be at least 1");
+}
+
+TEST(OptionRules, WantTimesBetweenAMillisecondAndADay) {
+    ServerOptions options;
+    options.idleTimeout = std::chrono::milliseconds(0);
+    EXPECT_EQ(complaint(options), "idleTimeout must be at least 1 ms");
+    options.idleTimeout = std::chrono::hours(24);
+    EXPECT_EQ(complaint(options), none);
+    options.idleTimeout += std::chrono::milliseconds(1);
+    EXPECT_EQ(complaint(options), "idleTimeout must be at most 24 h");
+    options.idleTimeout = std::chrono::milliseconds::max();
+    EXPECT_EQ(complaint(options), "idleTimeout must be at most 24 h");
 }
 
 }  // namespace

@@ -60,6 +60,30 @@ TEST(RequestParser, PassesOnEachOccurrenceOfTheHeadersThatAreWanted) {
               (Headers{{"host", "a"}, {"host", "b"}, {"sec-fetch-site", "none"}}));
 }
 
+TEST(RequestParser, TakesTheHostFromATargetThatNamesIt) {
+    struct Row {
+        const char* target;
+        const char* path;
+        const char* host;
+    };
+    const Row rows[] = {{"http://a:80/b?c", "/b?c", "a:80"},
+                        {"HTTPS://a/", "/", "a"},
+                        {"http://a", "/", "a"},
+                        {"http://a?b", "/?b", "a"},
+                        {"http:///b", "/b", ""},
+                        {"/b?http://a/", "/b?http://a/", "own"},
+                        {"ftp://a/", "ftp://a/", "own"},
+                        {"*", "*", "own"}};
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.target);
+        const Read result =
+            read("GET " + std::string(row.target) + " HTTP/1.1\r\nHost: own\r\n\r\n");
+        ASSERT_TRUE(result.complete);
+        EXPECT_EQ(result.request.target, row.path);
+        EXPECT_EQ(result.request.headers, (decltype(Request::headers){{"host", row.host}}));
+    }
+}
+
 TEST(RequestParser, JoinsTheChunksOfABody) {
     const Read result = read(
         "POST / HTTP/1.1\r\nTransfer-Encoding: Chunked\r\n\r\n"
@@ -152,6 +176,9 @@ std::vector<Sample> samples() {
         {"NulInHeader", 400, "GET / HTTP/1.1\r\nHost: a\0b\r\n\r\n"s},
         {"SpaceInTarget", 400, "GET /a b HTTP/1.1\r\n\r\n"},
         {"SpaceBeforeColon", 400, withHead("Host : a\r\n")},
+        {"FoldedLine", 400, withHead("Host: a\r\n b\r\nX: y\r\n")},
+        {"LineFoldedAtATab", 400, withHead("X:\r\n\tb\r\n")},
+        {"LastLineFolded", 400, withHead("X: y\r\n \r\n")},
         {"NoColon", 400, withHead("Host\r\n")},
         {"BareLineFeeds", 400, "GET / HTTP/1.1\nHost: a\n\n\r\n\r\n"},
         {"LengthTwice", 400, withHead("Content-Length: 1\r\nContent-Length: 1\r\n", "a")},

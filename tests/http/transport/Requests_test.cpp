@@ -97,6 +97,14 @@ TEST(Requests, ForTheHeadGetNoBody) {
     EXPECT_EQ(client.ask("GET /").body, "GET / ");
 }
 
+TEST(Requests, ForTheHeadDoNotTakeTheBodyFromALaterRefusal) {
+    const Serving serving;
+    HttpClient client(serving.port());
+    EXPECT_EQ(client.ask("HEAD /here").status, 200);
+    client.send("nonsense\r\n\r\n");
+    EXPECT_EQ(client.answer().body, "refused with 400");
+}
+
 TEST(Requests, WithoutAnythingToSayGetNoLength) {
     const Serving serving({}, [](Request&&, const ScriptedHandler::Reply& answer) {
         Response nothing;
@@ -197,6 +205,71 @@ TEST(Requests, WithoutMemoryForTheirAnswerEndTheirConnectionOnly) {
     HttpClient client(serving.port());
     EXPECT_EQ(client.ask("GET /scarce").status, 0);
     EXPECT_EQ(other.ask("GET /").status, 200);
+}
+
+TEST(Requests, ThatAreObjectedToAreNotReadToTheirEnd) {
+    const Serving serving;
+    HttpClient client(serving.port());
+    client.send("POST /forbidden HTTP/1.1\r\nContent-Length: 1000000\r\n\r\nbeginning");
+    const HttpAnswer answer = client.answer();
+    EXPECT_EQ(answer.body, "not even its body");
+    EXPECT_EQ(answer.header("Connection"), "close");
+    EXPECT_EQ(serving.counts->requestsRead, 0U);
+}
+
+TEST(Requests, ThatAreObjectedToAreNotInvited) {
+    const Serving serving;
+    HttpClient client(serving.port());
+    client.send("POST /forbidden HTTP/1.1\r\nContent-Length: 2\r\nExpect: 100-continue\r\n\r\n");
+    EXPECT_EQ(client.answer().status, 403);
+}
+
+TEST(Requests, OfManyClientsTakeABoundedAmountOfMemory) {
+    ServerOptions options;
+    options.maxBufferedBytes = 100'000;
+    const Serving serving(options);
+    const std::string beginning =
+        "POST / HTTP/1.1\r\nContent-Length: 70001\r\n\r\n" + std::string(70'000, 'b');
+    HttpClient first(serving.port());
+    first.send(beginning);
+    EXPECT_TRUE(eventually([&] { return serving.counts->bytesRead == beginning.size(); }));
+    HttpClient second(serving.port());
+    second.send(beginning + "b");
+    EXPECT_EQ(second.answer().status, 503);
+    EXPECT_EQ(HttpClient(serving.port()).ask("GET /").status, 200);
+    first.send("b");
+    EXPECT_EQ(first.answer().status, 200);
+}
+
+TEST(Requests, MayTakeMoreThanTheirShareWhenTheyAreAlone) {
+    ServerOptions options;
+    options.maxBufferedBytes = 1;
+    const Serving serving(options);
+    HttpClient client(serving.port());
+    for (int i = 0; i < 2; ++i) {
+        client.send("POST / HTTP/1.1\r\nContent-Length: 100000\r\n\r\n" +
+                    std::string(100'000, 'b'));
+        EXPECT_EQ(client.answer().body.size(), 100'007U);
+    }
+}
+
+TEST(Requests, WhoseAnswersAreNotReadLeaveRoomForOthers) {
+    ServerOptions options;
+    options.maxBufferedBytes = std::size_t{65} << 20U;
+    const Serving serving(options, [](Request&& request, const ScriptedHandler::Reply& answer) {
+        constexpr std::size_t much = std::size_t{64} << 20U;
+        answer(request.target == "/" ? ScriptedHandler::echo(request)
+                                     : ScriptedHandler::text(std::string(much, 'x')));
+    });
+    HttpClient first(serving.port(), 4096);
+    first.send("GET /much HTTP/1.1\r\n\r\n");
+    first.read(1);
+    HttpClient second(serving.port());
+    EXPECT_EQ(second.ask("GET /much").body, "refused with 503");
+    EXPECT_EQ(second.ask("GET /").status, 200);
+    EXPECT_EQ(serving.counts->answersRefused, 1U);
+    first.close();
+    EXPECT_TRUE(eventually([&] { return second.ask("GET /much").status == 200; }));
 }
 
 struct Hostile {

@@ -50,5 +50,11 @@ TEST(ResponseText, OfAStreamSaysNoLength) {
               "\r\n");
 }
 
+TEST(ResponseText, OfTheHeadOfAStreamAloneSaysNoLengthEither) {
+    Response head;
+    head.contentType = "text/event-stream";
+    EXPECT_EQ(headOf(head, Staying::usual, "").find("Content-Length"), std::string::npos);
+}
+
 }  // namespace
 }  // namespace velkor::http::detail::transport

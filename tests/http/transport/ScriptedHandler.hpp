@@ -110,6 +110,14 @@ public:
         answer(echo(request));
     }
 
+    /// What there is against a request whose target is "/forbidden".
+    std::optional<Response> objection(const Request& head) override {
+        if (head.target != "/forbidden") return std::nullopt;
+        Response response = text("not even its body");
+        response.status = 403;
+        return response;
+    }
+
     Response refusal(int status) const override {
         Response response;
         response.status = status;

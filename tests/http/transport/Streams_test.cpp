@@ -144,6 +144,26 @@ TEST_F(Streams, OfAClientThatReadsNothingTakeNoMoreThanTheyCanWrite) {
     EXPECT_EQ(serving.counts->writesTimedOut, 1U);
 }
 
+TEST_F(Streams, WaitForRoomBeforeTheyTakeAnEvent) {
+    const auto stalled = std::make_shared<FeedControl>();
+    ServerOptions options;
+    options.maxBufferedBytes = 1;
+    const Serving serving(options, [&](Request&& request, const ScriptedHandler::Reply& answer) {
+        answer(std::make_unique<ControlledFeed>(request.target == "/stalled" ? stalled : control));
+    });
+    HttpClient reader = opened(serving);
+    HttpClient other(serving.port(), 4096);
+    other.send("GET /stalled HTTP/1.1\r\n\r\n");
+    EXPECT_EQ(other.answer().status, 200);
+    stalled->push(std::string(std::size_t{64} << 20U, 'x') + "\n\n");
+    other.read(1);
+    control->push("event\n\n");
+    EXPECT_EQ(HttpClient(serving.port()).ask("HEAD /stream").status, 200);
+    EXPECT_EQ(control->taken(), 0U);
+    other.close();
+    EXPECT_EQ(reader.readUntil("\n\n"), "event\n\n");
+}
+
 TEST_F(Streams, OfManyClientsEachShowTheirEvents) {
     constexpr std::size_t many = 200;
     std::vector<std::shared_ptr<FeedControl>> controls;
