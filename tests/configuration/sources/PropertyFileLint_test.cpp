@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "tests/configuration/sources/PropertyReading.hpp"
+#include "tests/configuration/sources/PropertyTexts.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::configuration {
@@ -100,20 +101,33 @@ TEST(PropertyFileLint, SaysWhenTheEndOfATextIsLeftOut) {
     }
 }
 
+::testing::AssertionResult arePlacedIn(std::string_view text,
+                                       const std::vector<PropertyRemark>& remarks) {
+    std::size_t line = 1;
+    std::size_t column = 0;
+    for (const auto& remark : remarks) {
+        const bool isBehindTheLastOne =
+            remark.line > line || (remark.line == line && remark.column >= column);
+        line = remark.line;
+        column = remark.column;
+        if (isBehindTheLastOne && column <= text.size() + 1 && remark.firstLine < line) continue;
+        return ::testing::AssertionFailure() << "for " << ::testing::PrintToString(text);
+    }
+    return ::testing::AssertionSuccess();
+}
+
 TEST(PropertyFileLint, PlacesEveryRemarkInTheTextAndInOrder) {
     RandomTexts texts;
     for (int round = 0; round < 20000; ++round) {
         const std::string text = texts.next();
-        std::size_t line = 1;
-        std::size_t column = 0;
-        for (const auto& remark : remarksOn(text)) {
-            ASSERT_TRUE(remark.line > line || (remark.line == line && remark.column >= column))
-                << ::testing::PrintToString(text);
-            line = remark.line;
-            column = remark.column;
-            ASSERT_LE(column, text.size() + 1);
-            ASSERT_LT(remark.firstLine, line + (remark.firstLine == 0 ? 1 : 0));
-        }
+        ASSERT_TRUE(arePlacedIn(text, remarksOn(text)));
+    }
+}
+
+TEST(PropertyFileLint, EndsOnEveryTextThatTheParserIsTriedOn) {
+    for (const auto& texts :
+         {testing::everyShortText(), testing::randomTexts(), testing::randomEscapes()}) {
+        for (const auto& text : texts) ASSERT_TRUE(arePlacedIn(text, remarksOn(text)));
     }
 }
 
