@@ -32,10 +32,10 @@ std::string unknownCommandText(const std::string& name, const std::vector<std::s
 
 }  // namespace
 
-Future<bool> CommandRegistry::registerCommand(CommandDescriptor command) {
+Future<bool> CommandRegistry::registerCommand(CommandDescriptor command, CommandTraits traits) {
     if (!isWellFormed(command)) return makeReadyFuture(false);
     auto accepted = makeReadyFuture(true);  // beforehand, since making it may fail
-    const bool isNew = add(std::make_shared<const Command>(std::move(command), CommandTraits()));
+    const bool isNew = add(std::make_shared<const Command>(std::move(command), std::move(traits)));
     return isNew ? std::move(accepted) : makeReadyFuture(false);
 }
 

@@ -97,8 +97,7 @@ Future<bool> StoreCommandRegistry::registerCommand(administration::CommandDescri
     } else if (command.name == listName) {
         traits.stream = streamedList(store);
     }
-    return makeReadyFuture(
-        registry->add(std::make_shared<const Command>(std::move(command), std::move(traits))));
+    return registry->registerCommand(std::move(command), std::move(traits));
 }
 
 Future<bool> StoreCommandRegistry::unregisterCommand(const std::string& name) {

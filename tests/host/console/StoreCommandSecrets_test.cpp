@@ -11,6 +11,7 @@
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "settings/Setting.hpp"
+#include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
 namespace {
@@ -18,6 +19,7 @@ namespace {
 using configuration::ConfigurationCommandProvider;
 using settings::secret;
 using settings::Setting;
+using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
 class StoreCommandSecretsTest : public ::testing::Test {
@@ -94,7 +96,10 @@ TEST_F(StoreCommandSecretsTest, KeepsNamesTextsAndLimitsOfCommands) {
     ASSERT_EQ(registry->names(), plain->names());
     for (const auto& name : plain->names()) {
         EXPECT_EQ(registry->find(name)->description(), plain->find(name)->description());
-        EXPECT_EQ(registry->find(name)->argumentText(), plain->find(name)->argumentText());
+        for (const Words& words : {Words{}, Words{"a", "b", "c"}}) {
+            EXPECT_EQ(thrownText<CommandError>([&] { run(name, words); }),
+                      thrownText<CommandError>([&] { plain->find(name)->run(Words(words)); }));
+        }
     }
 }
 
