@@ -12,7 +12,7 @@ namespace velkor::host {
 namespace {
 
 bool isPlainFile(const SourceRequest& request) {
-    return !request.name && request.kind == SourceRequest().kind;
+    return !request.name && request.isFile();
 }
 
 bool isThere(const std::string& path) {

@@ -173,9 +173,7 @@ public:
         if (options.serving) {
             options.serving->server.maxPropertyFileBytes = options.limits.fileBytes;
         }
-        if (checksFiles && files.texts.empty() && sources.texts.empty()) {
-            throw UsageError("--check: a FILE is needed");
-        }
+        if (checksFiles) requireFilesOnly(options);
         return options;
     }
 
@@ -188,6 +186,16 @@ private:
     void add(Repeatable& added, const char* name, const char* value, const char* help) {
         added.option = app.add_option(name, added.texts, help);
         added.option->allow_extra_args(added.option->get_positional())->type_name(value);
+    }
+
+    // What the check of files would leave out without a word.
+    static void requireFilesOnly(const Options& options) {
+        if (options.givesCommands() || options.serving) {
+            throw UsageError("--check goes without -c LINE, -- COMMAND and --listen (see --help)");
+        }
+        const bool hasFile = std::any_of(options.sources.begin(), options.sources.end(),
+                                         [](const auto& source) { return source.isFile(); });
+        if (!hasFile) throw UsageError("--check: a FILE is needed");
     }
 
     static std::vector<std::string> namesOf(const CLI::Option& option) {

@@ -25,6 +25,9 @@ struct Assignment {
 
 /// What the command line asks for.
 struct Options {
+    /// Whether the command line itself says what to carry out.
+    bool givesCommands() const { return !lines.empty() || !command.empty(); }
+
     /// Files in the order of the command line, then the environment.
     std::vector<SourceRequest> sources{};
     SourceLimits limits{};

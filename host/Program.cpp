@@ -29,10 +29,6 @@ Output::Answers formOfAnswers() {
     return terminalHasColours() ? Output::Answers::coloured : Output::Answers::escaped;
 }
 
-bool givesCommands(const Options& options) {
-    return !options.lines.empty() || !options.command.empty();
-}
-
 /// A reader that has gone away is no failure; a full disk is.
 bool answersArrived(Output& output) {
     if (output.isOpen() || output.failure() == EPIPE) return true;
@@ -48,8 +44,8 @@ bool runGiven(Session& session, const Options& options) {
 }
 
 bool run(Session& session, const Options& options) {
-    return givesCommands(options) ? runGiven(session, options)
-                                  : session.converse(options.keepsHistory);
+    return options.givesCommands() ? runGiven(session, options)
+                                   : session.converse(options.keepsHistory);
 }
 
 /// Carries out what the command line gives of commands, then serves until a signal or the console
@@ -84,7 +80,7 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
     }
     session.assign(options.assignments);
     const bool watches = options.watchesFiles.value_or(
-        options.serving || (!givesCommands(options) && commandsAreTyped()));
+        options.serving || (!options.givesCommands() && commandsAreTyped()));
     const bool allLoaded = session.load(options.sources, watches);
     session.declareSettings(declare);
     const bool allCarriedOut =
@@ -96,7 +92,7 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
 ExitCode runCheck(const Options& options, Output& output) {
     std::vector<std::string> paths;
     for (const auto& source : options.sources) {
-        if (source.kind == SourceRequest().kind) paths.push_back(source.location);
+        if (source.isFile()) paths.push_back(source.location);
     }
     CheckedFiles checked;
     StreamedAnswer answer(output);

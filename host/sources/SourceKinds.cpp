@@ -27,10 +27,12 @@ bool canBeWatched(const std::string& path) {
            kind == std::filesystem::file_type::not_found;
 }
 
+// The text is parsed for its remarks and once more for its values: what a remark needs, the places
+// of all lines and keys, is nothing that the source keeps or that other programs should pay for.
+// The remarks come first, so that both never need memory at once.
 MadeSource makePlainFile(const std::string& path, const SourceLimits& limits) {
     const std::string text = readPropertyFile(path, limits);
-    const std::size_t remarks =
-        countRemarks(text);  // first, so that both never need memory at once
+    const std::size_t remarks = countRemarks(text);
     return {std::make_shared<configuration::PropertyFileSource>(configuration::PropertyText{text}),
             remarks};
 }
@@ -65,7 +67,7 @@ MadeSource makeEnvironment(const SourceRequest& request, const SourceLimits&) {
 }
 
 constexpr SourceKind kinds[] = {
-    {"file", stemOfPath, makeFile},
+    {SourceRequest::fileKind, stemOfPath, makeFile},
     {"environment", environmentName, makeEnvironment},
 };
 
