@@ -38,18 +38,6 @@ std::size_t parseLimit(const std::string& text) {
     throw CommandError("--limit " + text + ": a number from 1 on is needed");
 }
 
-/// The value of the option `name`, which may stand behind `least` to `most` other arguments.
-/// Throws `refusal` when something else is there.
-std::optional<std::string> optionBehind(std::size_t least, std::size_t most,
-                                        const Arguments& arguments, const std::string& name,
-                                        const char* refusal) {
-    const std::size_t count = arguments.size();
-    const bool isThere = count >= least + 2 && arguments[count - 2] == name;
-    if (count > most + (isThere ? 2 : 0)) throw CommandError(refusal);
-    if (isThere) return arguments.back();
-    return std::nullopt;
-}
-
 std::string effectiveText(const StorePtr& store, const std::string& key) {
     const auto options = store->explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
@@ -93,10 +81,10 @@ std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
 }
 
 std::string showHistory(const StorePtr& store, const Arguments& arguments) {
-    const auto limit =
-        optionBehind(0, 1, arguments, "--limit", "What follows KEY is no --limit N.");
-    const bool hasKey = arguments.size() == (limit ? 3 : 1);
-    return historyTable(store, stateOf(*store).history(hasKey ? arguments.front() : "",
+    const OptionWords given("history", historyUsage, 0, arguments);
+    const auto keys = given.texts();
+    const auto limit = given.value("--limit");
+    return historyTable(store, stateOf(*store).history(keys.empty() ? "" : keys.front(),
                                                        limit ? parseLimit(*limit) : usualLimit));
 }
 

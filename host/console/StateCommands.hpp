@@ -25,11 +25,13 @@ inline constexpr const char* unsetUsage = "KEY [--source SOURCE]";
 std::string unsetKey(const std::shared_ptr<SessionStore>& store,
                      const std::vector<std::string>& arguments);
 
-/// [KEY] [--limit N]: a table of the newest changes of the layer that lasts, the newest first, of
-/// KEY, of all keys that KEY with a "." at its end begins, or of all; at most N, or 20.
-///
-/// Throws `CommandError` "--limit N: a number from 1 on is needed", "What follows KEY is no --limit
-/// N." and as `stateOf`.
+/// What `showHistory` takes.
+inline constexpr const char* historyUsage = "[KEY] [--limit N]";
+
+/// A table of the newest changes of the layer that lasts, the newest first, of KEY, of all keys
+/// that KEY with a "." at its end begins, or of all; at most N, or 20. `arguments` are words as
+/// they were typed, see `OptionWords`. Throws `CommandError` "--limit N: a number from 1 on is
+/// needed", and as `OptionWords` and `stateOf`.
 std::string showHistory(const std::shared_ptr<SessionStore>& store,
                         const std::vector<std::string>& arguments);
 

@@ -107,20 +107,24 @@ INSTANTIATE_TEST_SUITE_P(
                       HistoryCase{"AKey", {"a"}, "history 'a' 20"},
                       HistoryCase{"APrefix", {"server."}, "history 'server.' 20"},
                       HistoryCase{"AFew", {"--limit", "3"}, "history '' 3"},
-                      HistoryCase{"AFewOfAKey", {"a", "--limit", "3"}, "history 'a' 3"}),
+                      HistoryCase{"AFewOfAKey", {"a", "--limit", "3"}, "history 'a' 3"},
+                      HistoryCase{"AFewOfAKeyBehind", {"--limit", "3", "a"}, "history 'a' 3"},
+                      HistoryCase{"AKeyLikeAnOption", {"'--limit'"}, "history '--limit' 20"}),
     [](const auto& tested) { return tested.param.test; });
 
 TEST_F(StateCommandsTest, HistoryRefusesALimitThatIsNoCount) {
-    for (const char* text : {"0", "-1", "x", "1x", "", "99999999999999999999"}) {
+    for (const char* text : {"0", "-1", "x", "1x", "99999999999999999999"}) {
         EXPECT_EQ(refusal(showHistory, {"--limit", text}),
                   "--limit " + std::string(text) + ": a number from 1 on is needed");
     }
+    EXPECT_EQ(refusal(showHistory, {"--limit", "''"}), "--limit : a number from 1 on is needed");
 }
 
-TEST_F(StateCommandsTest, HistoryRefusesWhatIsNoLimitBehindTheKey) {
-    for (const Words& arguments : {Words{"a", "--limit"}, Words{"a", "b"}, Words{"a", "b", "c"}}) {
-        EXPECT_EQ(refusal(showHistory, arguments), "What follows KEY is no --limit N.");
-    }
+TEST_F(StateCommandsTest, HistoryRefusesASecondKeyAndOtherOptions) {
+    EXPECT_EQ(refusal(showHistory, {"a", "b"}), "history takes [KEY] [--limit N]");
+    EXPECT_EQ(refusal(showHistory, {"a", "--limit"}), "history: --limit needs N.");
+    EXPECT_EQ(refusal(showHistory, {"--all"}),
+              "history knows no option --all; quote it where it is an ordinary word.");
 }
 
 TEST_F(StateCommandsTest, UndoShowsTheChangeThatItMakes) {
