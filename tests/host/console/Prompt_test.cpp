@@ -1,6 +1,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -45,6 +46,24 @@ TEST_F(PromptTest, TheFirstLineNamesHelp) {
     EXPECT_TRUE(terminal.shows(prompt));
 }
 
+TEST_F(PromptTest, TheSessionInTheManualIsWhatATerminalShows) {
+    std::ifstream manual(VELKOR_DOCUMENTS "/console.md");
+    std::string line;
+    while (std::getline(manual, line) && line.rfind("    $ velkor-config ", 0) != 0) continue;
+    TerminalSession terminal(
+        {VELKOR_EXAMPLES "/service.properties", VELKOR_EXAMPLES "/site.properties"});
+    std::string shown;
+    while (std::getline(manual, line) && line.rfind("    ", 0) == 0) {
+        const std::string text = line.substr(4);
+        shown += text + "\r\n";
+        if (text.rfind(prompt, 0) != 0) continue;
+        EXPECT_TRUE(terminal.shows(prompt));
+        terminal.type(text.substr(std::strlen(prompt)) + '\n');
+    }
+    EXPECT_EQ(terminal.exitCode(), 0);
+    EXPECT_EQ(terminal.everything(), shown);
+}
+
 TEST_F(PromptTest, TheQuestionMarkHelps) {
     TerminalSession terminal({});
     EXPECT_TRUE(terminal.shows(prompt));
@@ -58,6 +77,15 @@ TEST_F(PromptTest, WhatWasTypedIsThereInTheNextSession) {
     EXPECT_TRUE(terminal.shows(prompt));
     terminal.type(std::string(arrowUp) + arrowUp + "\n");
     EXPECT_TRUE(terminal.shows("No configuration option with key: a"));
+}
+
+TEST_F(PromptTest, WhatWasTypedIsPrivate) {
+    using Perms = std::filesystem::perms;
+    EXPECT_NE(historyAfter({"set a 1"}), "");
+    const auto kept = folder.parent() / "velkor";
+    EXPECT_EQ(std::filesystem::status(kept).permissions(), Perms::owner_all);
+    EXPECT_EQ(std::filesystem::status(kept / "history").permissions(),
+              Perms::owner_read | Perms::owner_write);
 }
 
 TEST_F(PromptTest, ALineThatBeginsWithABlankIsNotKept) {
