@@ -200,6 +200,95 @@ TEST(Program, PutFailsWhereTheValueDoesNotFit) {
     EXPECT_EQ(result.exitCode, 1);
 }
 
+struct PutCase {
+    const char* type;
+    std::string words;
+    std::string value;  ///< As JSON.
+
+    friend std::ostream& operator<<(std::ostream& out, const PutCase& it) { return out << it.type; }
+};
+
+class PutTypeTest : public ::testing::TestWithParam<PutCase> {};
+
+TEST_P(PutTypeTest, IsStored) {
+    const std::string type = GetParam().type;
+    const auto result =
+        runProgram({}, "put a --type " + type + ' ' + GetParam().words + "\nshow a --json\n");
+    EXPECT_EQ(result.out,
+              "{\n\"a\":{\"type\":\"" + type + "\",\"value\":" + GetParam().value + "}\n}\n");
+    EXPECT_EQ(result.err, "");
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Types, PutTypeTest,
+    ::testing::Values(PutCase{"bool", "false", "false"}, PutCase{"int", "-5", "-5"},
+                      PutCase{"uint", "4294967295", "4294967295"}, PutCase{"double", "1", "1"},
+                      PutCase{"string", "5", "\"5\""}, PutCase{"ustring", "x", "\"x\""},
+                      PutCase{"boolArray", "true false", "[true,false]"},
+                      PutCase{"intArray", "1 -2", "[1,-2]"}, PutCase{"uintArray", "", "[]"},
+                      PutCase{"doubleArray", "0.5 2", "[0.5,2]"},
+                      PutCase{"stringArray", "a 'b c'", "[\"a\",\"b c\"]"},
+                      PutCase{"ustringArray", "\u20ac", "[\"\u20ac\"]"}),
+    [](const auto& tested) { return std::string(tested.param.type); });
+
+TEST(Program, PutTakesAWholeWordForANumberOnly) {
+    EXPECT_EQ(runProgram({}, "put a 10.20.0.9\nput b 20s\nput c 1e3\nput d true\nlist\n").out,
+              "a = '10.20.0.9'\nb = '20s'\nc = 1000\nd = true\n");
+}
+
+TEST(Program, PutReportsWhatTheStoreRefuses) {
+    const auto result = runProgram({"--source", "s=" + serviceFile, "-c", "put a 1 --source s"});
+    EXPECT_EQ(result.err, "velkor-config: put: Source not found or not writable: a, s\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, PutAndUnsetReachTheSourceThatIsNamed) {
+    const auto result = runProgram({},
+                                   "put a 1 --source default\nput a 2\n"
+                                   "unset a\nunset a --source default\nunset a\n");
+    EXPECT_EQ(result.out, "a = 1 (default)\nNo configuration option with key: a\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 5: Nothing to unset: No configuration option with key: a\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, LoadsAndUnloadsSourcesAsItGoes) {
+    const TemporaryFile file("port=80\n");
+    const std::string path = file.path().string();
+    const auto result =
+        runProgram({}, "load " + path + "\nload " + path +
+                           " --name site --group server --order 7\nsources\nget server.port\n"
+                           "unload site\nunload file\nlist\nunload override\nload /no/file\n");
+    EXPECT_EQ(result.out,
+              "Loaded as file.\n"
+              "Loaded as site.\n"
+              "NAME      GROUP    ORDER       ACCESS\n"
+              "override  -        0           writable\n"
+              "site      server.  7           read-only\n"
+              "file      -        1000        read-only\n"
+              "default   -        2147483647  writable\n"
+              "'80'\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 8: The session needs its source: override\n"
+              "velkor-config: line 9: Property file could not be opened: /no/file: No such "
+              "file or directory\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, DropsNoCommandBesideACheck) {
+    for (const std::vector<std::string>& command :
+         {std::vector<std::string>{"-c", "list"}, std::vector<std::string>{"--", "list"}}) {
+        std::vector<std::string> arguments{"--check", serviceFile};
+        arguments.insert(arguments.end(), command.begin(), command.end());
+        const auto result = runProgram(arguments);
+        EXPECT_EQ(result.out, "");
+        EXPECT_EQ(result.err,
+                  "velkor-config: --check goes without -c LINE, -- COMMAND and --listen (see "
+                  "--help)\n");
+        EXPECT_EQ(result.exitCode, 2);
+    }
+}
+
 TEST(Program, ReportsWhatASourceRefuses) {
     const auto result = runProgram(
         {"--source", "s=" + serviceFile + ",order=-1,writable", "-c", "set server.port 1"});

@@ -98,6 +98,21 @@ TEST(Export, IsThatOfLayersAsTheyAreEffective) {
     EXPECT_EQ(run("export --format json ?"), run("show --json"));
 }
 
+TEST(Export, OfTwoFilesTakesTheirPlace) {
+    const TemporaryFile a("host = a.example\nport = 80\nname = \\u20AC\n", "a.properties");
+    const TemporaryFile b("port = 8080\nuser = me\n", "b.properties");
+    const std::string first = a.path().string();
+    const std::string second = b.path().string();
+    EXPECT_EQ(runProgram({first, second, "-c", "diff b"}).out,
+              "~ port = '80' -> '8080'\n+ user = 'me'\n");
+    const TemporaryFile c(runProgram({first, second, "-c", "export --format properties"}).out, "c");
+    const auto before = runProgram({first, second, "-c", "show --json"});
+    const auto after = runProgram({c.path().string(), "-c", "show --json"});
+    EXPECT_EQ(before.out.rfind("{\n\"host\":", 0), 0U);
+    EXPECT_EQ(after.out, before.out);
+    EXPECT_EQ(after.err + before.err, "");
+}
+
 TEST(Export, ToJsonKeepsEveryType) {
     const auto first = runProgram({}, everyType + "export --format json\n");
     const std::string exported = lastLines(first.out, "{\n");
