@@ -236,10 +236,18 @@ TEST(Program, PutTakesAWholeWordForANumberOnly) {
               "a = '10.20.0.9'\nb = '20s'\nc = 1000\nd = true\n");
 }
 
-TEST(Program, PutReportsWhatTheStoreRefuses) {
-    const auto result = runProgram({"--source", "s=" + serviceFile, "-c", "put a 1 --source s"});
-    EXPECT_EQ(result.err, "velkor-config: put: Source not found or not writable: a, s\n");
-    EXPECT_EQ(result.exitCode, 1);
+TEST(Program, PutAndUnsetReportWhatTheStoreRefuses) {
+    for (const std::string name : {"put", "unset"}) {
+        const std::string command = name + (name == "put" ? " a 1" : " server.port");
+        const auto result =
+            runProgram({"--source", "s=" + serviceFile, "-c", command + " --source s"});
+        EXPECT_EQ(
+            result.err.rfind("velkor-config: " + name + ": Source not found or not writable: ", 0),
+            0U)
+            << result.err;
+        EXPECT_EQ(result.out, "");
+        EXPECT_EQ(result.exitCode, 1);
+    }
 }
 
 TEST(Program, PutAndUnsetReachTheSourceThatIsNamed) {

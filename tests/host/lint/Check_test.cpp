@@ -207,6 +207,14 @@ TEST(Check, IsMentionedWhereAFileIsLoaded) {
     }
 }
 
+TEST(Check, IsMentionedWhereACommandLoadsAFile) {
+    const TemporaryFile file("a = 1 \n");
+    const auto result = runProgram({"-c", "load " + file.path().string()});
+    EXPECT_EQ(result.out, "Loaded as file.\n");
+    EXPECT_EQ(result.err, "velkor-config: " + file.path().string() + ": 1 remark, see check\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
 TEST(Check, EndsQuietlyWhereNobodyReadsIt) {
     const TemporaryFile file("a = 1 \n");
     const auto result = runProgramWithOutput({"--check", file.path().string()}, "", -1);

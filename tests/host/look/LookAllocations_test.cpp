@@ -23,17 +23,18 @@ using Words = std::vector<std::string>;
 using velkor::testing::allocationsOfThisThread;
 using velkor::testing::blocksHeldByThisThread;
 
-// Tells what a command costs up to its first line, and holds at its lines.
+// Tells what a command costs up to its first lines, and holds at its lines. JSON shows its first
+// value by the third.
 class MeasuredOutput final : public CommandOutput {
 public:
     void line(std::string_view) override {
-        if (lines++ == 0) allocationsToFirstLine = allocationsOfThisThread() - allocationsBefore;
+        if (++lines == 3) allocationsToFirstLines = allocationsOfThisThread() - allocationsBefore;
         mostBlocks = std::max(mostBlocks, blocksHeldByThisThread() - blocksBefore);
     }
     void note(std::string_view text) override { ADD_FAILURE() << text; }
 
     std::size_t lines = 0;
-    std::size_t allocationsToFirstLine = 0;
+    std::size_t allocationsToFirstLines = 0;
     std::ptrdiff_t mostBlocks = 0;
 
 private:
@@ -78,12 +79,12 @@ protected:
     }
 };
 
-TEST_P(LookAllocations, TheFirstLineComesBeforeAllKeysAreLookedAt) {
+TEST_P(LookAllocations, TheFirstLinesComeBeforeMostKeysAreKept) {
     const auto few = measure(1'000);
     const auto many = measure(100'000);
     EXPECT_GE(few.lines, 1'000U);
     EXPECT_GE(many.lines, 100'000U);
-    EXPECT_EQ(few.allocationsToFirstLine, many.allocationsToFirstLine);
+    EXPECT_EQ(few.allocationsToFirstLines, many.allocationsToFirstLines);
 }
 
 TEST_P(LookAllocations, MemoryIsThatOfSomeOfTheKeys) {
