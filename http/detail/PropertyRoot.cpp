@@ -75,24 +75,20 @@ PropertyRoot::PropertyRoot(const std::string& path, std::uintmax_t mostFileBytes
     : root(::open(path.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC)),
       name(std::filesystem::absolute(path).lexically_normal().native()),
       mostBytes(mostFileBytes) {
-    if (root < 0) {
+    if (!root) {
         throw Refused("can't use the property root " + path + ": " + systemText(errno));
     }
-}
-
-PropertyRoot::~PropertyRoot() {
-    ::close(root);
 }
 
 std::string PropertyRoot::read(const std::string& path) const {
     // The system would take the path to end at its first NUL.
     if (path.find('\0') != std::string::npos) failToOpen(path, systemText(EINVAL));
-    const std::string folder = placeOf(root);
+    const std::string folder = placeOf(root.get());
     if (!isBelow(folder, asWritten(folder, path)) && !isBelow(name, asWritten(name, path))) {
         refuse(path);
     }
     // Opens the place and not the file: a pipe isn't waited for, and a device isn't touched.
-    const Descriptor place(::openat(root, path.c_str(), O_PATH | O_CLOEXEC));
+    const Descriptor place(::openat(root.get(), path.c_str(), O_PATH | O_CLOEXEC));
     if (!place) failToOpen(path, systemText(errno));
     if (!isBelow(folder, placeOf(place.get()))) refuse(path);
     struct stat status {};
