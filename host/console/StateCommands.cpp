@@ -21,7 +21,7 @@ namespace {
 
 using configuration::ConfigurationValue;
 using Arguments = std::vector<std::string>;
-using StorePtr = std::shared_ptr<SessionStore>;
+using SessionPtr = std::shared_ptr<SessionStore>;
 using std::chrono::milliseconds;
 
 constexpr std::size_t usualLimit = 20;
@@ -66,7 +66,7 @@ std::optional<std::string> optionBehind(std::size_t least, std::size_t most,
     return std::nullopt;
 }
 
-std::string effectiveText(const StorePtr& store, const std::string& key) {
+std::string effectiveText(const SessionPtr& store, const std::string& key) {
     const auto options = store->explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
     const bool isSecret = settings::secretKeys(store).count(key) != 0;
@@ -77,7 +77,7 @@ std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSec
     return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(const StorePtr& store,
+std::string historyTable(const SessionPtr& store,
                          const std::vector<configuration::RecordedChange>& changes) {
     const auto secrets = settings::secretKeys(store);
     std::vector<std::vector<std::string>> rows{
@@ -93,7 +93,7 @@ std::string historyTable(const StorePtr& store,
 
 }  // namespace
 
-std::string putValue(const StorePtr& store, const Arguments& arguments) {
+std::string putValue(const SessionPtr& store, const Arguments& arguments) {
     const auto lifetime =
         optionBehind(2, 2, arguments, "--for", "What follows VALUE is no --for TIME.");
     ConfigurationValue value = configuration::typedText(arguments.at(1));
@@ -108,7 +108,7 @@ std::string putValue(const StorePtr& store, const Arguments& arguments) {
     return "";
 }
 
-std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
+std::string unsetKey(const SessionPtr& store, const Arguments& arguments) {
     const std::string& key = arguments.at(0);
     store->noteWrite();
     const bool wasThere = store->unset(key).get();
@@ -116,7 +116,7 @@ std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
     return effectiveText(store, key);
 }
 
-std::string showHistory(const StorePtr& store, const Arguments& arguments) {
+std::string showHistory(const SessionPtr& store, const Arguments& arguments) {
     const auto limit =
         optionBehind(0, 1, arguments, "--limit", "What follows KEY is no --limit N.");
     const bool hasKey = arguments.size() == (limit ? 3 : 1);
@@ -124,7 +124,7 @@ std::string showHistory(const StorePtr& store, const Arguments& arguments) {
                                                        limit ? parseLimit(*limit) : usualLimit));
 }
 
-std::string undoChange(const StorePtr& store, const Arguments& arguments) {
+std::string undoChange(const SessionPtr& store, const Arguments& arguments) {
     StateLayer& state = stateOf(*store);
     std::optional<std::int64_t> number;
     if (!arguments.empty()) {
