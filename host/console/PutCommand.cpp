@@ -21,7 +21,7 @@ namespace {
 using configuration::ConfigurationValue;
 using configuration::Option;
 using std::chrono::milliseconds;
-using StorePtr = std::shared_ptr<SessionStore>;
+using SessionPtr = std::shared_ptr<SessionStore>;
 
 constexpr milliseconds longestLifetime = std::chrono::hours(24) * 36500;
 
@@ -81,7 +81,7 @@ std::string effectiveCell(const std::optional<Option>& option, bool isSecret) {
     return valueText(option->value, isSecret) + " (" + option->source + ')';
 }
 
-std::string preview(const StorePtr& store, const Order& order) {
+std::string preview(const SessionPtr& store, const Order& order) {
     const auto outcome = store->apply({{order.key, order.value, order.source}}, true).get();
     const std::string& target = outcome.front().source;
     const auto& before = outcome.front().before;
@@ -99,7 +99,7 @@ std::string preview(const StorePtr& store, const Order& order) {
           effectiveCell(isCovered ? now : written, isSecret)}});
 }
 
-void carryOut(const StorePtr& store, Order order) {
+void carryOut(const SessionPtr& store, Order order) {
     if (order.lifetime) {
         store->noteWrite();
         stateOf(*store).setFor(order.key, std::move(order.value), *order.lifetime);
@@ -112,7 +112,7 @@ void carryOut(const StorePtr& store, Order order) {
 
 }  // namespace
 
-std::string putValue(const StorePtr& store, const std::vector<std::string>& arguments) {
+std::string putValue(const SessionPtr& store, const std::vector<std::string>& arguments) {
     const OptionWords given("put", putUsage, 1, arguments);
     Order order = readOrder(*store, given);
     if (given.has("--dry-run")) return preview(store, order);

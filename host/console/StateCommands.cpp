@@ -19,7 +19,7 @@ namespace {
 
 using configuration::ConfigurationValue;
 using Arguments = std::vector<std::string>;
-using StorePtr = std::shared_ptr<SessionStore>;
+using SessionPtr = std::shared_ptr<SessionStore>;
 
 constexpr std::size_t usualLimit = 20;
 
@@ -38,7 +38,7 @@ std::size_t parseLimit(const std::string& text) {
     throw CommandError("--limit " + text + ": a number from 1 on is needed");
 }
 
-std::string effectiveText(const StorePtr& store, const std::string& key) {
+std::string effectiveText(const SessionPtr& store, const std::string& key) {
     const auto options = store->explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
     const bool isSecret = settings::secretKeys(store).count(key) != 0;
@@ -49,7 +49,7 @@ std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSec
     return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(const StorePtr& store,
+std::string historyTable(const SessionPtr& store,
                          const std::vector<configuration::RecordedChange>& changes) {
     const auto secrets = settings::secretKeys(store);
     std::vector<std::vector<std::string>> rows{
@@ -70,7 +70,7 @@ StateLayer& stateOf(const SessionStore& store) {
     throw CommandError("Nothing lasts in this session; start it with --state FILE for that.");
 }
 
-std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
+std::string unsetKey(const SessionPtr& store, const Arguments& arguments) {
     const OptionWords given("unset", unsetUsage, 1, arguments);
     const std::string& key = given.words().front().text;
     const auto source = given.value("--source");
@@ -80,7 +80,7 @@ std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
     return effectiveText(store, key);
 }
 
-std::string showHistory(const StorePtr& store, const Arguments& arguments) {
+std::string showHistory(const SessionPtr& store, const Arguments& arguments) {
     const OptionWords given("history", historyUsage, 0, arguments);
     const auto keys = given.texts();
     const auto limit = given.value("--limit");
@@ -88,7 +88,7 @@ std::string showHistory(const StorePtr& store, const Arguments& arguments) {
                                                        limit ? parseLimit(*limit) : usualLimit));
 }
 
-std::string undoChange(const StorePtr& store, const Arguments& arguments) {
+std::string undoChange(const SessionPtr& store, const Arguments& arguments) {
     StateLayer& state = stateOf(*store);
     std::optional<std::int64_t> number;
     if (!arguments.empty()) {

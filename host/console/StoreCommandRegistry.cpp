@@ -16,7 +16,7 @@ namespace {
 
 using administration::CommandHandler;
 using configuration::AppliedChange;
-using StorePtr = std::shared_ptr<SessionStore>;
+using SessionPtr = std::shared_ptr<SessionStore>;
 
 constexpr const char* getName = "velkor.configuration.get";
 constexpr const char* setName = "velkor.configuration.set";
@@ -30,7 +30,7 @@ std::string argumentNames(const std::string& command) {
 }
 
 /// What is to be said of `text` that was set for `key`; empty when it is there as it was meant.
-std::string remarkOn(const StorePtr& store, const std::string& key, const std::string& text) {
+std::string remarkOn(const SessionPtr& store, const std::string& key, const std::string& text) {
     const std::string beginning = "set " + abbreviated(key, mostShownBytes) + ": ";
     try {
         const AppliedChange written = store->apply({{key, text}}, true).get().front();
@@ -45,7 +45,7 @@ std::string remarkOn(const StorePtr& store, const std::string& key, const std::s
     }
 }
 
-CommandHandler remarkingSet(const StorePtr& store, CommandHandler set,
+CommandHandler remarkingSet(const SessionPtr& store, CommandHandler set,
                             StoreCommandRegistry::Remark remark) {
     return [store, set = std::move(set),
             remark = std::move(remark)](std::vector<std::string>&& arguments) {
@@ -58,7 +58,7 @@ CommandHandler remarkingSet(const StorePtr& store, CommandHandler set,
     };
 }
 
-CommandHandler maskingGet(const StorePtr& store, CommandHandler get) {
+CommandHandler maskingGet(const SessionPtr& store, CommandHandler get) {
     return [store, get = std::move(get)](std::vector<std::string>&& arguments) {
         const std::string key = arguments.at(0);
         // The command looks for the key itself, and may find none.
@@ -68,7 +68,7 @@ CommandHandler maskingGet(const StorePtr& store, CommandHandler get) {
 }
 
 // Every line as the command writes it.
-StreamingHandler streamedList(const StorePtr& store) {
+StreamingHandler streamedList(const SessionPtr& store) {
     return [store](std::vector<std::string>&&, CommandOutput& output) {
         const auto secrets = settings::secretKeys(store);
         OptionWriter writer;
@@ -81,7 +81,7 @@ StreamingHandler streamedList(const StorePtr& store) {
 
 }  // namespace
 
-StoreCommandRegistry::StoreCommandRegistry(StorePtr sessionStore,
+StoreCommandRegistry::StoreCommandRegistry(SessionPtr sessionStore,
                                            std::shared_ptr<CommandRegistry> commandRegistry,
                                            Remark showRemark)
     : store(std::move(sessionStore)),

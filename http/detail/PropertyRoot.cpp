@@ -14,6 +14,7 @@
 
 #include "configuration/StoreErrors.hpp"
 #include "http/Refused.hpp"
+#include "http/detail/Descriptor.hpp"
 
 namespace velkor::http::detail {
 
@@ -32,24 +33,6 @@ std::string systemText(int reason) {
 [[noreturn]] void refuse(const std::string& path) {
     throw std::runtime_error(store_errors::fileNotAllowed + path);
 }
-
-/// A descriptor that is closed with it. One below zero stands for none.
-class Descriptor {
-public:
-    explicit Descriptor(int number) : descriptor(number) {}
-    ~Descriptor() {
-        if (isOpen()) ::close(descriptor);
-    }
-
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-
-    bool isOpen() const { return descriptor >= 0; }
-    int number() const { return descriptor; }
-
-private:
-    const int descriptor;
-};
 
 std::string linkTo(int descriptor) {
     return "/proc/self/fd/" + std::to_string(descriptor);
@@ -76,7 +59,7 @@ std::string readAll(const Descriptor& file, const std::string& path, std::uintma
     constexpr std::size_t blockSize = std::size_t{1} << 16U;
     std::array<char, blockSize> block;
     for (;;) {
-        const ssize_t count = ::read(file.number(), block.data(), block.size());
+        const ssize_t count = ::read(file.get(), block.data(), block.size());
         if (count < 0) failToOpen(path, systemText(errno));
         if (count == 0) return text;
         text.append(block.data(), static_cast<std::size_t>(count));
@@ -92,31 +75,27 @@ PropertyRoot::PropertyRoot(const std::string& path, std::uintmax_t mostFileBytes
     : root(::open(path.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC)),
       name(std::filesystem::absolute(path).lexically_normal().native()),
       mostBytes(mostFileBytes) {
-    if (root < 0) {
+    if (!root) {
         throw Refused("can't use the property root " + path + ": " + systemText(errno));
     }
-}
-
-PropertyRoot::~PropertyRoot() {
-    ::close(root);
 }
 
 std::string PropertyRoot::read(const std::string& path) const {
     // The system would take the path to end at its first NUL.
     if (path.find('\0') != std::string::npos) failToOpen(path, systemText(EINVAL));
-    const std::string folder = placeOf(root);
+    const std::string folder = placeOf(root.get());
     if (!isBelow(folder, asWritten(folder, path)) && !isBelow(name, asWritten(name, path))) {
         refuse(path);
     }
     // Opens the place and not the file: a pipe isn't waited for, and a device isn't touched.
-    const Descriptor place(::openat(root, path.c_str(), O_PATH | O_CLOEXEC));
-    if (!place.isOpen()) failToOpen(path, systemText(errno));
-    if (!isBelow(folder, placeOf(place.number()))) refuse(path);
+    const Descriptor place(::openat(root.get(), path.c_str(), O_PATH | O_CLOEXEC));
+    if (!place) failToOpen(path, systemText(errno));
+    if (!isBelow(folder, placeOf(place.get()))) refuse(path);
     struct stat status {};
-    if (::fstat(place.number(), &status) != 0) failToOpen(path, systemText(errno));
+    if (::fstat(place.get(), &status) != 0) failToOpen(path, systemText(errno));
     if (!S_ISREG(status.st_mode)) failToOpen(path, "Not a regular file");
-    const Descriptor file(::open(linkTo(place.number()).c_str(), O_RDONLY | O_CLOEXEC));
-    if (!file.isOpen()) failToOpen(path, systemText(errno));
+    const Descriptor file(::open(linkTo(place.get()).c_str(), O_RDONLY | O_CLOEXEC));
+    if (!file) failToOpen(path, systemText(errno));
     return readAll(file, path, mostBytes);
 }
 

@@ -3,6 +3,8 @@
 #include <cstdint>
 #include <string>
 
+#include "http/detail/Descriptor.hpp"
+
 namespace velkor::http::detail {
 
 /// The folder that clients may name property files in. They are read here, so that the system's
@@ -15,10 +17,6 @@ public:
     /// `mostFileBytes` are not read. Throws `Refused` "can't use the property root PATH:
     /// REASON", the reason being the system's.
     PropertyRoot(const std::string& path, std::uintmax_t mostFileBytes);
-    ~PropertyRoot();
-
-    PropertyRoot(const PropertyRoot&) = delete;
-    PropertyRoot& operator=(const PropertyRoot&) = delete;
 
     /// The content of the regular file at `path`, which is absolute or begins at the root. A path
     /// that leads out of the root as it is written is not even looked up, and one that leads out by
@@ -32,7 +30,7 @@ public:
     std::string read(const std::string& path) const;
 
 private:
-    const int root;
+    const Descriptor root;
     const std::string name;
     const std::uintmax_t mostBytes;
 };

@@ -9,24 +9,13 @@
 #include <unistd.h>
 
 #include "http/Refused.hpp"
+#include "http/detail/Descriptor.hpp"
 
 namespace velkor::http::detail {
 
 namespace {
 
 constexpr std::size_t mostBytes = std::size_t{64} << 10U;
-
-class File {
-public:
-    explicit File(const char* path) : descriptor(::open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK)) {}
-    ~File() {
-        if (descriptor >= 0) ::close(descriptor);
-    }
-    File(const File&) = delete;
-    File& operator=(const File&) = delete;
-
-    const int descriptor;
-};
 
 [[noreturn]] void refuse(const std::string& path, const std::string& reason) {
     throw Refused("can't read the token file " + path + ": " + reason);
@@ -37,10 +26,10 @@ public:
 }
 
 std::string contentOf(const std::string& path) {
-    const File file(path.c_str());
-    if (file.descriptor < 0) refuseForSystem(path);
+    const Descriptor file(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    if (!file) refuseForSystem(path);
     struct stat status {};
-    if (::fstat(file.descriptor, &status) != 0) refuseForSystem(path);
+    if (::fstat(file.get(), &status) != 0) refuseForSystem(path);
     if (!S_ISREG(status.st_mode)) refuse(path, "no regular file");
     if ((status.st_mode & (S_IRGRP | S_IWGRP | S_IROTH | S_IWOTH)) != 0) {
         throw Refused("the token file " + path + " is open to others than its owner (chmod 600)");
@@ -48,7 +37,7 @@ std::string contentOf(const std::string& path) {
     std::string content(mostBytes + 1, '\0');
     std::size_t size = 0;
     while (size < content.size()) {
-        const auto count = ::read(file.descriptor, content.data() + size, content.size() - size);
+        const auto count = ::read(file.get(), content.data() + size, content.size() - size);
         if (count < 0 && errno == EINTR) continue;
         if (count < 0) refuseForSystem(path);
         if (count == 0) break;

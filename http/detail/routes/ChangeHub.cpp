@@ -14,6 +14,7 @@ using configuration::OptionChange;
 using reactive_streams::SubscriptionHandle;
 
 void ChangeHub::join(ConfigurationImpl& store, const Changes& changes) {
+    const common::MutexLock turn(joining);
     std::optional<std::uint64_t> newWatch;
     {
         const common::MutexLock lock(mutex);
@@ -44,7 +45,9 @@ void ChangeHub::begin(ConfigurationImpl& store, std::uint64_t watchNumber) {
          end, [end](const std::exception_ptr&) { end(); }},
         reactive_streams::Demand::oneAtATime);
     const common::MutexLock lock(mutex);
-    std::swap(watch, handle);  // the former one, if any, is given up without the mutex
+    // What was left or has ended meanwhile is given up, without the mutex. No other watch has begun:
+    // only who joins begins one.
+    if (isWatching) std::swap(watch, handle);
 }
 
 void ChangeHub::leave(const Changes& changes) {

@@ -1,5 +1,6 @@
 #include "http/detail/routes/Health.hpp"
 
+#include <array>
 #include <utility>
 
 #include "configuration/sources/MonitoredSource.hpp"
@@ -36,30 +37,45 @@ void writeLayers(const Context& context, std::string& out) {
     out.append(states);
 }
 
+struct TransportMetric {
+    const char* name;
+    const char* type;
+    const char* help;
+    TransportCounts::Count TransportCounts::*count;
+};
+
+constexpr std::array<TransportMetric, 13> transportMetrics{{
+    {"velkor_http_connections", "gauge", "Open connections.", &TransportCounts::connectionsOpen},
+    {"velkor_http_connections_accepted_total", "counter", "Connections that were opened.",
+     &TransportCounts::connectionsAccepted},
+    {"velkor_http_connections_refused_total", "counter", "Connections that were one too many.",
+     &TransportCounts::connectionsRefused},
+    {"velkor_http_streams", "gauge", "Open event streams.", &TransportCounts::streamsOpen},
+    {"velkor_http_streams_refused_total", "counter", "Event streams that were one too many.",
+     &TransportCounts::streamsRefused},
+    {"velkor_http_events_written_total", "counter", "Events that were sent to clients.",
+     &TransportCounts::eventsWritten},
+    {"velkor_http_requests_read_total", "counter", "Requests that were read.",
+     &TransportCounts::requestsRead},
+    {"velkor_http_requests_refused_total", "counter", "Requests that were no HTTP or too large.",
+     &TransportCounts::requestsRefused},
+    {"velkor_http_answers_refused_total", "counter",
+     "Requests that there was no room for, be it for their bodies or answers.",
+     &TransportCounts::answersRefused},
+    {"velkor_http_requests_timed_out_total", "counter", "Requests that were not complete in time.",
+     &TransportCounts::requestsTimedOut},
+    {"velkor_http_writes_timed_out_total", "counter",
+     "Answers and events that were not taken in time.", &TransportCounts::writesTimedOut},
+    {"velkor_http_read_bytes_total", "counter", "Bytes that were read.",
+     &TransportCounts::bytesRead},
+    {"velkor_http_written_bytes_total", "counter", "Bytes that were written.",
+     &TransportCounts::bytesWritten},
+}};
+
 void writeTransport(const TransportCounts& counts, std::string& out) {
-    writeMetric(out, "velkor_http_connections", "gauge", "Open connections.",
-                counts.connectionsOpen);
-    writeMetric(out, "velkor_http_connections_accepted_total", "counter",
-                "Connections that were opened.", counts.connectionsAccepted);
-    writeMetric(out, "velkor_http_connections_refused_total", "counter",
-                "Connections that were one too many.", counts.connectionsRefused);
-    writeMetric(out, "velkor_http_streams", "gauge", "Open event streams.", counts.streamsOpen);
-    writeMetric(out, "velkor_http_streams_refused_total", "counter",
-                "Event streams that were one too many.", counts.streamsRefused);
-    writeMetric(out, "velkor_http_events_written_total", "counter",
-                "Events that were sent to clients.", counts.eventsWritten);
-    writeMetric(out, "velkor_http_requests_read_total", "counter", "Requests that were read.",
-                counts.requestsRead);
-    writeMetric(out, "velkor_http_requests_refused_total", "counter",
-                "Requests that were no HTTP or too large.", counts.requestsRefused);
-    writeMetric(out, "velkor_http_requests_timed_out_total", "counter",
-                "Requests that were not complete in time.", counts.requestsTimedOut);
-    writeMetric(out, "velkor_http_writes_timed_out_total", "counter",
-                "Answers and events that were not taken in time.", counts.writesTimedOut);
-    writeMetric(out, "velkor_http_read_bytes_total", "counter", "Bytes that were read.",
-                counts.bytesRead);
-    writeMetric(out, "velkor_http_written_bytes_total", "counter", "Bytes that were written.",
-                counts.bytesWritten);
+    for (const TransportMetric& each : transportMetrics) {
+        writeMetric(out, each.name, each.type, each.help, counts.*each.count);
+    }
 }
 
 void writeValues(const Metrics& metrics, std::string& out) {

@@ -7,6 +7,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "framework/common/TextConversion.hpp"
 #include "http/detail/routes/ChangeRequest.hpp"
 #include "http/detail/routes/Commits.hpp"
 #include "http/detail/routes/Items.hpp"
@@ -76,7 +77,8 @@ bool isMask(const configuration::ConfigurationValue& value) {
     const auto* const narrow = boost::get<std::string>(&value);
     const auto* const wide = boost::get<std::u16string>(&value);
     return (narrow != nullptr && *narrow == settings::secretMark) ||
-           (wide != nullptr && *wide == u"•••");
+           (wide != nullptr &&
+            common::TextConversion("UTF-8").fromUtf16(*wide) == settings::secretMark);
 }
 
 void requireSound(const Context& context, const std::vector<Change>& changes) {

@@ -139,8 +139,8 @@ private:
     std::atomic<std::int64_t> last{0};
 };
 
-/// Leads requests through access and routing to what answers them. Immutable but for the worker,
-/// so safe for concurrent use.
+/// Leads requests through access and routing to what answers them. Safe for concurrent use: what
+/// is no constant here (keys, changes, counts, strangers, worker) is so by itself.
 class Service final : public Handler {
 public:
     Service(std::shared_ptr<ConfigurationImpl> store, const ServerOptions& serverOptions,

@@ -4,7 +4,7 @@
 
 #include <string>
 
-#include "http/detail/transport/Descriptor.hpp"
+#include "http/detail/Descriptor.hpp"
 #include "http/detail/transport/Endpoint.hpp"
 
 namespace velkor::http::detail::transport {

@@ -8,6 +8,7 @@
 #include <boost/beast/http/basic_parser.hpp>
 #include <boost/beast/http/error.hpp>
 #include <cstdint>
+#include <limits>
 #include <optional>
 #include <string>
 #include <utility>

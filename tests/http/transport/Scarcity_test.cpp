@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "http/detail/transport/Descriptor.hpp"
+#include "http/detail/Descriptor.hpp"
 #include "tests/http/transport/ListenerTesting.hpp"
 
 namespace velkor::http::detail::transport {

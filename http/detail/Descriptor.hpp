@@ -4,7 +4,7 @@
 
 #include <utility>
 
-namespace velkor::http::detail::transport {
+namespace velkor::http::detail {
 
 /// A descriptor of the system, closed with its owner.
 class Descriptor {
@@ -33,4 +33,4 @@ private:
     int number = -1;
 };
 
-}  // namespace velkor::http::detail::transport
+}  // namespace velkor::http::detail
