@@ -60,13 +60,12 @@ Session::~Session() {
 }
 
 HostServices Session::services() {
-    return {store,
-            watches,
-            service.dispatcherFor(messages::allRequestTypes()),
-            [this] { console.quit(); },
-            [sources = sources](const auto& name) { return sources->problemOf(name); },
-            sources,
-            showValue(watchedJson)};
+    HostServices services{store, watches, service.dispatcherFor(messages::allRequestTypes()),
+                          [this] { console.quit(); }};
+    services.problemOf = [sources = sources](const auto& name) { return sources->problemOf(name); };
+    services.sources = sources;
+    services.showJson = showValue(watchedJson);
+    return services;
 }
 
 bool Session::keepStateIn(const std::string& path) {

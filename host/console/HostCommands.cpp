@@ -154,6 +154,9 @@ std::vector<std::string> suggestRequests(const Context&) {
     return requestTypes();
 }
 
+// How the rest of a line becomes arguments.
+enum class Reading : std::uint8_t { words, wordsAsTyped, rawRest };
+
 struct HostCommand {
     const char* name;
     const char* argumentNames;
@@ -161,35 +164,34 @@ struct HostCommand {
     std::string (*run)(const Context&, const Arguments&);
     std::uint8_t minimumArguments;
     std::uint8_t maximumArguments;
-    bool takesRawRest = false;
+    Reading reading = Reading::words;
     std::vector<std::string> (*suggest)(const Context&) = nullptr;
-    bool takesWordsAsTyped = false;
 };
 
 constexpr HostCommand commands[] = {
     {"sources", sourcesUsage, "List the sources in order of precedence.", showSources, 0, 255,
-     false, nullptr, true},
-    {"load", loadUsage, "Add a property file as a source.", onSources<loadFile>, 0, 255, false,
-     nullptr, true},
+     Reading::wordsAsTyped},
+    {"load", loadUsage, "Add a property file as a source.", onSources<loadFile>, 0, 255,
+     Reading::wordsAsTyped},
     {"unload", unloadUsage, "Remove a source.", onSources<unloadSource>, 1, 1},
-    {"explain", explainUsage, "Show every source that holds a key.", explain, 0, 255, false,
-     nullptr, true},
+    {"explain", explainUsage, "Show every source that holds a key.", explain, 0, 255,
+     Reading::wordsAsTyped},
     {"watch", watchUsage, "Show the value of a key now and whenever it changes.", watch, 0, 255,
-     false, nullptr, true},
+     Reading::wordsAsTyped},
     {"unwatch", "WATCHED-KEY", "Stop showing the values of a key.", unwatch, 1, 1},
     {"put", putUsage, "Set a value as it was typed, or of a type, also for a time.",
-     onStore<putValue>, 0, 255, false, nullptr, true},
+     onStore<putValue>, 0, 255, Reading::wordsAsTyped},
     {"unset", unsetUsage, "Take back what was set for a key, and show what is effective then.",
-     onStore<unsetKey>, 0, 255, false, nullptr, true},
+     onStore<unsetKey>, 0, 255, Reading::wordsAsTyped},
     {"history", historyUsage, "Show what was set when and by whom, the newest first.",
-     onStore<showHistory>, 0, 255, false, nullptr, true},
+     onStore<showHistory>, 0, 255, Reading::wordsAsTyped},
     {"undo", "[N]", "Take back change N of the history, or the newest one.", onStore<undoChange>, 0,
-     1, false, suggestNothing},
+     1, Reading::words, suggestNothing},
     {"send", "[--raw] TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2,
-     true, suggestRequests},
-    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
+     Reading::rawRest, suggestRequests},
+    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, Reading::words,
      suggestCommands},
-    {"?", "[COMMAND]", "The same as help.", help, 0, 1, false, suggestCommands},
+    {"?", "[COMMAND]", "The same as help.", help, 0, 1, Reading::words, suggestCommands},
     {"quit", "", "End the session.", quit, 0, 0},
     {"exit", "", "The same as quit.", quit, 0, 0},
 };
@@ -199,8 +201,8 @@ CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
     const auto handler = [run = command.run, context](Arguments&& arguments) {
         return run(*context, arguments);
     };
-    CommandTraits traits{command.argumentNames, command.takesRawRest};
-    traits.takesWordsAsTyped = command.takesWordsAsTyped;
+    CommandTraits traits{command.argumentNames, command.reading == Reading::rawRest};
+    traits.takesWordsAsTyped = command.reading == Reading::wordsAsTyped;
     if (command.suggest != nullptr) {
         traits.suggestions = [suggest = command.suggest, context] { return suggest(*context); };
     }
