@@ -135,11 +135,10 @@ std::string manPage(const ProgramUsage& usage, const Commands& commands) {
 
 constexpr const char* bashHead =
     "# Completion of velkor-config for bash. Made by velkor-config --manual bash.\n"
-    "_velkor_config_words() { COMPREPLY=($(compgen -W \"$1\" -- \"$current\")); }\n"
+    "_velkor_config_words() { mapfile -t COMPREPLY < <(compgen -W \"$1\" -- \"$current\"); }\n"
     "_velkor_config_files() {\n"
-    "    local IFS=$'\\n'\n"
     "    compopt -o filenames\n"
-    "    COMPREPLY=($(compgen -f -- \"$current\"))\n"
+    "    mapfile -t COMPREPLY < <(compgen -f -- \"$current\")\n"
     "}\n"
     "_velkor_config_types() { _velkor_config_words \"$types\"; }\n";
 

@@ -40,10 +40,19 @@ std::string_view lineAt(std::string_view text, std::size_t begin) {
     return text.substr(begin, text.find_first_of("\r\n", begin) - begin);
 }
 
+/// A name in brackets, with nothing or a comment behind it.
 bool isSection(std::string_view line) {
     if (line.empty() || line.front() != '[') return false;
     const std::size_t end = line.find(']');
-    return end != std::string_view::npos && line.find_first_not_of(" \t", end + 1) == line.npos;
+    if (end == std::string_view::npos) return false;
+    const std::size_t next = line.find_first_not_of(" \t", end + 1);
+    if (next == std::string_view::npos || line[next] == '#' || line[next] == '!') return true;
+    return line[next] == ';' && isBlank(line[next - 1]);  // elsewhere it is an ordinary byte
+}
+
+/// The size of the byte order mark at the beginning of `text`.
+std::size_t markSize(std::string_view text) {
+    return text.substr(0, byteOrderMark.size()) == byteOrderMark ? byteOrderMark.size() : 0;
 }
 
 /// Where the first byte stands that is no UTF-8; the size of `line` when all of it is.
@@ -102,9 +111,7 @@ public:
     explicit Linter(std::string_view wholeText) : text(wholeText), lines(text) {}
 
     std::vector<Finding> findings() {
-        if (text.substr(0, byteOrderMark.size()) == byteOrderMark) {
-            add(0, PropertyFlaw::byteOrderMark);
-        }
+        if (markSize(text) != 0) add(0, PropertyFlaw::byteOrderMark);
         lookForForeignBytes();
         const TextTable table =
             PropertyFileParser(std::string(text), PropertyFileParser::Records::omitted)
@@ -154,8 +161,9 @@ private:
 
     void beginLine(std::size_t position) {
         lineBegin = position;
-        inSection = isSection(lineAt(text, position));
-        if (inSection) add(position, PropertyFlaw::section);
+        const std::size_t visible = position == 0 ? markSize(text) : position;
+        inSection = isSection(lineAt(text, visible));
+        if (inSection) add(visible, PropertyFlaw::section);
     }
 
     void onKey(const Step& step) {
@@ -177,6 +185,10 @@ private:
     }
 
     void onEscaped(const Step& step) {
+        // No line is joined to a key: the line break becomes a part of it.
+        if (step.from == State::keyEscape && isLineBreak(text[step.begin])) {
+            onLineBreakInKey(step.begin);
+        }
         if (text[step.begin] != 'u') return;
         const std::string_view digits = text.substr(step.begin + 1, step.end - step.begin - 1);
         constexpr std::size_t needed = 4;
@@ -198,7 +210,7 @@ private:
     }
 
     void atEnd() {
-        if (last == State::value) places.push_back(key);
+        if (last == State::value) atEndInValue();
         if (isEscape(last) || last == State::continuationIndent) {
             add(backslash, PropertyFlaw::backslashAtEnd);
         } else if (last == State::key) {
@@ -206,6 +218,11 @@ private:
         } else if (last == State::separator && keyEnd != key.position) {
             add(text.size(), PropertyFlaw::droppedLine);
         }
+    }
+
+    void atEndInValue() {
+        places.push_back(key);
+        if (keyEnd == key.position) add(text.size(), PropertyFlaw::droppedValue);
     }
 
     void atEndInKey() {

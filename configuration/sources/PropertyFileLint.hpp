@@ -20,7 +20,8 @@ enum class PropertyFlaw {
     surrogate,       ///< `\uD800` to `\uDFFF`, half a character; it becomes no UTF-8.
     trailingBlanks,  ///< The blanks at the end of the value are a part of it.
     backslashAtEnd,  ///< Nothing follows the last backslash: the line is left out.
-    sameKey          ///< An earlier line has the same key, and doesn't count.
+    sameKey,         ///< An earlier line has the same key, and doesn't count.
+    droppedValue     ///< The last line has no key and no end: it is left out.
 };
 
 /// One flaw of a property file.

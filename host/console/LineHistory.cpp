@@ -22,11 +22,13 @@ namespace fs = std::filesystem;
 constexpr mode_t privateFolder = 0700;
 constexpr mode_t privateFile = 0600;
 
-/// A private file that is open; closed with this.
+/// A private file that is open; closed with this. No link is followed to it: it would lead to a
+/// file that is somebody else's.
 class OpenHistory {
 public:
     OpenHistory(const fs::path& path, int mode)
-        : descriptor(::open(path.c_str(), mode | O_CREAT | O_CLOEXEC | O_NOCTTY | O_NONBLOCK,
+        : descriptor(::open(path.c_str(),
+                            mode | O_CREAT | O_CLOEXEC | O_NOCTTY | O_NONBLOCK | O_NOFOLLOW,
                             privateFile)) {}
     ~OpenHistory() {
         if (isOpen()) ::close(descriptor);
@@ -37,11 +39,13 @@ public:
 
     bool isOpen() const noexcept { return descriptor >= 0; }
 
-    /// Keeps others from reading it. What is no file, such as /dev/null, stays as it is.
+    /// Keeps others from reading it. What is no file, such as /dev/null, stays as it is, and so
+    /// does a file that has another name, for which it was made.
     void makePrivate() const noexcept {
         struct stat status {};
-        const bool isFile = ::fstat(descriptor, &status) == 0 && S_ISREG(status.st_mode);
-        if (isFile) ::fchmod(descriptor, privateFile);
+        const bool isOurs =
+            ::fstat(descriptor, &status) == 0 && S_ISREG(status.st_mode) && status.st_nlink == 1;
+        if (isOurs) ::fchmod(descriptor, privateFile);
     }
 
     std::string content() const {

@@ -9,7 +9,8 @@
 namespace velkor::host {
 
 /// Lines that were typed, kept in a file from one session to the next. Only its owner may read the
-/// file, and the folders that are made for it. Several sessions may share it.
+/// file, unless it has another name, and the folders that are made for it. A symbolic link in its
+/// place is not followed. Several sessions may share it.
 class LineHistory {
 public:
     /// The number of lines that a session begins with; the file is cut to these then.

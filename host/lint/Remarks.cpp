@@ -32,6 +32,8 @@ std::string textOf(const PropertyRemark& remark) {
         case PropertyFlaw::sameKey:
             return "The key is in line " + std::to_string(remark.firstLine) +
                    " already: the last one counts.";
+        case PropertyFlaw::droppedValue:
+            return "The last line has no key and no end: it is left out.";
     }
     return "";
 }

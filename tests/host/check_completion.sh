@@ -5,7 +5,7 @@ folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT
 "$1" --manual bash >"$folder/completion"
 cd "$folder"
-touch one.properties
+touch one.properties '*' '[ab]' a
 . ./completion
 complete -p velkor-config >/dev/null
 
@@ -37,4 +37,7 @@ expect 'string stringArray' velkor-config -- put key value --type s
 expect '' velkor-config -- put key --for o
 expect 'one.properties' velkor-config -- load o
 expect 'history help' velkor-config -- help h
+# Names that are patterns stay what they are.
+expect '*' velkor-config '*'
+expect '[ab]' velkor-config --state '['
 exit $failed

@@ -54,6 +54,36 @@ TEST(LineHistory, BecomesPrivate) {
     EXPECT_EQ(modeOf(file.path()), 0600U);
 }
 
+TEST(LineHistory, FollowsNoLink) {
+    const TemporaryFile file("kept\n");
+    ::chmod(file.path().c_str(), 0644);
+    const auto link = file.parent() / "link";
+    std::filesystem::create_symlink(file.path(), link);
+    EXPECT_EQ(
+        velkor::testing::thrownText<std::runtime_error>([&] { const LineHistory history(link); }),
+        "History can't be kept: " + link.string() + ": Too many levels of symbolic links");
+    EXPECT_EQ(modeOf(file.path()), 0644U);
+}
+
+TEST(LineHistory, AddsNothingToAFileWhosePlaceALinkHasTaken) {
+    const TemporaryFile file("kept\n");
+    const auto path = file.parent() / "history";
+    const LineHistory history(path);
+    std::filesystem::remove(path);
+    std::filesystem::create_symlink(file.path(), path);
+    history.add("get a");
+    EXPECT_EQ(contentOf(file.path()), "kept\n");
+}
+
+TEST(LineHistory, LeavesTheModeOfAFileThatHasAnotherName) {
+    const TemporaryFile file("");
+    ::chmod(file.path().c_str(), 0644);
+    const auto other = file.parent() / "other";
+    std::filesystem::create_hard_link(file.path(), other);
+    const LineHistory history(other);
+    EXPECT_EQ(modeOf(file.path()), 0644U);
+}
+
 TEST(LineHistory, TakesWhatTwoSessionsType) {
     const TemporaryFile file("");
     const LineHistory one(file.path());

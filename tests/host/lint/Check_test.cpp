@@ -18,6 +18,7 @@ const std::string mark = "The byte order mark becomes a part of the first key.";
 const std::string foreign = "The line holds bytes that are not UTF-8.";
 const std::string noSeparator = "The line has no separator: its key goes on in the next line.";
 const std::string dropped = "The last line has no value and no end: it is left out.";
+const std::string droppedValue = "The last line has no key and no end: it is left out.";
 const std::string section = "There are no sections: this begins a key.";
 const std::string indented = "The line begins with a blank: it is a value of the empty key.";
 const std::string shortEscape =
@@ -60,19 +61,23 @@ std::string nameOf(const ::testing::TestParamInfo<CheckCase>& info) {
 
 INSTANTIATE_TEST_SUITE_P(
     Clean, CheckedFile,
-    ::testing::Values(CheckCase{"Empty", "", {}},
-                      CheckCase{
-                          "Properties", "# a comment\n! another\n\na = 1\nb: 2\nc 3\nd=\n", {}},
-                      CheckCase{"LineEndsOfAllKinds", "a=1\r\nb=2\rc=3\n\n\r\n", {}},
-                      CheckCase{"NoEndOfTheLastLine", "a=1\nb=2", {}},
-                      CheckCase{"Continuation", "a = one \\\n    two\nb = 3\n", {}},
-                      CheckCase{"Escapes", "a\\ b\\=c = \\u20AC\\\\ \\#\\ \n\\#d = x\\\\\n", {}},
-                      CheckCase{"BytesOfSeveralInACharacter",
-                                "gr\xC3\xBC\xC3\x9F = \xE2\x82\xAC \xF0\x9F\x98\x80\n",
-                                {}},
-                      CheckCase{"BracketsInKeysAndValues", "a[0] = [x]\n[a] = 1\n[b]=[c]\n", {}},
-                      CheckCase{"BlanksBeforeTheEnd", "a = \nb =\nc \n  ", {}},
-                      CheckCase{"ABackslashInTheLastComment", "a=1\n# \\", {}}),
+    ::testing::Values(
+        CheckCase{"Empty", "", {}},
+        CheckCase{"Properties", "# a comment\n! another\n\na = 1\nb: 2\nc 3\nd=\n", {}},
+        CheckCase{"LineEndsOfAllKinds", "a=1\r\nb=2\rc=3\n\n\r\n", {}},
+        CheckCase{"NoEndOfTheLastLine", "a=1\nb=2", {}},
+        CheckCase{"Continuation", "a = one \\\n    two\nb = 3\n", {}},
+        CheckCase{"Escapes", "a\\ b\\=c = \\u20AC\\\\ \\#\\ \n\\#d = x\\\\\n", {}},
+        CheckCase{"BytesOfSeveralInACharacter",
+                  "gr\xC3\xBC\xC3\x9F = \xE2\x82\xAC \xF0\x9F\x98\x80\n",
+                  {}},
+        CheckCase{
+            "BracketsInKeysAndValues", "a[0] = [x]\n[a] = 1\n[b]=[c]\n[d];e = 1\n[f] g\n", {}},
+        CheckCase{"SectionsInExportedKeysAndValues",
+                  "[a]\\ \\#\\ x = 1\n[b] = # x\n[c]\\ ;x = 1\na\\u000ab = 1\n",
+                  {}},
+        CheckCase{"BlanksBeforeTheEnd", "a = \nb =\nc \n  ", {}},
+        CheckCase{"ABackslashInTheLastComment", "a=1\n# \\", {}}),
     nameOf);
 
 INSTANTIATE_TEST_SUITE_P(
@@ -83,7 +88,22 @@ INSTANTIATE_TEST_SUITE_P(
         CheckCase{"TwoInARow", "one\ntwo\nb=2\n", {"1:4: " + noSeparator, "2:4: " + noSeparator}},
         CheckCase{"IsTheLastLine", "a=1\nlonely\n", {"2:7: " + dropped}},
         CheckCase{"IsTheLastLineWithoutEnd", "a=1\nlonely", {"2:7: " + dropped}},
-        CheckCase{"HasNothingButASeparator", "a=1\nb=", {"2:3: " + dropped}}),
+        CheckCase{"HasNothingButASeparator", "a=1\nb=", {"2:3: " + dropped}},
+        CheckCase{"EndsInABackslash", "a\\\nb=1\n", {"1:3: " + noSeparator}},
+        CheckCase{"EndsInABackslashAndTwoBytes", "a\\\r\nb=1\r\n", {"1:3: " + noSeparator}},
+        CheckCase{"EndsInABackslashAsTheLastLine", "a\\\n", {"1:3: " + dropped}},
+        CheckCase{"IsASectionBehindABackslash",
+                  "a\\\n[b]\nc=1\n",
+                  {"1:3: " + noSeparator, "2:1: " + section}}),
+    nameOf);
+
+INSTANTIATE_TEST_SUITE_P(
+    NoKey, CheckedFile,
+    ::testing::Values(CheckCase{"IsTheLastLineWithoutEnd", "a=1\n=v", {"2:3: " + droppedValue}},
+                      CheckCase{"IsTheLastIndentedLineWithoutEnd",
+                                "a=1\n b",
+                                {"2:1: " + indented, "2:3: " + droppedValue}},
+                      CheckCase{"IsComplete", "a=1\n=v\n", {}}),
     nameOf);
 
 INSTANTIATE_TEST_SUITE_P(
@@ -92,6 +112,11 @@ INSTANTIATE_TEST_SUITE_P(
         CheckCase{"ALine", "[server]\nport = 1\n", {"1:1: " + section}},
         CheckCase{
             "WithABlank", "a=1\n[my server] \nport = 1\n", {"2:1: " + section, "2:12: " + blanks}},
+        CheckCase{"WithAComment",
+                  "[a] # x\n[b]# x\n[c] ! x\n[d] ; x\n",
+                  {"1:1: " + section, "2:1: " + section, "3:1: " + section, "4:1: " + section}},
+        CheckCase{
+            "BehindAByteOrderMark", "\xEF\xBB\xBF[a]\nb=1\n", {"1:1: " + mark, "1:2: " + section}},
         CheckCase{"InARow", "[a]\n[b]\nc=1\n", {"1:1: " + section, "2:1: " + section}},
         CheckCase{"BehindALineWithoutSeparator",
                   "x\n[a]\nc=1\n",
