@@ -10,9 +10,9 @@ document=$2
 left_out=${3-^$}
 folder=$(mktemp -d)
 trap 'rm -rf "$folder"' EXIT
-mkdir "$folder/work"
-cp -R "$(dirname -- "$0")/../../examples" "$folder/work/examples"
-cd "$folder/work"
+mkdir "$folder/copy"
+cp -R "$(dirname -- "$0")/../../examples" "$folder/copy/examples"
+cd "$folder/copy"
 ln -s "$program" "$folder/velkor-config"
 PATH=$folder:$PATH
 export PATH
