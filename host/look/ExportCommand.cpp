@@ -46,6 +46,19 @@ struct FitsJson : boost::static_visitor<bool> {
     }
 };
 
+void requireFitsJson(const std::string& key, const ConfigurationValue& value) {
+    const auto refuse = [&](const char* reason) {
+        throw CommandError("JSON can't hold " + escapedForTerminal(key, LineFeeds::escaped) + ": " +
+                           reason);
+    };
+    if (!isWellFormed(key) || !boost::apply_visitor(FitsJson(), value)) {
+        refuse("it is no UTF-8, or no finite number");
+    }
+    if (key.find('\0') != std::string::npos) {
+        refuse("no name with the character U+0000 can be imported again");
+    }
+}
+
 using WriteOption = std::function<void(const std::string& key, const ConfigurationValue& value)>;
 
 /// Writes every option that is no secret, and notes which are.
@@ -67,9 +80,7 @@ void exportJson(const std::shared_ptr<SessionStore>& store, KeySelection& select
                 CommandOutput& output) {
     JsonLines lines(output);
     exportThem(store, selection, output, [&](const auto& key, const auto& value) {
-        if (!isWellFormed(key) || !boost::apply_visitor(FitsJson(), value)) {
-            throw CommandError("JSON can't hold " + key + ": it is no UTF-8, or no finite number");
-        }
+        requireFitsJson(key, value);
         lines.add(key, valueJson(value, false));
     });
     lines.end();

@@ -1,3 +1,5 @@
+#include <string_view>
+
 #include "configuration/service/ValueJson.hpp"
 #include "host/TerminalText.hpp"
 #include "host/console/OptionWords.hpp"
@@ -14,6 +16,39 @@ namespace {
 using configuration::Change;
 using configuration::ConfigurationValue;
 using Poco::JSON::Object;
+
+constexpr std::string_view escapedZero = "\\u0000";
+
+/// The text between the quotes of the string that begins behind position `begin` of valid JSON.
+std::string_view stringAt(std::string_view json, std::size_t begin) {
+    std::size_t end = begin;
+    while (end < json.size() && json[end] != '"') end += json[end] == '\\' ? 2U : 1U;
+    return json.substr(begin, end - begin);
+}
+
+bool holdsZero(std::string_view string) {
+    for (auto at = string.find('\\'); at != std::string_view::npos;
+         at = string.find('\\', at + 2)) {
+        if (string.substr(at, escapedZero.size()) == escapedZero) return true;
+    }
+    return false;
+}
+
+// The parser ends a name at this character, which would make it the name of something else.
+void refuseNamesWithZero(std::string_view json) {
+    if (json.find(escapedZero) == std::string_view::npos) return;
+    for (auto quote = json.find('"'); quote != std::string_view::npos;) {
+        const std::string_view string = stringAt(json, quote + 1);
+        const std::size_t end = quote + string.size() + 2;
+        const std::size_t next = json.find_first_not_of(" \t\r\n", end);
+        const bool isName = next != std::string_view::npos && json[next] == ':';
+        if (isName && holdsZero(string)) {
+            throw CommandError("the name \"" + std::string(string) +
+                               "\" holds the character U+0000, without which it would be another");
+        }
+        quote = json.find('"', end);
+    }
+}
 
 FileFormat formatOf(const std::string& text) {
     const auto first = text.find_first_not_of(" \t\r\n");
@@ -45,6 +80,7 @@ std::vector<Change> changesInJson(const std::string& text, const SourceLimits& l
     messages::JsonLimits jsonLimits;
     jsonLimits.bytes = limits.fileBytes;
     const auto object = messages::parseJsonObject(text, jsonLimits);
+    refuseNamesWithZero(text);
     std::vector<Change> changes;
     changes.reserve(object->size());
     for (const auto& [key, member] : *object) changes.push_back({key, valueIn(key, member)});

@@ -44,7 +44,8 @@ inline constexpr const char* exportUsage = "[PATTERN...] [--format properties|js
 /// how many values lose their type in a property file.
 ///
 /// Throws `CommandError` as `showOptions`, "--format X: properties or json is needed", and for JSON
-/// "JSON can't hold KEY: it is no UTF-8, or no finite number".
+/// "JSON can't hold KEY: it is no UTF-8, or no finite number" or "JSON can't hold KEY: no name with
+/// the character U+0000 can be imported again".
 void exportOptions(const std::shared_ptr<SessionStore>& store,
                    const std::vector<std::string>& arguments, CommandOutput& output);
 
@@ -55,8 +56,9 @@ inline constexpr const char* importUsage = "FILE [--format properties|json]";
 /// A file whose first byte that is no blank is { is JSON unless the option says otherwise.
 ///
 /// Throws what `readPropertyFile` throws, `CommandError` "FILE: " with the text of
-/// `messages::NoJsonObject` or "KEY is no object of a type and a value of that type", and what the
-/// store refuses.
+/// `messages::NoJsonObject`, "the name "NAME" holds the character U+0000, without which it would be
+/// another", with NAME as the file spells it, or "KEY is no object of a type and a value of that
+/// type", and what the store refuses.
 void importFile(const std::shared_ptr<SessionStore>& store,
                 const std::vector<std::string>& arguments, CommandOutput& output);
 

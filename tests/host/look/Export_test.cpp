@@ -149,6 +149,34 @@ TEST(Export, ToJsonRefusesWhatJsonCantHold) {
     EXPECT_EQ(runProgram({value.path().string(), "-c", "export --format json"}).exitCode, 1);
 }
 
+TEST(Export, ToJsonRefusesAKeyThatCantBeImported) {
+    const TemporaryFile file("a\\u0000b=1\n");
+    const auto result = runProgram({file.path().string(), "-c", "export --format json"});
+    EXPECT_NE(result.err.find("JSON can't hold a\\x00b: no name with the character U+0000 can be "
+                              "imported again\n"),
+              std::string::npos)
+        << result.err;
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Export, ToJsonNamesTheWholeKeyThatItRefuses) {
+    const TemporaryFile file("a\\u0000\\u001bb\xE9=1\n");
+    const auto result = runProgram({file.path().string(), "-c", "export --format json"});
+    EXPECT_NE(result.err.find("JSON can't hold a\\x00\\x1bb\\xe9: it is no UTF-8"),
+              std::string::npos)
+        << result.err;
+}
+
+TEST(Export, ToJsonKeepsTheCharacterZeroInAValue) {
+    const TemporaryFile file("a=b\\u0000c\n");
+    const std::string path = file.path().string();
+    const TemporaryFile exported(runProgram({path, "-c", "export --format json"}).out);
+    const auto result =
+        runProgram({"-c", "import " + exported.path().string(), "-c", "show --raw a"});
+    EXPECT_EQ(result.out, std::string("b\0c\n", 4));
+    EXPECT_EQ(result.err, "");
+}
+
 TEST(Export, RefusesOtherFormats) {
     const auto result = runProgram({"-c", "export --format xml"});
     EXPECT_EQ(result.err, "velkor-config: --format xml: properties or json is needed\n");
@@ -197,6 +225,13 @@ INSTANTIATE_TEST_SUITE_P(
         RefusedImport{"NoNumber", R"({"b":{"type":"double","value":null}})", "b is no object"},
         RefusedImport{"MixedArray", R"({"b":{"type":"intArray","value":[1,true]}})",
                       "b is no object"},
+        RefusedImport{
+            "CharacterZeroInAName",
+            R"({"c":{"type":"string","value":"\":\u0000"},"a\\\u0000b" :{"type":"int","value":1}})",
+            R"(the name "a\\\u0000b" holds the character U+0000, without which it would be another)"
+            "\n"},
+        RefusedImport{"CharacterZeroInANameOfAValue", R"({"b":{"type\u0000":"int","value":1}})",
+                      R"(the name "type\u0000" holds)"},
         RefusedImport{"MoreThanAValue", R"({"b":{"type":"int","value":1,"source":"x"}})",
                       "b is no object"}),
     [](const auto& tested) { return std::string(tested.param.name); });
