@@ -56,8 +56,14 @@ std::vector<std::string> Command::readArguments(CommandLine& line) const {
 }
 
 std::vector<std::string> Command::givenArguments(std::vector<std::string> words) const {
-    if (!traits.takesWordsAsTyped) return words;
-    for (auto& word : words) word = quotedWord(word);
+    if (traits.takesWordsAsTyped) {
+        for (auto& word : words) word = quotedWord(word);
+    }
+    const std::size_t most = descriptor.maximumArguments;
+    if (!traits.takesRawRest || words.size() <= most) return words;
+    std::string& rest = words[most - 1];
+    for (std::size_t next = most; next < words.size(); ++next) rest += ' ' + words[next];
+    words.resize(most);
     return words;
 }
 

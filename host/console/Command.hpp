@@ -39,7 +39,8 @@ using StreamingHandler =
 struct CommandTraits {
     /// The names of the arguments as help shows them; empty: help shows how many there are.
     std::string arguments{};
-    /// The last argument is the rest of the line as it was typed, quotes and blanks included.
+    /// The last argument is the rest of the line as it was typed, quotes and blanks included. There
+    /// may be at least one argument then.
     bool takesRawRest = false;
     /// What the first argument may be, for completion; empty: what its name says, and a key of the
     /// store where it has none.
@@ -80,7 +81,7 @@ public:
     std::vector<std::string> readArguments(CommandLine& line) const;
 
     /// The arguments of this command where the words after its name are known one by one, and
-    /// quoted by nobody.
+    /// quoted by nobody. Those that are the rest of a line are joined by a blank.
     std::vector<std::string> givenArguments(std::vector<std::string> words) const;
 
     /// Carries out the command: gives the handler's answer, or nothing when it writes to `output`

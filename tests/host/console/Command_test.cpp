@@ -114,6 +114,14 @@ TEST(Command, TakesGivenWordsAsTheyAre) {
     EXPECT_EQ(makeCommand(0, 9).givenArguments({"b c"}), (Words{"b c"}));
 }
 
+TEST(Command, JoinsGivenWordsThatAreTheRawRest) {
+    const Command command = makeCommand(1, 2, {"", true});
+    EXPECT_EQ(command.givenArguments({"--raw", "Get", R"({"key": "a  b"})"}),
+              (Words{"--raw", R"(Get {"key": "a  b"})"}));
+    EXPECT_EQ(command.givenArguments({"Get", ""}), (Words{"Get", ""}));
+    EXPECT_EQ(command.givenArguments({"Get"}), Words{"Get"});
+}
+
 TEST(Command, HasNoLastArgumentWhenTheRestIsEmpty) {
     EXPECT_EQ(argumentsOf(makeCommand(1, 2, {"", true}), "run Get  "), (Words{"Get"}));
 }
