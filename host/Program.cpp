@@ -83,6 +83,7 @@ ExitCode runSession(const Options& options, const DeclareSettings& declare, Outp
         options.serving || (!options.givesCommands() && commandsAreTyped()));
     const bool allLoaded = session.load(options.sources, watches);
     session.declareSettings(declare);
+    session.remarkOn(options.assignments);
     const bool allCarriedOut =
         options.serving ? runServing(session, options) : run(session, options);
     if (!allLoaded) return ExitCode::sourceNotLoaded;

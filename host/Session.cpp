@@ -4,6 +4,7 @@
 
 #include <exception>
 #include <iostream>
+#include <map>
 #include <stdexcept>
 #include <utility>
 
@@ -11,6 +12,7 @@
 #include "host/LoginName.hpp"
 #include "host/Manual.hpp"
 #include "host/MisplacedCommands.hpp"
+#include "host/TerminalText.hpp"
 #include "host/console/ArgumentWords.hpp"
 #include "host/console/Completer.hpp"
 #include "host/console/GivenLines.hpp"
@@ -19,6 +21,7 @@
 #include "host/console/SecretLines.hpp"
 #include "host/console/SendCommand.hpp"
 #include "host/console/StoreCommandRegistry.hpp"
+#include "host/console/ValueWords.hpp"
 #include "host/look/JsonAnswers.hpp"
 #include "host/serving/Serving.hpp"
 #include "host/state/StateLayer.hpp"
@@ -84,6 +87,18 @@ void Session::assign(const std::vector<Assignment>& assignments) {
     for (const auto& [key, text] : assignments) values[key] = configuration::typedText(text);
     store->addInMemorySource("command-line", "", SourceRequest::commandLineOrder, true,
                              std::move(values));
+}
+
+void Session::remarkOn(const std::vector<Assignment>& assignments) {
+    std::map<std::string, std::string> texts;
+    for (const auto& [key, text] : assignments) texts[key] = text;
+    const auto secrets = settings::secretKeys(store);
+    for (const auto& [key, text] : texts) {
+        const auto stored = configuration::typedText(text);
+        if (isMeantBy(text, stored)) continue;
+        output.message("--set " + abbreviated(key, mostRepeatedBytes) + ": " +
+                       otherwiseStored(text, stored, secrets.count(key) != 0));
+    }
 }
 
 bool Session::load(const std::vector<SourceRequest>& requests, bool watchesFiles) {

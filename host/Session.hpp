@@ -51,6 +51,10 @@ public:
     /// noticed of the others. Files are read again when they change if `watchesFiles`.
     bool load(const std::vector<SourceRequest>& requests, bool watchesFiles);
 
+    /// Reports "--set KEY: " and `otherwiseStored` for each key of `assignments` whose value is not
+    /// what its text means. Settings are declared first: values of secret ones are ••• then.
+    void remarkOn(const std::vector<Assignment>& assignments);
+
     /// Declares settings, and lists them by a command if there are any.
     void declareSettings(const DeclareSettings& declare);
 

@@ -22,7 +22,6 @@ constexpr const char* getName = "velkor.configuration.get";
 constexpr const char* setName = "velkor.configuration.set";
 constexpr const char* listName = "velkor.configuration.list";
 constexpr const char* nothingStored = "nothing was stored; put says why";
-constexpr std::size_t mostShownBytes = 60;
 
 std::string argumentNames(const std::string& command) {
     if (command == setName) return "KEY VALUE";
@@ -31,15 +30,13 @@ std::string argumentNames(const std::string& command) {
 
 /// What is to be said of `text` that was set for `key`; empty when it is there as it was meant.
 std::string remarkOn(const SessionPtr& store, const std::string& key, const std::string& text) {
-    const std::string beginning = "set " + abbreviated(key, mostShownBytes) + ": ";
+    const std::string beginning = "set " + abbreviated(key, mostRepeatedBytes) + ": ";
     try {
         const AppliedChange written = store->apply({{key, text}}, true).get().front();
         if (!written.before) return beginning + nothingStored;
         if (isMeantBy(text, *written.before)) return "";
         const bool isSecret = settings::secretKeys(store).count(key) != 0;
-        return beginning + settings::masked(isSecret, abbreviated(text, mostShownBytes)) +
-               " was stored as " + valueText(*written.before, isSecret) +
-               "; put stores the whole word";
+        return beginning + otherwiseStored(text, *written.before, isSecret);
     } catch (const std::exception&) {
         return beginning + nothingStored;
     }

@@ -9,9 +9,12 @@
 #include <type_traits>
 #include <utility>
 
+#include "host/TerminalText.hpp"
 #include "host/console/Command.hpp"
 #include "host/console/NearestNames.hpp"
+#include "host/console/ValueText.hpp"
 #include "settings/Conversion.hpp"
+#include "settings/Secrets.hpp"
 
 namespace velkor::host {
 
@@ -44,18 +47,31 @@ std::optional<Integer> integerWrittenAs(const std::string& word) {
     return number && std::to_string(*number) == word ? number : std::nullopt;
 }
 
+// Whether a double holds the whole number of these digits, which may have a sign.
+bool isHeldAsWritten(const std::string& whole) {
+    const auto number = numberOf<double>(whole);
+    if (!number) return false;
+    // All digits of a double fit: the largest has 309 of them.
+    char digits[400];
+    const auto written =
+        std::to_chars(std::begin(digits), std::end(digits), *number, std::chars_format::fixed);
+    return std::string_view(digits, static_cast<std::size_t>(written.ptr - digits)) == whole;
+}
+
+// The digits before the point at `point`, without sign and leading zeros.
+std::string digitsBefore(const std::string& word, std::size_t point) {
+    const std::size_t begin = word.find_first_not_of("-0");
+    return word.substr(begin, point - begin);
+}
+
+// A fraction may be rounded, and so may what has an exponent only; digits before a point may not.
 std::optional<double> doubleWrittenAs(const std::string& word) {
     if (word.find_first_not_of(numberBytes) != std::string::npos) return std::nullopt;
     const auto number = numberOf<double>(word);
-    const bool mayBeRounded = word.find_first_of(fractionMarks) != std::string::npos;
-    // All digits of a double fit: the largest has 309 of them.
-    char digits[400];
-    if (!number || mayBeRounded) return number;
-    const auto written =
-        std::to_chars(std::begin(digits), std::end(digits), *number, std::chars_format::fixed);
-    return std::string_view(digits, static_cast<std::size_t>(written.ptr - digits)) == word
-               ? number
-               : std::nullopt;
+    const std::size_t mark = word.find_first_of(fractionMarks);
+    if (!number || (mark != std::string::npos && word[mark] != '.')) return number;
+    const std::string whole = mark == std::string::npos ? word : digitsBefore(word, mark);
+    return whole.empty() || isHeldAsWritten(whole) ? number : std::nullopt;
 }
 
 std::optional<double> asDouble(const ConfigurationValue& value) {
@@ -111,6 +127,12 @@ bool isMeantBy(const std::string& text, const ConfigurationValue& stored) {
     const ConfigurationValue meant = wordValue(text);
     const auto number = asDouble(meant);
     return stored == meant || (number && number == asDouble(stored));
+}
+
+std::string otherwiseStored(const std::string& text, const ConfigurationValue& stored,
+                            bool isSecret) {
+    return settings::masked(isSecret, abbreviated(text, mostRepeatedBytes)) + " was stored as " +
+           valueText(stored, isSecret) + "; put stores the whole word";
 }
 
 ConfigurationValue typedValue(const std::string& type, const Words& words) {

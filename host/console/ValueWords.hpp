@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <string>
 #include <vector>
 
@@ -9,13 +10,21 @@ namespace velkor::host {
 
 /// The value of `word` taken as a whole: `true` and `false` are bool; digits are int, else unsigned
 /// int, else double, if that holds exactly these; digits with a "." or an exponent are the nearest
-/// double. Everything else is narrow text, such as "007", "10.20.0.9", "20s" and what no finite
-/// double is near to.
+/// double, if one holds exactly the digits before the ".". Everything else is narrow text, such as
+/// "007", "10.20.0.9", "20s" and what no finite double is near to.
 configuration::ConfigurationValue wordValue(const std::string& word);
 
 /// Whether `stored` is what somebody means who types `text`: the text itself, or the same truth
 /// value or number as `wordValue`, whatever its kind.
 bool isMeantBy(const std::string& text, const configuration::ConfigurationValue& stored);
+
+/// How much of a key and of a text is repeated in remarks.
+inline constexpr std::size_t mostRepeatedBytes = 60;
+
+/// "TEXT was stored as VALUE; put stores the whole word", for a `text` that does not mean `stored`:
+/// a long one is shortened. ••• stands for both if the value is secret.
+std::string otherwiseStored(const std::string& text,
+                            const configuration::ConfigurationValue& stored, bool isSecret);
 
 /// `words` as a value of the kind that has the tag `type`: one word, or for an array any number.
 /// What a word may be is what `settings::Conversion` reads of a text.

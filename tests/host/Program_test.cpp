@@ -128,6 +128,11 @@ TEST(Program, TakesAMessageAsOneCommand) {
               "velkor/configuration/ConfigurationKeysResponse {\"keys\":[]}\n");
 }
 
+TEST(Program, TakesAMessageWithItsOptionAsOneCommand) {
+    EXPECT_EQ(runProgram({"--", "send", "--raw", "ConfigurationKeys", "{ }"}).out,
+              "{\"keys\":[]}\n");
+}
+
 TEST(Program, OneCommandHasOptionsOfItsOwn) {
     EXPECT_EQ(runProgram({"--", "put", "a", "x y", "--dry-run"}).out,
               "LAYER      NOW  THEN\n"
@@ -185,6 +190,17 @@ TEST(Program, SaysWhenSetStoresSomethingElseThanWasTyped) {
     EXPECT_EQ(result.err,
               "velkor-config: line 1: set host: 10.20.0.9 was stored as 10.2; put stores the whole "
               "word\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, SaysWhenAnOptionStoresSomethingElseThanItsText) {
+    const auto result = runProgram({"--set", "a=1x", "--set", "a=10.20.0.9", "--set", "b=5",
+                                    "--set", "c=9007199254740993.0", "-c", "get a"});
+    EXPECT_EQ(result.out, "10.2\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: --set a: 10.20.0.9 was stored as 10.2; put stores the whole word\n"
+              "velkor-config: --set c: 9007199254740993.0 was stored as 9.0072e+15; put stores the "
+              "whole word\n");
     EXPECT_EQ(result.exitCode, 0);
 }
 

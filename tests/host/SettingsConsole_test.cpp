@@ -122,6 +122,12 @@ TEST_F(SettingsConsoleTest, KeepsNoSecretInItsHistory) {
               "set server.port 1\nquit\n");
 }
 
+TEST(SettingsConsole, ShowsNoSecretThatAnOptionStoresAsSomethingElse) {
+    EXPECT_EQ(runProgram({"--set", "server.password=4711very"}, "").err,
+              "velkor-config: --set server.password: ••• was stored as •••; put stores the whole "
+              "word\n");
+}
+
 TEST(SettingsConsole, EndsBeforeTheFirstCommandWhenSettingsDoNotFit) {
     const auto result = runProgram({}, "list\n");
     EXPECT_EQ(result.out, "");

@@ -43,6 +43,17 @@ INSTANTIATE_TEST_SUITE_P(
         WordCase{"Uint", "4294967295", "uint 4294967295"},
         WordCase{"LargerInteger", "4294967296", "double 4294967296"},
         WordCase{"IntegerThatNoDoubleHolds", "9007199254740993", "string 9007199254740993"},
+        WordCase{"DigitsBeforeThePointThatNoDoubleHolds", "9007199254740993.0",
+                 "string 9007199254740993.0"},
+        WordCase{"MoreDigitsBeforeThePoint", "-99999999999999999999.5",
+                 "string -99999999999999999999.5"},
+        WordCase{"DigitsBeforeThePointThatADoubleHolds", "9007199254740992.0",
+                 "double 9007199254740992"},
+        WordCase{"RoundedFraction", "1.99999999999999999999", "double 2"},
+        WordCase{"LeadingZeroBeforeAPoint", "-007.5", "double -7.5"},
+        WordCase{"ZeroBeforeAPoint", "-00.5", "double -0.5"},
+        WordCase{"MinusBeforeAPoint", "-.5", "double -0.5"},
+        WordCase{"PointAndExponent", "1.5e3", "double 1500"},
         WordCase{"Fraction", "0.5", "double 0.5"}, WordCase{"PointInFront", ".5", "double 0.5"},
         WordCase{"PointBehind", "1.", "double 1"}, WordCase{"Exponent", "1e3", "double 1000"},
         WordCase{"TooLarge", "1e999", "string 1e999"}, WordCase{"LeadingZero", "007", "string 007"},
@@ -71,7 +82,8 @@ TEST_P(NotMeantTest, IsWhatTheCommandSetStores) {
 
 INSTANTIATE_TEST_SUITE_P(Texts, NotMeantTest,
                          ::testing::Values("10.20.0.9", "20s", "1e3", "12abc", " 42", "0x10", "007",
-                                           "+5", "1.5abc"));
+                                           "+5", "1.5abc", "9007199254740993.0",
+                                           "99999999999999999999.5"));
 
 struct TypeCase {
     const char* type;
