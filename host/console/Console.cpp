@@ -41,6 +41,7 @@ Console::Console(std::shared_ptr<const CommandRegistry> commandRegistry, Output&
 bool Console::run(LineSource& lines) {
     quitting = false;
     bool allFine = true;
+    Interruption::take();  // what came before the first command is not about it
     while (!quitting && output.isOpen()) {
         try {
             if (!runNext(lines)) break;
@@ -70,7 +71,6 @@ bool Console::run(const std::vector<std::string>& words) {
 
 bool Console::runNext(LineSource& lines) {
     const auto line = lines.nextLine();
-    Interruption::take();  // what came before the command is not about it
     if (line) execute(*line);
     showRemarks(lines.position());
     return line.has_value();

@@ -1,6 +1,7 @@
 #include "host/console/Interruption.hpp"
 
 #include <atomic>
+#include <ctime>
 
 namespace velkor::host {
 
@@ -42,6 +43,15 @@ bool Interruption::isRequestedHere() noexcept {
 
 bool Interruption::take() noexcept {
     return requested.exchange(false);
+}
+
+void Interruption::forget() noexcept {
+    sigset_t pausable;
+    sigemptyset(&pausable);
+    sigaddset(&pausable, SIGINT);
+    const timespec noWait{};
+    while (sigtimedwait(&pausable, nullptr, &noWait) == SIGINT) continue;
+    requested = false;
 }
 
 }  // namespace velkor::host

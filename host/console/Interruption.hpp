@@ -33,6 +33,9 @@ public:
     /// Clears the mark and gives whether it was set.
     static bool take() noexcept;
 
+    /// Clears the mark, and drops what a `SignalPause` on this thread puts off.
+    static void forget() noexcept;
+
 private:
     struct sigaction previous {};
 };

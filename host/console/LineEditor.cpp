@@ -143,6 +143,9 @@ private:
         el_wset(editor, EL_GETCFN, static_cast<el_rfunc_t>(EL_BUILTIN_GETCFN));
         const int count = el_wgetc(editor, character);
         el_wset(editor, EL_GETCFN, onCharacter);
+        // What came before the line's last key is not about the command; what comes once that key
+        // has made the terminal ordinary again is.
+        Interruption::forget();
         return count;
     }
 

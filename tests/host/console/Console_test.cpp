@@ -166,7 +166,7 @@ TEST_F(ConsoleTest, DropsTheAnswerOfACommandThatIsInterrupted) {
     EXPECT_EQ(answers.str(), "\n<a>\n");
 }
 
-TEST_F(ConsoleTest, AnInterruptionBetweenCommandsEndsNone) {
+TEST_F(ConsoleTest, AnInterruptionBeforeTheCommandsEndsNone) {
     const Interruption interruption;
     std::raise(SIGINT);
     EXPECT_TRUE(run({"echo a"}));

@@ -49,6 +49,17 @@ TEST(Interruption, IsPutOffByAPause) {
     EXPECT_TRUE(Interruption::take());
 }
 
+TEST(Interruption, IsForgottenWithWhatAPausePutsOff) {
+    const Interruption interruption;
+    ::raise(SIGINT);
+    {
+        const SignalPause pause{SIGINT};
+        ::raise(SIGINT);
+        Interruption::forget();
+    }
+    EXPECT_FALSE(Interruption::isRequested());
+}
+
 // A child presses Ctrl-C again and again, since the first time may come too early.
 TEST(Interruption, EndsASystemCallThatWaits) {
     EXPECT_EXIT(
