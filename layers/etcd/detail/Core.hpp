@@ -1,0 +1,49 @@
+#pragma once
+
+#include <functional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "configuration/sources/ValueTable.hpp"
+#include "framework/common/DiagnosticLogger.hpp"
+#include "layers/etcd/EtcdOptions.hpp"
+#include "layers/etcd/detail/Endpoint.hpp"
+#include "layers/etcd/detail/Outbox.hpp"
+#include "layers/etcd/detail/Replica.hpp"
+#include "layers/etcd/detail/Running.hpp"
+#include "layers/etcd/detail/Standing.hpp"
+#include "layers/etcd/detail/Stop.hpp"
+
+namespace velkor::layers::etcd {
+
+/// What a source and its two threads share. Lives as long as one of them.
+struct Core {
+    using Mutation = std::function<Replica::Keys(configuration::ValueTable&)>;
+
+    /// Changes the table of the source as `LiveSource::change` does; false when the source has
+    /// gone.
+    using ChangeTable = std::function<bool(const Mutation&)>;
+
+    Core(std::vector<Endpoint>&& where, std::string keyPrefix, EtcdOptions&& how)
+        : endpoints(std::move(where)), prefix(std::move(keyPrefix)), options(std::move(how)) {}
+
+    /// Changes the table. Throws `Stopped` when the source has gone.
+    void change(const Mutation& mutation) const;
+
+    const std::vector<Endpoint> endpoints;
+    const std::string prefix;
+    const EtcdOptions options;
+    Stop stop;
+    Outbox outbox;
+    Standing standing;
+    Replica replica;          // used by mutations alone, see `Replica`
+    ChangeTable changeTable;  // set before the threads start
+    Running reading;
+    Running writing;
+};
+
+/// Writes a record that is no matter of life and death: what a sink of the log throws is dropped.
+void report(common::Severity severity, const std::string& text) noexcept;
+
+}  // namespace velkor::layers::etcd

@@ -1,0 +1,278 @@
+#include "layers/etcd/detail/Follower.hpp"
+
+#include <algorithm>
+#include <exception>
+#include <random>
+#include <utility>
+
+#include "layers/etcd/EtcdErrors.hpp"
+#include "layers/etcd/detail/Answers.hpp"
+#include "layers/etcd/detail/GatewayErrors.hpp"
+#include "layers/etcd/detail/Requests.hpp"
+#include "layers/etcd/detail/ValueText.hpp"
+
+namespace velkor::layers::etcd {
+
+using common::MutexLock;
+using configuration::ValueMap;
+using configuration::ValueTable;
+
+namespace {
+
+constexpr const char* rangePath = "/v3/kv/range";
+constexpr std::chrono::seconds longestRange{60};
+constexpr std::chrono::seconds saveDelay{1};
+
+/// The changes that come next are not kept any more.
+struct Compacted {};
+
+}  // namespace
+
+std::string Start::await() {
+    MutexLock lock(mutex);
+    while (!outcome) lock.wait(finished);
+    return *outcome;
+}
+
+void Start::finish(const std::string& problem) {
+    const MutexLock lock(mutex);
+    if (!outcome) outcome = problem;
+    finished.notify_all();
+}
+
+Follower::Follower(std::shared_ptr<Core> shared, std::shared_ptr<Start> firstValues)
+    : core(std::move(shared)),
+      start(std::move(firstValues)),
+      startDeadline(Clock::now() + core->options.startWithin),
+      endpoints(core->endpoints, std::random_device()()),
+      backoff(core->options.shortestPause, core->options.longestPause) {}
+
+void Follower::run() {
+    try {
+        for (;;) {
+            if (!hasStarted && Clock::now() >= startDeadline) startWithout();
+            try {
+                follow();
+            } catch (const Compacted&) {
+                report(common::warning, "etcd keeps the next changes no more: all keys are read");
+                mustReadAll = true;
+            } catch (const Stopped&) {
+                throw;
+            } catch (const std::exception& error) {
+                onLost(endpoints.current().text + ": " + error.what());
+                endpoints.next();
+            }
+            pause();
+        }
+    } catch (const std::exception& end) {
+        if (saveDue) save();
+        start->finish(lastProblem.empty() ? end.what() : lastProblem);
+    }
+}
+
+void Follower::follow() {
+    const auto silence = core->options.silence;
+    auto deadline = Clock::now() + silence;
+    if (!hasStarted) deadline = std::min(deadline, startDeadline);
+    Gateway gateway(endpoints.current(), core->options, core->stop, deadline);
+    const bool resumes = hasValues && !mustReadAll && knowsPosition(gateway);
+    if (!resumes) readAll(gateway);
+    receive(gateway);
+}
+
+// A change that was seen is a change of this history, and of no other one.
+bool Follower::knowsPosition(Gateway& gateway) const {
+    try {
+        const auto deadline = Clock::now() + core->options.silence;
+        const RangeAnswer past = readRange(
+            gateway.ask(rangePath, pastRequest(position.witness, position.revision), deadline));
+        const std::int64_t modified = past.entries.empty() ? 0 : past.entries.front().modified;
+        return past.header.cluster == position.cluster && modified == position.witnessModified;
+    } catch (const Refused& refused) {
+        if (!refused.isOutOfRange()) throw;
+        return false;
+    }
+}
+
+void Follower::readAll(Gateway& gateway) {
+    const bool before = hasStarted;
+    const auto deadline = before ? Clock::now() + longestRange : startDeadline;
+    RangeAnswer answer = readRange(
+        gateway.ask(rangePath, rangeRequest(core->prefix), deadline, core->options.silence));
+    Position read{answer.header.cluster, answer.header.revision,
+                  core->prefix.empty() ? std::string(1, '\0') : core->prefix, 0};
+    ValueMap values;
+    values.reserve(answer.entries.size());
+    for (KeyValue& entry : answer.entries) {
+        const auto key = ownKey(entry.key);
+        if (!key || entry.modified > read.revision) throw Unreachable("the answer makes no sense");
+        values.emplace(*key, fromValueText(entry.value));
+        if (entry.modified < read.witnessModified) continue;
+        read.witness = std::move(entry.key);
+        read.witnessModified = entry.modified;
+    }
+    answer.entries.clear();
+    const bool beginsAnew = hasValues && (read.cluster != position.cluster ||
+                                          read.revision < position.revision);
+    if (beginsAnew) {
+        report(common::warning, "etcd has another history: revision " +
+                                    std::to_string(position.revision) + " is followed by " +
+                                    std::to_string(read.revision));
+    }
+    core->change([&](ValueTable& table) {
+        return core->replica.replaceAll(table, std::move(values), read.revision, beginsAnew);
+    });
+    position = std::move(read);
+    hasValues = true;
+    mustReadAll = false;
+    noteChanged();
+}
+
+void Follower::receive(Gateway& gateway) {
+    const auto silence = core->options.silence;
+    const auto began = Clock::now();
+    WatchStream stream(gateway, core->prefix, position.revision + 1, began + silence);
+    if (core->standing.noteConnected(endpoints.current().text)) {
+        report(lastProblem.empty() ? common::debug : common::warning,
+               "etcd is followed at " + endpoints.current().text +
+                   " from revision " + std::to_string(position.revision));
+    }
+    lastProblem.clear();
+    hasStarted = true;
+    start->finish("");
+    auto heard = Clock::now();
+    auto askNext = heard + silence / 3;
+    auto asked = std::chrono::system_clock::now();
+    for (;;) {
+        auto until = std::min(askNext, heard + silence);
+        if (saveDue) until = std::min(until, *saveDue);
+        const bool hasHeard =
+            stream.receive(until, [this](WatchAnswer&& answer) { onAnswer(std::move(answer)); });
+        const auto now = Clock::now();
+        if (hasHeard) {
+            heard = now;
+            core->standing.noteUpdated(asked);
+        }
+        if (now >= heard + silence) throw Unreachable("it is silent");
+        if (now >= began + silence) backoff.reset();
+        if (saveDue && now >= *saveDue) save();
+        if (now < askNext) continue;
+        stream.askForProgress();
+        asked = std::chrono::system_clock::now();
+        askNext = now + silence / 3;
+    }
+}
+
+void Follower::onAnswer(WatchAnswer&& answer) {
+    if (answer.compacted != 0) throw Compacted();
+    if (answer.canceled) throw Unreachable("the changes have ended: " + answer.reason);
+    if (answer.header.cluster != position.cluster) throw Unreachable("another cluster answers");
+    auto& events = answer.events;
+    std::size_t begin = 0;
+    while (begin < events.size()) {
+        std::size_t end = begin + 1;
+        while (end < events.size() && events[end].entry.modified == events[begin].entry.modified) {
+            ++end;
+        }
+        onRevision(events, begin, end);
+        begin = end;
+    }
+}
+
+// What was seen already comes again from nobody but a confused server.
+void Follower::onRevision(std::vector<Event>& events, std::size_t begin, std::size_t end) {
+    const std::int64_t revision = events[begin].entry.modified;
+    if (revision <= position.revision) return;
+    std::vector<KeyUpdate> updates;
+    updates.reserve(end - begin);
+    for (std::size_t i = begin; i < end; ++i) {
+        auto key = ownKey(events[i].entry.key);
+        if (!key) throw Unreachable("the answer makes no sense");
+        KeyUpdate update{std::move(*key)};
+        if (!events[i].isRemoval) update.value = fromValueText(events[i].entry.value);
+        updates.push_back(std::move(update));
+    }
+    try {
+        core->change([&](ValueTable& table) {
+            return core->replica.update(table, std::move(updates), revision);
+        });
+    } catch (const std::bad_alloc&) {
+        mustReadAll = true;
+        throw;
+    }
+    const Event& last = events[end - 1];
+    position.revision = revision;
+    position.witness = last.entry.key;
+    position.witnessModified = last.isRemoval ? 0 : revision;
+    noteChanged();
+}
+
+std::optional<std::string> Follower::ownKey(const std::string& key) const {
+    const std::string& prefix = core->prefix;
+    if (key.compare(0, prefix.size(), prefix) != 0) return std::nullopt;
+    return key.substr(prefix.size());
+}
+
+void Follower::onLost(const std::string& reason) {
+    lastProblem = reason;
+    if (core->standing.noteLost(reason)) report(common::warning, "etcd is lost: " + reason);
+}
+
+void Follower::pause() {
+    auto end = Clock::now() + backoff.next();
+    if (!hasStarted) end = std::min(end, startDeadline);
+    core->stop.sleepUntil(end);
+}
+
+// No member has answered by now.
+void Follower::startWithout() {
+    const auto& options = core->options;
+    if (lastProblem.empty()) onLost("no member has answered in time");
+    if (options.withoutServer == StartWithoutServer::fail) throw Unreachable(lastProblem);
+    if (options.withoutServer == StartWithoutServer::lastKnown) {
+        try {
+            LastKnown known = readLastKnown(options.lastKnownFile, core->prefix);
+            core->change([&](ValueTable& table) {
+                return core->replica.replaceAll(table, std::move(known.values),
+                                                known.position.revision, false);
+            });
+            position = std::move(known.position);
+        } catch (const std::runtime_error& problem) {
+            lastProblem += std::string("; ") + problem.what();
+            throw;
+        }
+        hasValues = true;
+        core->standing.noteRevision(position.revision);
+        report(common::warning, "etcd is not reached, the values are those of revision " +
+                                    std::to_string(position.revision) + " in " +
+                                    options.lastKnownFile.string());
+    }
+    hasStarted = true;
+    start->finish("");
+}
+
+void Follower::noteChanged() {
+    core->standing.noteRevision(position.revision);
+    if (!core->options.lastKnownFile.empty() && !saveDue) saveDue = Clock::now() + saveDelay;
+}
+
+void Follower::save() noexcept {
+    saveDue.reset();
+    try {
+        LastKnown known{position, {}};
+        core->change([&](ValueTable& table) {
+            known.values = core->replica.serverValues(table);
+            return Replica::Keys();
+        });
+        writeLastKnown(core->options.lastKnownFile, core->prefix, known);
+        couldSave = true;
+    } catch (const std::exception& error) {
+        if (couldSave) {
+            report(common::warning, std::string("the last known values can't be kept: ") +
+                                        error.what());
+        }
+        couldSave = false;
+    }
+}
+
+}  // namespace velkor::layers::etcd

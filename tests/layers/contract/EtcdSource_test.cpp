@@ -1,0 +1,51 @@
+#include "layers/etcd/EtcdSource.hpp"
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "layers/testing/SourceContract.hpp"
+#include "tests/layers/etcd/server/EtcdMember.hpp"
+
+namespace velkor::layers {
+namespace {
+
+using configuration::ConfigurationSource;
+using configuration::ConfigurationValue;
+using configuration::ValueMap;
+using namespace layers::testing;
+
+/// One server for all rules, each of which has keys of its own.
+velkor::testing::EtcdCluster& server() {
+    static velkor::testing::EtcdCluster cluster;
+    return cluster;
+}
+
+// What changes by itself is what another process writes.
+class Etcd : public ChangingSubject {
+public:
+    std::shared_ptr<ConfigurationSource> make(const ValueMap& values) override {
+        static int number = 0;
+        const std::string prefix = std::to_string(++number) + "/";
+        other = EtcdSource::open(server().urls(), prefix);
+        for (const auto& [key, value] : values) other->set(key, value);
+        other->committed().get();
+        return EtcdSource::open(server().urls(), prefix);
+    }
+
+    void change(const std::string& key, const std::optional<ConfigurationValue>& value) override {
+        if (value) {
+            other->set(key, *value);
+        } else {
+            other->unset(key);
+        }
+    }
+
+private:
+    std::shared_ptr<EtcdSource> other;
+};
+
+VELKOR_SOURCE_CONTRACT(EtcdSource, Etcd);
+
+}  // namespace
+}  // namespace velkor::layers
