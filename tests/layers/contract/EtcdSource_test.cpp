@@ -3,6 +3,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "layers/testing/SourceContract.hpp"
 #include "tests/layers/etcd/server/EtcdMember.hpp"
@@ -15,11 +16,26 @@ using configuration::ConfigurationValue;
 using configuration::ValueMap;
 using namespace layers::testing;
 
-/// One server for all rules, each of which has keys of its own.
-velkor::testing::EtcdCluster& server() {
-    static velkor::testing::EtcdCluster cluster;
-    return cluster;
+/// One server for all rules, each of which has keys of its own. It ends with the thread that starts
+/// it, and rules run on threads of theirs.
+class Server : public ::testing::Environment {
+public:
+    void SetUp() override { cluster = std::make_unique<velkor::testing::EtcdCluster>(); }
+    void TearDown() override { cluster.reset(); }
+
+    std::vector<std::string> urls() const { return cluster->urls(); }
+
+private:
+    std::unique_ptr<velkor::testing::EtcdCluster> cluster;
+};
+
+Server& server() {
+    static auto* const environment =
+        static_cast<Server*>(::testing::AddGlobalTestEnvironment(new Server));
+    return *environment;
 }
+
+[[maybe_unused]] const Server& registered = server();
 
 // What changes by itself is what another process writes.
 class Etcd : public ChangingSubject {
