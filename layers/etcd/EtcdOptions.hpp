@@ -24,8 +24,8 @@ struct EtcdOptions {
     /// none. Made and replaced by the source; for its owner alone.
     std::filesystem::path lastKnownFile{};
 
-    /// How long a member may be silent before it is given up. It is asked for a sign of life three
-    /// times as often.
+    /// How long a member may be silent before it is given up, 100 ms at least. It is asked for a
+    /// sign of life three times as often.
     std::chrono::milliseconds silence = std::chrono::seconds(3);
 
     /// How long a write may take: to reach a member, and again until that answers.

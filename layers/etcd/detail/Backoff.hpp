@@ -13,7 +13,10 @@ public:
     using Milliseconds = std::chrono::milliseconds;
 
     Backoff(Milliseconds first, Milliseconds last, unsigned seed = std::random_device()())
-        : shortest(first), longest(std::max(first, last)), following(first), random(seed) {}
+        : shortest(std::max(first, Milliseconds(1))),
+          longest(std::max(shortest, last)),
+          following(shortest),
+          random(seed) {}
 
     /// The pause that is due now.
     Milliseconds next() {

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <algorithm>
+#include <chrono>
 #include <functional>
 #include <string>
 #include <utility>
@@ -26,14 +28,16 @@ struct Core {
     using ChangeTable = std::function<bool(const Mutation&)>;
 
     Core(std::vector<Endpoint>&& where, std::string keyPrefix, EtcdOptions&& how)
-        : endpoints(std::move(where)), prefix(std::move(keyPrefix)), options(std::move(how)) {}
+        : endpoints(std::move(where)), prefix(std::move(keyPrefix)), options(std::move(how)) {
+        options.silence = std::max(options.silence, std::chrono::milliseconds(100));
+    }
 
     /// Changes the table. Throws `Stopped` when the source has gone.
     void change(const Mutation& mutation) const;
 
     const std::vector<Endpoint> endpoints;
     const std::string prefix;
-    const EtcdOptions options;
+    EtcdOptions options;  // constant from then on
     Stop stop;
     Outbox outbox;
     Standing standing;

@@ -75,19 +75,22 @@ void Follower::follow() {
     auto deadline = Clock::now() + silence;
     if (!hasStarted) deadline = std::min(deadline, startDeadline);
     Gateway gateway(endpoints.current(), core->options, core->stop, deadline);
-    const bool resumes = hasValues && !mustReadAll && knowsPosition(gateway);
+    const bool resumes = hasValues && !mustReadAll && canResume(gateway);
     if (!resumes) readAll(gateway);
     receive(gateway);
 }
 
-// A change that was seen is a change of this history, and of no other one.
-bool Follower::knowsPosition(Gateway& gateway) const {
+// A change that was seen is a change of this history, and of no other one. What is out of range has
+// been compacted, or is still to come: the revision shows that when all is read.
+bool Follower::canResume(Gateway& gateway) {
     try {
         const auto deadline = Clock::now() + core->options.silence;
         const RangeAnswer past = readRange(
             gateway.ask(rangePath, pastRequest(position.witness, position.revision), deadline));
         const std::int64_t modified = past.entries.empty() ? 0 : past.entries.front().modified;
-        return past.header.cluster == position.cluster && modified == position.witnessModified;
+        isOtherHistory =
+            past.header.cluster != position.cluster || modified != position.witnessModified;
+        return !isOtherHistory;
     } catch (const Refused& refused) {
         if (!refused.isOutOfRange()) throw;
         return false;
@@ -104,15 +107,15 @@ void Follower::readAll(Gateway& gateway) {
     ValueMap values;
     values.reserve(answer.entries.size());
     for (KeyValue& entry : answer.entries) {
-        const auto key = ownKey(entry.key);
+        auto key = ownKey(entry.key);
         if (!key || entry.modified > read.revision) throw Unreachable("the answer makes no sense");
-        values.emplace(*key, fromValueText(entry.value));
+        values.emplace(std::move(*key), fromValueText(entry.value));
         if (entry.modified < read.witnessModified) continue;
         read.witness = std::move(entry.key);
         read.witnessModified = entry.modified;
     }
     answer.entries.clear();
-    const bool beginsAnew = hasValues && (read.cluster != position.cluster ||
+    const bool beginsAnew = hasValues && (isOtherHistory || read.cluster != position.cluster ||
                                           read.revision < position.revision);
     if (beginsAnew) {
         report(common::warning, "etcd has another history: revision " +
@@ -124,7 +127,7 @@ void Follower::readAll(Gateway& gateway) {
     });
     position = std::move(read);
     hasValues = true;
-    mustReadAll = false;
+    mustReadAll = isOtherHistory = false;
     noteChanged();
 }
 

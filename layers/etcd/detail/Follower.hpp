@@ -49,7 +49,7 @@ private:
 
     void follow();
     void readAll(Gateway& gateway);
-    bool knowsPosition(Gateway& gateway) const;
+    bool canResume(Gateway& gateway);
     void receive(Gateway& gateway);
     void onAnswer(WatchAnswer&& answer);
     void onRevision(std::vector<Event>& events, std::size_t begin, std::size_t end);
@@ -69,6 +69,7 @@ private:
     bool hasValues = false;
     bool hasStarted = false;
     bool mustReadAll = false;
+    bool isOtherHistory = false;
     std::string lastProblem;
     std::optional<Clock::time_point> saveDue;
     bool couldSave = true;

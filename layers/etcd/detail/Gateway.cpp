@@ -71,10 +71,6 @@ std::string Gateway::header(const char* path, const std::string& length) const {
            "Content-Length: " + length + "\r\n\r\n";
 }
 
-std::string Gateway::ask(const char* path, const std::string& body, Time deadline) {
-    return ask(path, body, deadline, milliseconds::max());
-}
-
 std::string Gateway::ask(const char* path, const std::string& body, Time deadline,
                          milliseconds silence) {
     isBroken = true;

@@ -36,9 +36,8 @@ public:
 
     /// The answer to `body`, posted to `path`. After anything but an answer the connection is of no
     /// use. `silence` is how long it may take from one part of the answer to the next.
-    std::string ask(const char* path, const std::string& body, Time deadline);
     std::string ask(const char* path, const std::string& body, Time deadline,
-                    std::chrono::milliseconds silence);
+                    std::chrono::milliseconds silence = std::chrono::hours(1));
 
 private:
     friend class WatchStream;

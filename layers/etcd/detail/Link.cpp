@@ -32,7 +32,7 @@ using Addresses = std::unique_ptr<addrinfo, void (*)(addrinfo*)>;
 Addresses addressesOf(const Endpoint& endpoint) {
     addrinfo wanted{};
     wanted.ai_socktype = SOCK_STREAM;
-    wanted.ai_flags = AI_ADDRCONFIG | AI_NUMERICSERV;
+    wanted.ai_flags = AI_NUMERICSERV;
     addrinfo* found = nullptr;
     const int problem =
         ::getaddrinfo(endpoint.host.c_str(), endpoint.port.c_str(), &wanted, &found);

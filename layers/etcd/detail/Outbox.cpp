@@ -134,9 +134,8 @@ void Outbox::finish(const std::exception_ptr& refused) noexcept {
         writes -= group.writes.size();
         bytes -= sizeOf(group);
         if (refused) noteRefusal(group, refused);
-        const auto end = std::find_if(waiters.begin(), waiters.end(), [&](const Waiter& each) {
-            return each.upTo > group.number;
-        });
+        const auto end = std::find_if(waiters.begin(), waiters.end(),
+                                      [&](const Waiter& each) { return each.upTo > group.number; });
         satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
     }
     for (Waiter& each : satisfied) {

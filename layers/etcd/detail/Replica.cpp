@@ -177,8 +177,8 @@ void Replica::take(Table& table, const Group& group, std::int64_t newRevision, K
         if (entry == unanswered.end()) continue;
         const auto& text = lastOf(group, key).text;
         if (newRevision > current) ahead[key] = newRevision;
-        noteServerValue(entry->second,
-                        text ? std::optional(fromValueText(*text)) : std::nullopt, newRevision);
+        noteServerValue(entry->second, text ? std::optional(fromValueText(*text)) : std::nullopt,
+                        newRevision);
         entry->second.writes -= countOf(group, key);
         answer(table, entry, changed);
     }

@@ -28,23 +28,31 @@ std::string rangeOf(const std::string& prefix) {
     return R"("key":)" + bytes(first) + R"(,"range_end":)" + bytes(endOfPrefix(prefix));
 }
 
-void appendComparisons(std::string& list, const KeyChange& change) {
-    if (!change.condition) return;
-    const auto append = [&](const std::string& comparison) {
-        list += list.empty() ? "" : ",";
-        list += R"({"key":)" + bytes(change.key) + "," + comparison + "}";
+void append(std::string& list, const std::string& element) {
+    list += list.empty() ? "" : ",";
+    list += element;
+}
+
+void appendComparisons(std::string& list, const KeyChange& change, bool isStrict) {
+    const auto compare = [&](const std::string& comparison) {
+        append(list, R"({"key":)" + bytes(change.key) + "," + comparison + "}");
     };
-    append(change.condition->exists
-               ? R"("target":"VERSION","result":"GREATER","version":"0")"
-               : R"("target":"VERSION","result":"EQUAL","version":"0")");
-    append(R"("target":"MOD","result":"LESS","mod_revision":)" +
-           number(change.condition->revision + 1));
+    if (!change.condition.exists) {
+        return compare(R"("target":"VERSION","result":"EQUAL","version":"0")");
+    }
+    compare(R"("target":"MOD","result":"LESS","mod_revision":)" +
+            number(change.condition.revision + 1));
+    if (isStrict) compare(R"("target":"VERSION","result":"GREATER","version":"0")");
+}
+
+std::string readOperation(const std::string& key) {
+    return R"({"request_range":{"key":)" + bytes(key) + "}}";
 }
 
 std::string operationOf(const KeyChange& change) {
     if (!change.value) return R"({"request_delete_range":{"key":)" + bytes(change.key) + "}}";
-    return R"({"request_put":{"key":)" + bytes(change.key) + R"(,"value":)" +
-           bytes(*change.value) + "}}";
+    return R"({"request_put":{"key":)" + bytes(change.key) + R"(,"value":)" + bytes(*change.value) +
+           "}}";
 }
 
 }  // namespace
@@ -66,30 +74,30 @@ std::string pastRequest(const std::string& key, std::int64_t revision) {
 }
 
 std::string watchRequest(const std::string& prefix, std::int64_t revision) {
-    return R"({"create_request":{)" + rangeOf(prefix) + R"(,"start_revision":)" +
-           number(revision) + "}}\n";
+    return R"({"create_request":{)" + rangeOf(prefix) + R"(,"start_revision":)" + number(revision) +
+           "}}\n";
 }
 
 std::string progressRequest() {
     return "{\"progress_request\":{}}\n";
 }
 
-std::string transactionRequest(const std::vector<KeyChange>& changes) {
+std::string transactionRequest(const std::vector<KeyChange>& changes, bool isStrict) {
     std::string comparisons;
     std::string operations;
+    std::string reads;
     for (const KeyChange& change : changes) {
-        appendComparisons(comparisons, change);
-        operations += (operations.empty() ? "" : ",") + operationOf(change);
+        appendComparisons(comparisons, change, isStrict);
+        append(operations, operationOf(change));
+        append(reads, readOperation(change.key));
     }
-    return R"({"compare":[)" + comparisons + R"(],"success":[)" + operations + "]}";
+    return R"({"compare":[)" + comparisons + R"(],"success":[)" + operations + R"(],"failure":[)" +
+           reads + "]}";
 }
 
 std::string readRequest(const std::vector<std::string>& keys) {
     std::string operations;
-    for (const auto& key : keys) {
-        operations += operations.empty() ? "" : ",";
-        operations += R"({"request_range":{"key":)" + bytes(key) + "}}";
-    }
+    for (const auto& key : keys) append(operations, readOperation(key));
     return R"({"success":[)" + operations + "]}";
 }
 

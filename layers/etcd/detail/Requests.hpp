@@ -18,7 +18,7 @@ struct KeyChange {
         std::int64_t revision;
         bool exists;
     };
-    std::optional<Condition> condition{};
+    Condition condition{};
 };
 
 /// The end of the range of all keys that `prefix` begins.
@@ -38,8 +38,10 @@ std::string watchRequest(const std::string& prefix, std::int64_t revision);
 /// A sign of life on the stream.
 std::string progressRequest();
 
-/// All of `changes`, each of another key, or nothing of them.
-std::string transactionRequest(const std::vector<KeyChange>& changes);
+/// All of `changes`, each of another key, or, where a condition isn't met, the keys as they are.
+/// The server takes one comparison for each change at least; strictly there are two, and a key that
+/// is to be there and isn't meets no condition.
+std::string transactionRequest(const std::vector<KeyChange>& changes, bool isStrict);
 
 /// Several keys at one moment.
 std::string readRequest(const std::vector<std::string>& keys);

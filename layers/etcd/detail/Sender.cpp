@@ -30,6 +30,14 @@ std::exception_ptr unknown(const std::string& reason) {
     return std::make_exception_ptr(UnknownOutcome(etcd_errors::unknownOutcome + reason));
 }
 
+/// Lets `changes` have seen what `answer` says of their keys.
+void lookAgain(std::vector<KeyChange>& changes, const TransactionAnswer& answer) {
+    if (answer.ranges.size() != changes.size()) throw Unreachable("the answer makes no sense");
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        changes[i].condition = {answer.header.revision, !answer.ranges[i].entries.empty()};
+    }
+}
+
 /// Changes the table by `mutation`, which adds what it changes to the keys that it is given, and
 /// goes on where it was when memory was short.
 void changeUntilDone(const Core& core,
@@ -65,8 +73,8 @@ void Sender::run() {
     } catch (const Stopped&) {
         gateway.reset();
     }
-    core->outbox.refuseAll(refusal(std::string(etcd_errors::notReached) +
-                                   etcd_errors::sourceEnded));
+    core->outbox.refuseAll(
+        refusal(std::string(etcd_errors::notReached) + etcd_errors::sourceEnded));
 }
 
 void Sender::send(const Group& group) {
@@ -101,11 +109,17 @@ void Sender::disconnect() {
 
 // What it throws says that the group was not sent, or not done, and may be sent again.
 void Sender::sendUntil(const Group& group, Clock::time_point deadline) {
-    const std::string request = transactionRequest(changesOf(group));
-    std::string answer;
+    std::vector<KeyChange> changes = changesOf(group);
+    const bool isStrict = core->options.compareAndSwap;
     try {
-        answer = gateway->ask(transactionPath, request, deadline);
-        onTaken(group, answer);
+        for (;;) {
+            const std::string request = transactionRequest(changes, isStrict);
+            const auto answer = readTransaction(gateway->ask(transactionPath, request, deadline));
+            backoff.reset();
+            if (answer.succeeded) return onTaken(group, answer.header.revision);
+            if (isStrict) return onRefused(group, etcd_errors::changedMeanwhile);
+            lookAgain(changes, answer);
+        }
     } catch (const Stopped&) {
         core->outbox.finish(unknown(etcd_errors::sourceEnded));
         throw;
@@ -118,13 +132,10 @@ void Sender::sendUntil(const Group& group, Clock::time_point deadline) {
     }
 }
 
-void Sender::onTaken(const Group& group, const std::string& answer) {
-    const TransactionAnswer taken = readTransaction(answer);
-    backoff.reset();
-    if (!taken.succeeded) return onRefused(group, etcd_errors::changedMeanwhile);
-    core->outbox.noteTaken(group, taken.header.revision);
+void Sender::onTaken(const Group& group, std::int64_t revision) {
+    core->outbox.noteTaken(group, revision);
     changeUntilDone(*core, [&](ValueTable& table, Replica::Keys& changed) {
-        core->replica.take(table, group, taken.header.revision, changed);
+        core->replica.take(table, group, revision, changed);
     });
     core->outbox.finish(nullptr);
 }
@@ -164,8 +175,8 @@ void Sender::settle(const Group& group) {
     std::vector<std::string> keys;
     keys.reserve(found.size());
     for (const auto& each : found) keys.push_back(each.first);
-    const auto answer = readTransaction(gateway->ask(transactionPath, readRequest(keys),
-                                                     Clock::now() + core->options.silence));
+    const auto answer = readTransaction(
+        gateway->ask(transactionPath, readRequest(keys), Clock::now() + core->options.silence));
     for (const RangeAnswer& range : answer.ranges) {
         for (const KeyValue& entry : range.entries) {
             const auto update = found.find(entry.key);
@@ -190,7 +201,7 @@ std::vector<KeyChange> Sender::changesOf(const Group& group) const {
     for (const Write& write : group.writes) {
         const std::string key = core->prefix + write.key;
         const auto [change, isFirst] = changes.try_emplace(key, KeyChange{key});
-        if (isFirst && core->options.compareAndSwap) change->second.condition = write.seen;
+        if (isFirst) change->second.condition = write.seen;
         change->second.value = write.text;
     }
     std::vector<KeyChange> all;

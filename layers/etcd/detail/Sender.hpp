@@ -1,6 +1,7 @@
 #pragma once
 
 #include <chrono>
+#include <cstdint>
 #include <exception>
 #include <memory>
 #include <optional>
@@ -17,6 +18,11 @@ namespace velkor::layers::etcd {
 /// The thread that writes: sends one group of writes after the other, each in a transaction. What
 /// was sent is never sent again, unless the member says that it hasn't been done: of a group that
 /// isn't answered the keys are read until that succeeds, and the next group is sent then.
+///
+/// Each group is made on the condition that nobody has written its keys since they were seen. One
+/// that comes late, after its answer was given up, can't undo a later write by that. Where another
+/// has written, what is there is seen now, and the group is sent again, unless who wrote it asked
+/// for a comparison.
 class Sender {
 public:
     explicit Sender(std::shared_ptr<Core> shared);
@@ -29,7 +35,7 @@ private:
 
     void send(const Group& group);
     void sendUntil(const Group& group, Clock::time_point deadline);
-    void onTaken(const Group& group, const std::string& answer);
+    void onTaken(const Group& group, std::int64_t revision);
     void onRefused(const Group& group, const std::string& reason);
     void onUnknown(const Group& group, const std::string& reason);
     void settle(const Group& group);

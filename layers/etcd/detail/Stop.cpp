@@ -22,7 +22,9 @@ constexpr milliseconds longestPoll = std::chrono::hours(1);
 
 // Rounded up: whoever is woken too early would spin.
 int pollTime(Stop::Time end) {
-    const auto left = std::chrono::ceil<milliseconds>(end - std::chrono::steady_clock::now());
+    const auto now = std::chrono::steady_clock::now();
+    if (end <= now) return 0;
+    const auto left = std::chrono::ceil<milliseconds>(end - now);
     return static_cast<int>(std::clamp(left, milliseconds(0), longestPoll).count());
 }
 

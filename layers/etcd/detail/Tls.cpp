@@ -18,9 +18,9 @@ namespace {
 [[noreturn]] void refuse(const std::string& what, const std::string& file) {
     errno = 0;
     const bool canBeRead = std::ifstream(file).good();
-    throw Unreachable("can't use the " + what + " " + file + ": " +
-                      (canBeRead ? "it is none in PEM, or doesn't fit"
-                                 : std::generic_category().message(errno)));
+    throw Unreachable(
+        "can't use the " + what + " " + file + ": " +
+        (canBeRead ? "it is none in PEM, or doesn't fit" : std::generic_category().message(errno)));
 }
 
 // No one is there who could type a pass phrase.

@@ -202,8 +202,7 @@ TEST_F(Apply, WritesWithinAGroupOfTheSource) {
     const auto source = std::make_shared<GroupedSource>();
     store->addSource("grouped", "", -1, false, source);
     store->apply({setting("a", 1), setting("b", 2)}).get();
-    EXPECT_THAT(source->groups(),
-                ElementsAre("begin", "begin", "set a", "set b", "end", "end"));
+    EXPECT_THAT(source->groups(), ElementsAre("begin", "begin", "set a", "set b", "end", "end"));
 }
 
 TEST_F(Apply, EndsTheGroupWhenASourceThrows) {

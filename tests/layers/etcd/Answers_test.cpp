@@ -119,10 +119,20 @@ TEST(EtcdRequests, AskForAllKeysWithoutAPrefix) {
 }
 
 TEST(EtcdRequests, CompareWhatWasSeen) {
-    EXPECT_EQ(transactionRequest({{"a", "1", KeyChange::Condition{6, true}}}),
-              R"({"compare":[{"key":"YQ==","target":"VERSION","result":"GREATER","version":"0"},)"
-              R"({"key":"YQ==","target":"MOD","result":"LESS","mod_revision":"7"}],)"
-              R"("success":[{"request_put":{"key":"YQ==","value":"MQ=="}}]})");
+    EXPECT_EQ(transactionRequest({{"a", "1", {6, true}}}, true),
+              R"({"compare":[{"key":"YQ==","target":"MOD","result":"LESS","mod_revision":"7"},)"
+              R"({"key":"YQ==","target":"VERSION","result":"GREATER","version":"0"}],)"
+              R"("success":[{"request_put":{"key":"YQ==","value":"MQ=="}}],)"
+              R"("failure":[{"request_range":{"key":"YQ=="}}]})");
+}
+
+TEST(EtcdRequests, CompareOncePerKeyUnlessStrictly) {
+    EXPECT_EQ(transactionRequest({{"a", std::nullopt, {6, true}}, {"b", "1", {6, false}}}, false),
+              R"({"compare":[{"key":"YQ==","target":"MOD","result":"LESS","mod_revision":"7"},)"
+              R"({"key":"Yg==","target":"VERSION","result":"EQUAL","version":"0"}],)"
+              R"("success":[{"request_delete_range":{"key":"YQ=="}},)"
+              R"({"request_put":{"key":"Yg==","value":"MQ=="}}],)"
+              R"("failure":[{"request_range":{"key":"YQ=="}},{"request_range":{"key":"Yg=="}}]})");
 }
 
 }  // namespace

@@ -10,8 +10,12 @@ namespace velkor::layers::etcd {
 namespace {
 
 const std::vector<std::pair<std::string, std::string>> pairs{
-    {"", ""},         {"f", "Zg=="},        {"fo", "Zm8="},
-    {"foo", "Zm9v"},  {"foob", "Zm9vYg=="}, {std::string("\0\xFF", 2), "AP8="},
+    {"", ""},
+    {"f", "Zg=="},
+    {"fo", "Zm8="},
+    {"foo", "Zm9v"},
+    {"foob", "Zm9vYg=="},
+    {std::string("\0\xFF", 2), "AP8="},
     {"\xFB\xFF", "+/8="},
 };
 
@@ -24,8 +28,8 @@ TEST(EtcdBase64, IsRead) {
 }
 
 TEST(EtcdBase64, IsRefusedWhenItIsNone) {
-    for (const char* text : {"Z", "Zg", "Zg=", "Z===", "====", "Zg==Zg==", "Zm9-", "Zh==", "Zm9=",
-                             "Zm 9", "\xFF\xFF\xFF\xFF"}) {
+    for (const char* text : {"Z", "Zg", "Zg=", "Z===", "====", "Zg==Zg==", "Zm9-",
+                             "Zh==", "Zm9=", "Zm 9", "\xFF\xFF\xFF\xFF"}) {
         EXPECT_EQ(fromBase64(text), std::nullopt) << text;
     }
 }

@@ -15,8 +15,8 @@
 namespace velkor::layers::etcd {
 namespace {
 
-using testing::thrownText;
 using ::testing::ElementsAre;
+using testing::thrownText;
 
 class EtcdOutbox : public ::testing::Test {
 protected:

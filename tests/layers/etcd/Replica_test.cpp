@@ -31,8 +31,8 @@ protected:
     }
 
     Group write(const std::string& key, std::optional<ConfigurationValue> value) {
-        auto prepared = Outbox::prepare(
-            {key, value ? std::optional(toValueText(*value)) : std::nullopt});
+        auto prepared =
+            Outbox::prepare({key, value ? std::optional(toValueText(*value)) : std::nullopt});
         replica.write(table, key, std::move(value));
         return std::move(prepared.front());
     }

@@ -110,8 +110,8 @@ TEST(EtcdValueText, IsReadWhateverTheOrderAndTheBlanks) {
 }
 
 TEST(EtcdValueText, ReadsEveryEscape) {
-    const auto value = fromValueText(
-        R"({"type":"ustring","value":"\"\\\/\b\f\n\r\t\u0041\ud83d\ude00"})");
+    const auto value =
+        fromValueText(R"({"type":"ustring","value":"\"\\\/\b\f\n\r\t\u0041\ud83d\ude00"})");
     EXPECT_TRUE(value == ConfigurationValue(std::u16string(u"\"\\/\b\f\n\r\tA\U0001F600")));
 }
 
@@ -146,7 +146,8 @@ TEST(EtcdValueText, IsPlainTextWhenItIsNoValue) {
         R"({"type":"long","value":1})",
         R"({"type":"int","value":1,"more":2})",
         R"({"type":"int","type":"int","value":1})",
-        R"({"type":"int","value":1} )" "x",
+        R"({"type":"int","value":1} )"
+        "x",
         R"({"type":"int","value":1,"exact":"!"})",
         R"({"type":"int","value":1,"exact":"c3RyaW5nOv8="})",
         "{\"type\":\"int\",\"value\":" + std::string(100'000, '[') + "}",

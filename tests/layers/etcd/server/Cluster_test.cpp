@@ -74,9 +74,8 @@ TEST_F(EtcdThreeMembers, AreLeftWhenTheyAreFrozen) {
     const auto urls = cluster.urls();
     const auto place = std::find(urls.begin(), urls.end(), endpoint) - urls.begin();
     cluster[static_cast<std::size_t>(place)].freeze();
-    ASSERT_TRUE(comesAbout([&] {
-        return fleet.source->state().isWell && fleet.detail("endpoint") != endpoint;
-    }));
+    ASSERT_TRUE(comesAbout(
+        [&] { return fleet.source->state().isWell && fleet.detail("endpoint") != endpoint; }));
     EXPECT_TRUE(comesAbout([&] {
         fleet.store->set("a", 1);
         return fleet.refusal().empty();

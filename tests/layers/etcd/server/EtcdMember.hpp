@@ -213,9 +213,9 @@ public:
                    "=http://127.0.0.1:" + std::to_string(ports.back());
         }
         for (int i = 0; i < count; ++i) {
-            members.push_back(std::make_unique<EtcdMember>(
-                "m" + std::to_string(i), freePort(), ports[static_cast<std::size_t>(i)], all,
-                arguments));
+            members.push_back(std::make_unique<EtcdMember>("m" + std::to_string(i), freePort(),
+                                                           ports[static_cast<std::size_t>(i)], all,
+                                                           arguments));
             members.back()->start();
         }
         for (const auto& member : members) {

@@ -42,8 +42,6 @@ protected:
         member().ctl("put " + quoted(prefix + key) + " -- " + quoted(text));
     }
 
-    FleetProcess process() const { return FleetProcess(cluster->urls(), prefix); }
-
     static std::unique_ptr<EtcdCluster> cluster;
     static int number;
     const std::string prefix;
@@ -85,10 +83,18 @@ TEST_F(EtcdSourceTest, CarriesEveryKindExactly) {
     const FleetProcess writer(cluster->urls(), prefix);
     const FleetProcess reader(cluster->urls(), prefix);
     std::vector<ConfigurationValue> values{
-        true, -7, 7U, 0.1, std::u16string(1, u'\xD800'), std::string("\xFF\0z", 3),
-        std::vector<bool>{true, false}, std::vector<int>{1}, std::vector<unsigned>{},
+        true,
+        -7,
+        7U,
+        0.1,
+        std::u16string(1, u'\xD800'),
+        std::string("\xFF\0z", 3),
+        std::vector<bool>{true, false},
+        std::vector<int>{1},
+        std::vector<unsigned>{},
         std::vector<double>{std::numeric_limits<double>::infinity(), -0.0},
-        std::vector<std::string>{"", "\x80"}, std::vector<std::u16string>{u"\u00e9"}};
+        std::vector<std::string>{"", "\x80"},
+        std::vector<std::u16string>{u"\u00e9"}};
     ASSERT_EQ(values.size(), configuration::typeTags.size());
     for (const auto& value : values) writer.store->set(std::to_string(value.which()), value);
     EXPECT_EQ(writer.refusal(), "");
@@ -154,7 +160,8 @@ TEST_F(EtcdSourceTest, TellsAWholeRevision) {
                  !(reader->get("a") == reader->get("c"));
     });
     for (int i = 0; i < 50; ++i) writer.store->apply({{"a", i}, {"b", i}, {"c", i}});
-    EXPECT_TRUE(comesAbout([&] { return reader->has("c") && reader->get("c") == ConfigurationValue(49); }));
+    EXPECT_TRUE(
+        comesAbout([&] { return reader->has("c") && reader->get("c") == ConfigurationValue(49); }));
     EXPECT_FALSE(isTorn);
 }
 
@@ -185,36 +192,65 @@ TEST_F(EtcdSourceTest, SaysHowItStands) {
         << "Also without changes the values are known to be those of the server.";
 }
 
-TEST_F(EtcdSourceTest, RefusesToOverwriteWhatItHasNotSeen) {
+TEST_F(EtcdSourceTest, OverwritesWhatItWroteItself) {
     EtcdOptions options;
     options.compareAndSwap = true;
-    FaultProxy proxy(member().port());
-    FleetProcess fleet({proxy.url()}, prefix, options);
+    const FleetProcess fleet(cluster->urls(), prefix, options);
+    for (int i = 0; i < 20; ++i) fleet.store->set("a", i);
+    EXPECT_EQ(fleet.refusal(), "");
+    fleet.store->unset("a");
     fleet.store->set("a", 1);
-    fleet.store->set("a", 2);
-    EXPECT_EQ(fleet.refusal(), "") << "Its own writes are no one else's.";
+    EXPECT_EQ(fleet.refusal(), "");
+}
+
+/// A source that hears of nothing that others write, until its connections are cut.
+class EtcdDeafSource : public EtcdSourceTest {
+protected:
+    EtcdDeafSource() {
+        options.compareAndSwap = true;
+        options.silence = std::chrono::minutes(1);
+    }
+
+    std::string refusalOf(FleetProcess& fleet, const std::string& key) const {
+        fleet.store->set(key, 3);
+        return fleet.refusal();
+    }
+
+    EtcdOptions options;
+    FaultProxy proxy{member().port()};
+};
+
+TEST_F(EtcdDeafSource, RefusesToOverwriteWhatItHasNotSeen) {
+    put("a", "1");
+    put("gone", "1");
+    FleetProcess fleet({proxy.url()}, prefix, options);
     proxy.stall();
     put("a", "other");
     put("new", "other");
-    for (const char* key : {"a", "new"}) {
-        fleet.store->set(key, 3);
-        EXPECT_EQ(fleet.refusal(),
+    member().ctl("del " + prefix + "gone");
+    for (const char* key : {"a", "new", "gone"}) {
+        EXPECT_EQ(refusalOf(fleet, key),
                   "etcd refused the write: another has changed the key meanwhile");
     }
+    proxy.cutOnce();
     EXPECT_TRUE(fleet.shows("a", "string other"));
+    EXPECT_TRUE(fleet.shows("gone", "none"));
 }
 
-TEST_F(EtcdSourceTest, RefusesToOverwriteWhatIsGone) {
-    EtcdOptions options;
-    options.compareAndSwap = true;
+TEST_F(EtcdDeafSource, OverwritesAllTheSameUnlessItIsToCompare) {
+    options.compareAndSwap = false;
     put("a", "1");
-    FaultProxy proxy(member().port());
-    const FleetProcess fleet({proxy.url()}, prefix, options);
+    FleetProcess fleet({proxy.url()}, prefix, options);
     proxy.stall();
-    member().ctl("del " + prefix + "a");
-    fleet.store->set("a", 3);
-    EXPECT_EQ(fleet.refusal(), "etcd refused the write: another has changed the key meanwhile");
-    EXPECT_TRUE(fleet.shows("a", "none"));
+    put("a", "other");
+    put("new", "other");
+    for (const char* key : {"a", "new"}) EXPECT_EQ(refusalOf(fleet, key), "");
+    proxy.cutOnce();
+    put("fence", "1");
+    EXPECT_TRUE(fleet.shows("fence", "string 1"));
+    EXPECT_EQ(fleet.at("a"), "int 3");
+    EXPECT_EQ(member().ctl("get --print-value-only " + prefix + "a"),
+              "{\"type\":\"int\",\"value\":3}\n");
 }
 
 TEST_F(EtcdSourceTest, RefusesAValueThatIsTooLarge) {

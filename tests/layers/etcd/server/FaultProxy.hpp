@@ -139,8 +139,10 @@ private:
             const std::lock_guard<std::mutex> lock(mutex);
             std::size_t index = 1;
             for (auto& each : pairs) {
-                if (polled[index++].revents != 0) pass(each, each.client, each.member, each.requests);
-                if (polled[index++].revents != 0) pass(each, each.member, each.client, each.answers);
+                if (polled[index++].revents != 0)
+                    pass(each, each.client, each.member, each.requests);
+                if (polled[index++].revents != 0)
+                    pass(each, each.member, each.client, each.answers);
             }
             if (polled[0].revents != 0) welcome();
         }
@@ -159,8 +161,8 @@ private:
             return;
         }
         for (ssize_t sent = 0; sent < size;) {
-            const auto more = ::send(to, bytes + sent, static_cast<std::size_t>(size - sent),
-                                     MSG_NOSIGNAL);
+            const auto more =
+                ::send(to, bytes + sent, static_cast<std::size_t>(size - sent), MSG_NOSIGNAL);
             if (more <= 0) pair.isBroken = true;
             if (more <= 0) return;
             sent += more;

@@ -154,8 +154,7 @@ TEST_F(EtcdFaults, BeyondACompactionTellWhatDiffers) {
     proxy.mend();
     ASSERT_TRUE(fleet.becomesWell());
     ASSERT_TRUE(fleet.shows("new", "string 1"));
-    EXPECT_THAT(fleet.told(),
-                UnorderedElementsAre("changed=string 3", "gone", "new=string 1"));
+    EXPECT_THAT(fleet.told(), UnorderedElementsAre("changed=string 3", "gone", "new=string 1"));
 }
 
 TEST_F(EtcdFaults, OfARestoredServerAreFollowed) {
@@ -247,12 +246,14 @@ TEST_F(EtcdFaults, AtTheStartEndIt) {
     EtcdOptions options;
     options.startWithin = std::chrono::milliseconds(300);
     proxy.cut();
-    EXPECT_THAT(thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); }),
-                StartsWith("etcd could not be read: " + proxy.url() + ": "));
+    EXPECT_THAT(
+        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); }),
+        StartsWith("etcd could not be read: " + proxy.url() + ": "));
     proxy.mend();
     proxy.stallNew();
-    EXPECT_THAT(thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); }),
-                StartsWith("etcd could not be read: " + proxy.url() + ": "));
+    EXPECT_THAT(
+        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); }),
+        StartsWith("etcd could not be read: " + proxy.url() + ": "));
 }
 
 TEST_F(EtcdFaults, AtTheStartAreWaitedOut) {
@@ -302,7 +303,7 @@ TEST_F(EtcdLastKnownStart, HasTheValuesOfTheFile) {
         FleetProcess fleet({proxy.url()}, "p/", options);
         put("b", "1");
         ASSERT_TRUE(fleet.shows("b", "string 1"));
-        proxy.stall();
+        proxy.stallNew();
         fleet.store->set("unanswered", 1);
         revision = fleet.detail("revision");
         proxy.cut();
@@ -332,8 +333,8 @@ TEST_F(EtcdLastKnownStart, KeepsTheFileWhileItRuns) {
 
 TEST_F(EtcdLastKnownStart, IsRefusedWithoutTheFile) {
     proxy.cut();
-    const std::string problem = thrownText<std::runtime_error>(
-        [&] { EtcdSource::open({proxy.url()}, "p/", options); });
+    const std::string problem =
+        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); });
     EXPECT_THAT(problem, StartsWith("etcd could not be read: " + proxy.url() + ": "));
     EXPECT_THAT(problem, HasSubstr("; " + options.lastKnownFile.string() + ": No such file"));
 }

@@ -40,8 +40,8 @@ public:
 
     /// Whether the key shows that soon.
     [[nodiscard]] bool shows(const std::string& key, const std::string& text) const {
-        return comesAbout([&] { return source->has(key) ? textOf(source->get(key)) == text
-                                                        : text == "none"; });
+        return comesAbout(
+            [&] { return source->has(key) ? textOf(source->get(key)) == text : text == "none"; });
     }
 
     /// Whether the source is, or is not, connected soon.
