@@ -59,16 +59,15 @@ EtcdSource::~EtcdSource() {
 
 void EtcdSource::start() {
     const auto firstValues = std::make_shared<etcd::Start>();
-    reader.emplace(threadFunction(core, &Core::reading,
-                                  [firstValues](const std::shared_ptr<Core>& shared) {
-                                      etcd::Follower(shared, firstValues).run();
-                                  }));
+    reader.emplace(
+        threadFunction(core, &Core::reading, [firstValues](const std::shared_ptr<Core>& shared) {
+            etcd::Follower(shared, firstValues).run();
+        }));
     const std::string problem = firstValues->await();
     if (!problem.empty()) throw std::runtime_error(etcd_errors::notStarted + problem);
-    writer.emplace(
-        threadFunction(core, &Core::writing, [](const std::shared_ptr<Core>& shared) {
-            etcd::Sender(shared).run();
-        }));
+    writer.emplace(threadFunction(core, &Core::writing, [](const std::shared_ptr<Core>& shared) {
+        etcd::Sender(shared).run();
+    }));
 }
 
 void EtcdSource::finish() {

@@ -137,8 +137,8 @@ void Follower::receive(Gateway& gateway) {
     WatchStream stream(gateway, core->prefix, position.revision + 1, began + silence);
     if (core->standing.noteConnected(endpoints.current().text)) {
         report(lastProblem.empty() ? common::debug : common::warning,
-               "etcd is followed at " + endpoints.current().text +
-                   " from revision " + std::to_string(position.revision));
+               "etcd is followed at " + endpoints.current().text + " from revision " +
+                   std::to_string(position.revision));
     }
     lastProblem.clear();
     hasStarted = true;
@@ -216,7 +216,10 @@ std::optional<std::string> Follower::ownKey(const std::string& key) const {
     return key.substr(prefix.size());
 }
 
+// The attempt that the end of the time to start ends says less than the one before.
 void Follower::onLost(const std::string& reason) {
+    const bool isOutOfTime = !hasStarted && Clock::now() >= startDeadline;
+    if (isOutOfTime && !lastProblem.empty()) return;
     lastProblem = reason;
     if (core->standing.noteLost(reason)) report(common::warning, "etcd is lost: " + reason);
 }
@@ -271,8 +274,8 @@ void Follower::save() noexcept {
         couldSave = true;
     } catch (const std::exception& error) {
         if (couldSave) {
-            report(common::warning, std::string("the last known values can't be kept: ") +
-                                        error.what());
+            report(common::warning,
+                   std::string("the last known values can't be kept: ") + error.what());
         }
         couldSave = false;
     }

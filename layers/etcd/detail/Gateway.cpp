@@ -67,8 +67,8 @@ std::string Gateway::header(const char* path, const std::string& length) const {
     // A member that has lost its leader is to say so instead of being silent.
     return std::string("POST ") + path + " HTTP/1.1\r\nHost: " + host + ":" + endpoint.port +
            "\r\nContent-Type: application/json\r\nGrpc-Metadata-hasleader: true\r\n" +
-           (token.empty() ? "" : "Authorization: " + token + "\r\n") +
-           "Content-Length: " + length + "\r\n\r\n";
+           (token.empty() ? "" : "Authorization: " + token + "\r\n") + "Content-Length: " + length +
+           "\r\n\r\n";
 }
 
 std::string Gateway::ask(const char* path, const std::string& body, Time deadline,

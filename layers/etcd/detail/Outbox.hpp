@@ -91,8 +91,7 @@ private:
     using Waiters = std::list<Waiter>;
 
     bool isOpen(const Group& group) const VELKOR_REQUIRES(mutex);
-    void noteRefusal(const Group& group, const std::exception_ptr& refused)
-        VELKOR_REQUIRES(mutex);
+    void noteRefusal(const Group& group, const std::exception_ptr& refused) VELKOR_REQUIRES(mutex);
 
     mutable common::Mutex mutex;
     std::condition_variable wakeUp;
