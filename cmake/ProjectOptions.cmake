@@ -7,10 +7,14 @@ target_compile_features(velkor-build-options INTERFACE cxx_std_17)
 if(PROJECT_IS_TOP_LEVEL)
     target_compile_options(velkor-build-options INTERFACE
         -Wall -Wextra -Wpedantic -Werror
-        -Wshadow -Wconversion -Wsign-conversion -Wold-style-cast -Wcast-qual
+        -Wconversion -Wsign-conversion -Wold-style-cast -Wcast-qual
         -Wnon-virtual-dtor -Woverloaded-virtual -Wformat=2 -Wundef
+        # Sources that are compiled as one see each other's names, which shadow nothing alone, and
+        # are headers in the eyes of the compiler.
+        $<IF:$<BOOL:$<TARGET_PROPERTY:UNITY_BUILD>>,$<$<CXX_COMPILER_ID:GNU>:-Wno-subobject-linkage>,-Wshadow>
         $<$<CXX_COMPILER_ID:GNU>:-Wduplicated-cond -Wlogical-op -Wsuggest-override>
-        $<$<CXX_COMPILER_ID:Clang>:-Wthread-safety -Winconsistent-missing-override>)
+        $<$<CXX_COMPILER_ID:Clang>:-Wthread-safety -Winconsistent-missing-override
+            -Wreserved-identifier>)
 endif()
 
 # Programs find the libraries that are installed with them, wherever that is.

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
 #include <functional>
 #include <memory>
@@ -98,6 +99,12 @@ public:
     /// The source that is registered under `name`; null when there is none. Its groups and order
     /// are the store's: its keys are without the group.
     Future<std::shared_ptr<ConfigurationSource>> findSource(const std::string& name);
+
+    /// The first keys, at most `most` and that is one at least, of all sources that are not less
+    /// than `first` byte by byte, sorted; with their groups. Empty only where there are no more of
+    /// them. For who goes through a large store: takes time in proportion to all keys, and memory
+    /// to those that it gives.
+    Future<std::vector<std::string>> keysFrom(const std::string& first, std::size_t most);
 
     /// Every source that holds `key` with the value it gives, in order of precedence: the first is
     /// the effective one. Empty when there is none.

@@ -68,6 +68,12 @@ Future<std::shared_ptr<ConfigurationSource>> ConfigurationImpl::findSource(
     return makeReadyFuture(found == nullptr ? nullptr : found->source);
 }
 
+Future<std::vector<std::string>> ConfigurationImpl::keysFrom(const std::string& first,
+                                                             std::size_t most) {
+    const Operation operation(*this);
+    return makeReadyFuture(sources.keysFrom(first, most));
+}
+
 Future<std::vector<Option>> ConfigurationImpl::explain(const std::string& key) {
     const Operation operation(*this);
     return makeReadyFuture(sources.holders(key));

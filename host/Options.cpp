@@ -26,15 +26,18 @@ constexpr const char* footer =
     "With --env APP_ the variable APP_SERVER__MAX_SIZE is server.max_size.\n"
     "On a terminal, and with --listen, files are read again when they change, unless an option\n"
     "says otherwise.\n"
-    "With --listen commands come from -c, and with --console as they do without it. SIGINT and\n"
-    "SIGTERM end it.\n"
+    "Behind -- stands one command, whose words are taken as they are.\n"
+    "With --listen commands come from -c or from behind --, and with --console as they do without\n"
+    "it. SIGINT and SIGTERM end it.\n"
     "SIZE is a number of bytes, also with KiB, MiB or GiB behind it. TIME has a unit: 250ms, 10s.\n"
     "SEVERITIES are fatal, error, warning, debug, trace, or sums of 1, 2, 4, 8 and 16,\n"
     "separated by commas.\n"
     "\n"
-    "Exit status: 0 fine, 1 a command failed, 2 bad usage, 3 a source or the state could not be\n"
-    "loaded.";
+    "Exit status: 0 fine, 1 a command failed or --check found something, 2 bad usage, 3 a source "
+    "or\n"
+    "the state could not be loaded.";
 
+constexpr const char* commandMark = "--";
 constexpr const char* groupSetting = "group=";
 constexpr const char* orderSetting = "order=";
 constexpr const char* writableSetting = "writable";
@@ -71,14 +74,6 @@ std::vector<std::string> splitAtCommas(const std::string& text) {
 std::optional<std::string> valueOf(std::string_view setting, std::string_view name) {
     if (setting.substr(0, name.size()) != name) return std::nullopt;
     return std::string(setting.substr(name.size()));
-}
-
-std::optional<int> parseOrder(const std::string& text) {
-    int order = 0;
-    const char* end = text.data() + text.size();
-    const auto [parsedEnd, error] = std::from_chars(text.data(), end, order);
-    if (error != std::errc() || parsedEnd != end) return std::nullopt;
-    return order;
 }
 
 void applySetting(SourceRequest& request, const std::string& setting, const std::string& text) {
@@ -118,16 +113,33 @@ public:
             "Keep what is set in FILE, with its history; made when missing.");
         addFlag("--watch-files", true, "Read files again when they change.");
         addFlag("--no-watch-files", false, "Read files once; as without a terminal.");
+        app.add_flag("--check", checksFiles, "Tell what is wrong with the files, and end.");
         add(fileSizes, "--max-file-size", "SIZE",
             "The largest property file that is read; 256MiB unless given.");
         add(lines, "-c", "LINE", "Carry out LINE instead of reading commands; repeatable.");
+        app.add_flag_callback(
+            "--no-history", [this] { keepsHistory = false; },
+            "Keep what is typed at the prompt for this session only.");
         add(logs, "--log", "CHANNEL=SEVERITIES", "Write a log channel to standard error.");
+        app.add_option("--manual", manualForm)->group("");  // for whoever builds the program
         listenOptions.emplace(app);
         app.footer(footer);
     }
 
-    Options parse(const std::vector<std::string>& arguments) {
+    ProgramUsage usage() const {
+        ProgramUsage usage{description, footer};
+        for (const CLI::Option* option : app.get_options()) {
+            if (option->get_group().empty()) continue;
+            usage.options.push_back({namesOf(*option),
+                                     option->get_positional() ? "" : option->get_type_name(),
+                                     option->get_description()});
+        }
+        return usage;
+    }
+
+    Options parse(std::vector<std::string> arguments) {
         Options options;
+        options.command = takeCommand(arguments);
         try {
             std::vector<std::string> reversed;
             std::transform(arguments.rbegin(), arguments.rend(), std::back_inserter(reversed),
@@ -148,12 +160,20 @@ public:
         for (const auto& text : assignments.texts) {
             options.assignments.push_back(parseAssignment(unguarded(text)));
         }
+        if (!options.lines.empty() && !options.command.empty()) {
+            throw UsageError("-c LINE and -- COMMAND can't both be carried out (see --help)");
+        }
         if (!states.texts.empty()) options.statePath = unguarded(states.texts.back());
         options.watchesFiles = watchesFiles;
+        options.checksFiles = checksFiles;
+        options.manualForm = manualForm;
+        options.keepsHistory = keepsHistory;
         collectSources(options);
         options.serving = listenOptions->request();
-        if (options.serving)
+        if (options.serving) {
             options.serving->server.maxPropertyFileBytes = options.limits.fileBytes;
+        }
+        if (checksFiles) requireFilesOnly(options);
         return options;
     }
 
@@ -166,6 +186,34 @@ private:
     void add(Repeatable& added, const char* name, const char* value, const char* help) {
         added.option = app.add_option(name, added.texts, help);
         added.option->allow_extra_args(added.option->get_positional())->type_name(value);
+    }
+
+    // What the check of files would leave out without a word.
+    static void requireFilesOnly(const Options& options) {
+        if (options.givesCommands() || options.serving) {
+            throw UsageError("--check goes without -c LINE, -- COMMAND and --listen (see --help)");
+        }
+        const bool hasFile = std::any_of(options.sources.begin(), options.sources.end(),
+                                         [](const auto& source) { return source.isFile(); });
+        if (!hasFile) throw UsageError("--check: a FILE is needed");
+    }
+
+    static std::vector<std::string> namesOf(const CLI::Option& option) {
+        if (option.get_positional()) return {option.get_name(true)};
+        std::vector<std::string> names;
+        for (const auto& name : option.get_snames()) names.push_back('-' + name);
+        for (const auto& name : option.get_lnames()) names.push_back("--" + name);
+        return names;
+    }
+
+    // Takes what stands behind "--" away, which no option's value can be.
+    static std::vector<std::string> takeCommand(std::vector<std::string>& arguments) {
+        const auto mark = std::find(arguments.begin(), arguments.end(), commandMark);
+        if (mark == arguments.end()) return {};
+        std::vector<std::string> command(mark + 1, arguments.end());
+        if (command.empty()) throw UsageError("-- needs a COMMAND (see --help)");
+        arguments.erase(mark, arguments.end());
+        return command;
     }
 
     // Of several the last one counts.
@@ -199,6 +247,9 @@ private:
     Repeatable assignments;
     Repeatable states;
     std::optional<bool> watchesFiles;
+    bool checksFiles = false;
+    std::string manualForm;
+    bool keepsHistory = true;
     Repeatable fileSizes;
     Repeatable lines;
     Repeatable logs;
@@ -209,6 +260,10 @@ private:
 
 Options parseOptions(const std::vector<std::string>& arguments) {
     return Parser().parse(arguments);
+}
+
+ProgramUsage programUsage() {
+    return Parser().usage();
 }
 
 SourceRequest parseSource(const std::string& text) {

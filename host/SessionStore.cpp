@@ -13,7 +13,7 @@ using configuration::ConfigurationValue;
 
 void SessionStore::keepStateIn(std::shared_ptr<StateLayer> layer) {
     removeSource("override").get();
-    addSource("state", "", 0, false, layer->source()).get();
+    addSource(stateSource, "", 0, false, layer->source()).get();
     stateLayer = std::move(layer);
 }
 

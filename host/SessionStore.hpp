@@ -17,6 +17,9 @@ namespace velkor::host {
 /// `acknowledge`.
 class SessionStore final : public configuration::ConfigurationImpl {
 public:
+    /// The name of the source of the layer that lasts.
+    static constexpr const char* stateSource = "state";
+
     explicit SessionStore(const SourceLimits& sourceLimits) : limits(sourceLimits) {}
 
     /// Lets `layer`, which is not null, take the writes from now on, as the source "state" in the
@@ -25,6 +28,9 @@ public:
 
     /// The layer that lasts; null when there is none.
     StateLayer* state() const noexcept { return stateLayer.get(); }
+
+    /// What the reading of a file may cost.
+    const SourceLimits& sourceLimits() const noexcept { return limits; }
 
     /// As in the library; throws `Interrupted` once Ctrl-C was pressed, on the console's thread.
     Future<configuration::ConfigurationValue> get(const std::string& key) override;

@@ -1,5 +1,6 @@
 #include <fcntl.h>
 #include <langinfo.h>
+#include <malloc.h>
 #include <unistd.h>
 
 #include <clocale>
@@ -30,6 +31,14 @@ void holdPlacesOfStandardStreams() {
     }
 }
 
+// What the loading of a large file has used for a while is joined as it is given back, rather than
+// all at once by the next command that needs a large block: that took a second of a million keys.
+void giveMemoryBackAtOnce() {
+#ifdef __GLIBC__
+    ::mallopt(M_MXFAST, 0);
+#endif
+}
+
 }  // namespace
 
 int main(int argc, char** argv) {
@@ -38,6 +47,7 @@ int main(int argc, char** argv) {
     std::signal(SIGPIPE, SIG_IGN);
     std::ios::sync_with_stdio(false);
     useUtf8();
+    giveMemoryBackAtOnce();
     try {
         const std::vector<std::string> arguments(argv + (argc > 0 ? 1 : 0), argv + argc);
         return static_cast<int>(velkor::host::runProgram(arguments));

@@ -1,10 +1,11 @@
 #include "configuration/detail/ChangeList.hpp"
 
 #include <algorithm>
-#include <iostream>
 #include <list>
 #include <string_view>
 #include <utility>
+
+#include "configuration/detail/SubscriberErrors.hpp"
 
 namespace velkor::configuration::detail {
 
@@ -31,14 +32,6 @@ std::exception_ptr keepIn(ChangePublisher& publisher, std::list<OptionChange>& c
     }
 }
 
-void reportSubscriberError(const std::string& prefix) noexcept {
-    try {
-        std::cerr << "Error in configuration change subscriber: " + prefix + '\n' << std::flush;
-    } catch (...) {
-        return;  // there is nowhere left to report to
-    }
-}
-
 }  // namespace
 
 void ChangeList::Due::serve() {
@@ -50,7 +43,7 @@ void ChangeList::Due::serve() {
                 stream.publisher->deliver();
             }
         } catch (...) {
-            reportSubscriberError(stream.prefix);
+            reportSubscriberError("change", stream.prefix);
         }
     }
     streams.clear();

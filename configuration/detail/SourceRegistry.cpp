@@ -1,8 +1,10 @@
 #include "configuration/detail/SourceRegistry.hpp"
 
 #include <algorithm>
+#include <list>
 #include <utility>
 
+#include "configuration/detail/KeyPage.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
 #include "configuration/sources/TableSource.hpp"
 
@@ -138,6 +140,24 @@ std::set<std::string> SourceRegistry::keys() const {
         }
     }
     return all;
+}
+
+std::vector<std::string> SourceRegistry::keysFrom(const std::string& first,
+                                                  std::size_t most) const {
+    const auto layers = current;
+    KeyPage page(first, most);
+    std::list<std::set<std::string>> answers;  // the page refers to them
+    for (const auto& entry : *layers) {
+        if (entry->texts != nullptr) {
+            page.addAll(entry->group, *entry->texts);
+        } else if (entry->table != nullptr) {
+            entry->table->forEachKey([&](const auto& key) { page.add(entry->group, key); });
+        } else {
+            answers.push_back(entry->source->keys());
+            for (const auto& key : answers.back()) page.add(entry->group, key);
+        }
+    }
+    return page.take();
 }
 
 void SourceRegistry::replace(SourceList changed) {

@@ -110,6 +110,10 @@ public:
     /// All keys of all sources, with their groups.
     std::set<std::string> keys() const;
 
+    /// The `most` smallest keys of all sources that are not less than `first`, with their groups;
+    /// fewer where several sources hold the same one, and none only where there are none.
+    std::vector<std::string> keysFrom(const std::string& first, std::size_t most) const;
+
 private:
     static Layer nextHolder(const SourcePtr* from, const SourcePtr* end, const std::string& key,
                             KeyBuffer& buffer);

@@ -1,26 +1,16 @@
 #include "configuration/detail/WatchList.hpp"
 
 #include <algorithm>
-#include <iostream>
 #include <iterator>
 #include <utility>
 
 #include "configuration/Loggers.hpp"
 #include "configuration/detail/Lookup.hpp"
+#include "configuration/detail/SubscriberErrors.hpp"
 
 namespace velkor::configuration::detail {
 
 namespace {
-
-void reportSubscriberError(const std::string& key) noexcept {
-    try {
-        std::cerr << "Error in configuration value subscriber: " + key + '\n' << std::flush;
-    } catch (...) {
-        // A broken standard error must not keep the other watchers from being served, and there is
-        // nowhere left to report to.
-        return;
-    }
-}
 
 void tell(const WatchList::Publishers& watchers, const std::string& key,
           const ConfigurationValue& value) {
@@ -29,7 +19,7 @@ void tell(const WatchList::Publishers& watchers, const std::string& key,
             storeLogger.write(common::debug, "notifying watcher: ", key);
             publisher->publish(value);
         } catch (...) {
-            reportSubscriberError(key);
+            reportSubscriberError("value", key);
         }
     }
 }

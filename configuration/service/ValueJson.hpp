@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "configuration/ConfigurationValue.hpp"
+#include "framework/common/Export.hpp"
 
 /// How content looks in JSON, in both directions. All functions are stateless.
 namespace velkor::configuration {
@@ -23,7 +24,7 @@ Poco::Dynamic::Var toJson(unsigned int content);
 Poco::Dynamic::Var toJson(double content);
 Poco::Dynamic::Var toJson(const std::u16string& content);
 Poco::Dynamic::Var toJson(const std::string& content);
-Poco::Dynamic::Var toJson(const ConfigurationValue& content);
+VELKOR_EXPORT Poco::Dynamic::Var toJson(const ConfigurationValue& content);
 
 /// Reads `json` into `content`, which holds the default (an empty one, if it is a text) and keeps
 /// it when `json` is empty or can't be converted. Conversion follows `Poco::Dynamic::Var`, with two
@@ -38,7 +39,7 @@ void readJson(const Poco::Dynamic::Var& json, std::u16string& content);
 void readJson(const Poco::Dynamic::Var& json, std::string& content);
 
 /// Reads a value object. Anything else, and an object of no known type, is an empty narrow text.
-void readJson(const Poco::Dynamic::Var& json, ConfigurationValue& content);
+VELKOR_EXPORT void readJson(const Poco::Dynamic::Var& json, ConfigurationValue& content);
 
 /// The object or array that `json` holds; null when it holds none. Lives as long as `json`.
 const Poco::JSON::Object* asObject(const Poco::Dynamic::Var& json);

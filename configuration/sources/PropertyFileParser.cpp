@@ -58,11 +58,14 @@ std::uint32_t hexadecimalPrefix(std::string_view digits) {
 
 }  // namespace
 
-PropertyFileParser::PropertyFileParser(std::string content) : text(std::move(content)) {}
+PropertyFileParser::PropertyFileParser(std::string content, Records kept)
+    : text(std::move(content)), records(kept) {}
 
 TextTable PropertyFileParser::parse() {
-    State state = State::lineStart;
-    while (!atEnd()) state = step(state);
+    return parse([](const Step&) {});
+}
+
+TextTable PropertyFileParser::finish(State state) {
     // A last line needs no line break, but it does need a key and a separator.
     const bool hasKey = current.key != current.value;
     if (state == State::value && hasKey) storeProperty("Parsed final property: ");
@@ -188,9 +191,11 @@ void PropertyFileParser::takeUnicodeEscape() {
 void PropertyFileParser::storeProperty(std::string_view logPrefix) {
     const std::string_view all = text;
     properties.push_back(current);
-    propertyFileLogger.write(common::trace, logPrefix,
-                             all.substr(current.key, current.value - current.key), " = ",
-                             all.substr(current.value, taken - current.value));
+    if (records == Records::written) {
+        propertyFileLogger.write(common::trace, logPrefix,
+                                 all.substr(current.key, current.value - current.key), " = ",
+                                 all.substr(current.value, taken - current.value));
+    }
     current = {taken, taken};
 }
 

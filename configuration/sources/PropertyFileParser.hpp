@@ -20,13 +20,7 @@ namespace velkor::configuration {
 /// more. A key ends at a separator and not at a line break. A later line with the same key wins.
 class PropertyFileParser {
 public:
-    /// Takes over `content`, the whole file.
-    explicit PropertyFileParser(std::string content);
-
-    /// To be called once.
-    TextTable parse();
-
-private:
+    /// What the next byte belongs to.
     enum class State {
         lineStart,
         key,
@@ -37,6 +31,38 @@ private:
         continuationIndent
     };
 
+    /// One step through the file: the bytes from `begin` to `end` were read in the state `from`,
+    /// and led to `to`.
+    struct Step {
+        State from;
+        State to;
+        std::size_t begin;
+        std::size_t end;
+    };
+
+    /// Whether each property is written to the log.
+    enum class Records { written, omitted };
+
+    /// Takes over `content`, the whole file.
+    explicit PropertyFileParser(std::string content, Records kept = Records::written);
+
+    /// To be called once, or the other one.
+    TextTable parse();
+
+    /// As above, and calls `observe` with each step.
+    template <class Observe>
+    TextTable parse(Observe&& observe) {
+        State state = State::lineStart;
+        while (!atEnd()) {
+            const std::size_t begin = position;
+            const State next = step(state);
+            observe(Step{state, next, begin, position});
+            state = next;
+        }
+        return finish(state);
+    }
+
+private:
     // Each handles the bytes from `position` on, at least one of which is left, and says what
     // comes next.
     State onLineStart();
@@ -47,6 +73,7 @@ private:
     State onValueEscape();
     State onContinuationIndent();
     State step(State state);
+    TextTable finish(State state);
 
     bool atEnd() const { return position == text.size(); }
     char next() const { return text[position]; }
@@ -62,6 +89,7 @@ private:
     std::size_t taken = 0;                 // the size of what is gathered
     TextTable::Property current = {0, 0};  // where that of this line begins
     std::vector<TextTable::Property> properties;
+    const Records records;
 };
 
 }  // namespace velkor::configuration

@@ -44,6 +44,17 @@ public:
     /// All keys, sorted byte by byte.
     std::set<std::string> keys() const;
 
+    /// How many properties there are, those that don't count included.
+    std::size_t size() const noexcept { return properties.size() - 1; }
+
+    /// The key of the property with that number, from 0 on in the order of their places.
+    std::string_view key(std::size_t number) const noexcept { return keyOf(properties[number]); }
+
+    /// The number of the property that counts for the key of that one.
+    std::size_t counting(std::size_t number) const noexcept {
+        return static_cast<std::size_t>(find(key(number)) - properties.data());
+    }
+
 private:
     // The number of a property, from 1 on, and above it the upper bits of the hash of its key.
     using Slot = std::uint64_t;

@@ -56,6 +56,12 @@ public:
         return sorted;
     }
 
+    /// Calls `visit` with each key, in no order; it must not change the table.
+    template <class Visit>
+    void forEachKey(Visit&& visit) const {
+        for (const auto& entry : entries) visit(entry.first);
+    }
+
 private:
     ValueMap entries;
 };

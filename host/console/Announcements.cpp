@@ -27,7 +27,7 @@ Announcements::~Announcements() {
 void Announcements::announce(const std::string& text) {
     const common::MutexLock lock(mutex);
     if (output == nullptr) return;
-    if (!editing) return output->answer(text);
+    if (!editing) return output->answer(text, paintOption);
     pending.push_back(text);
     ::eventfd_write(event, 1);
 }
@@ -57,7 +57,7 @@ void Announcements::show() {
 void Announcements::showPending() {
     eventfd_t count = 0;
     ::eventfd_read(event, &count);
-    for (const auto& text : pending) output->answer(text);
+    for (const auto& text : pending) output->answer(text, paintOption);
     pending.clear();
 }
 

@@ -14,7 +14,7 @@ namespace velkor::host {
 /// Thread-safe. Announcing waits for the output but for no editor.
 class Announcements {
 public:
-    /// Shows texts as answers of `output`, which must live until `close`.
+    /// Shows texts, lines "KEY = VALUE", as answers of `output`, which must live until `close`.
     explicit Announcements(Output& output);
     ~Announcements();
 

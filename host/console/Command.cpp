@@ -16,6 +16,15 @@ std::string counted(unsigned count) {
     return std::to_string(count) + (count == 1 ? " argument" : " arguments");
 }
 
+/// An answer that nobody sees before it is complete.
+class CollectedAnswer final : public CommandOutput {
+public:
+    void line(std::string_view added) override { text.append(added) += '\n'; }
+    void note(std::string_view) override {}
+
+    std::string text;
+};
+
 }  // namespace
 
 std::string_view Command::shortName() const noexcept {
@@ -27,26 +36,47 @@ std::string Command::argumentText() const {
     return traits.arguments.empty() ? limits() : traits.arguments;
 }
 
+CommandUsage Command::usage() const {
+    const unsigned most = descriptor.maximumArguments;
+    const bool isUnknown = traits.arguments.empty() && most > 0 && most != unlimited;
+    return CommandUsage(isUnknown ? "KEY" : std::string_view(traits.arguments));
+}
+
 std::vector<std::string> Command::readArguments(CommandLine& line) const {
     std::vector<std::string> arguments;
     while (!traits.takesRawRest || arguments.size() + 1 < descriptor.maximumArguments) {
         auto word = line.nextWord();
         if (!word) return arguments;
-        arguments.push_back(*std::move(word));
+        arguments.push_back(traits.takesWordsAsTyped ? std::string(line.typedWord())
+                                                     : *std::move(word));
     }
     const std::string_view rest = line.takeRest();
     if (!rest.empty()) arguments.emplace_back(rest);
     return arguments;
 }
 
-std::string Command::run(std::vector<std::string>&& arguments) const {
+std::vector<std::string> Command::givenArguments(std::vector<std::string> words) const {
+    if (!traits.takesWordsAsTyped) return words;
+    for (auto& word : words) word = quotedWord(word);
+    return words;
+}
+
+std::string Command::run(std::vector<std::string>&& arguments, CommandOutput& output) const {
     const std::size_t count = arguments.size();
     const bool tooMany =
         descriptor.maximumArguments != unlimited && count > descriptor.maximumArguments;
     if (count < descriptor.minimumArguments || tooMany) {
         throw CommandError(name() + " takes " + limits() + "; given: " + std::to_string(count));
     }
-    return descriptor.handler(std::move(arguments));
+    if (traits.stream == nullptr) return descriptor.handler(std::move(arguments));
+    traits.stream(std::move(arguments), output);
+    return "";
+}
+
+std::string Command::run(std::vector<std::string>&& arguments) const {
+    CollectedAnswer collected;
+    const std::string answer = run(std::move(arguments), collected);
+    return collected.text + answer;
 }
 
 std::string Command::limits() const {

@@ -7,6 +7,7 @@ namespace velkor::host {
 namespace {
 
 constexpr std::string_view blanks = " \t\r\n\v\f";
+constexpr std::string_view quotes = "'\"\\";
 constexpr std::string_view wordEnds = " \t\r\n\v\f'\"\\";
 
 }  // namespace
@@ -28,6 +29,10 @@ std::string_view CommandLine::takeRest() {
     position = text.size();
     const std::size_t end = text.find_last_not_of(blanks) + 1;
     return end > start ? text.substr(start, end - start) : std::string_view();
+}
+
+bool CommandLine::wordIsQuoted() const noexcept {
+    return typedWord().find_first_of(quotes) != std::string_view::npos;
 }
 
 void CommandLine::skipBlanks() noexcept {

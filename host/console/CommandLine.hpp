@@ -38,6 +38,12 @@ public:
     /// Where the word that `nextWord` read last, or failed to read, begins.
     std::size_t wordStart() const noexcept { return start; }
 
+    /// The word that `nextWord` read last as it was typed, with its quotes and backslashes.
+    std::string_view typedWord() const noexcept { return text.substr(start, position - start); }
+
+    /// Whether a quote or a backslash is in the word that `nextWord` read last.
+    bool wordIsQuoted() const noexcept;
+
     /// Whether nothing at all, not even a blank, follows what has been read.
     bool atEnd() const noexcept { return position == text.size(); }
 

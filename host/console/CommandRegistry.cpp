@@ -20,12 +20,6 @@ bool isWellFormed(const CommandDescriptor& command) {
            command.minimumArguments <= command.maximumArguments;
 }
 
-std::string joined(const std::vector<std::string>& names) {
-    std::string text;
-    for (const auto& name : names) text += (text.empty() ? "" : ", ") + name;
-    return text;
-}
-
 auto isCalled(const std::string& name) {
     return [&name](const CommandRegistry::CommandPtr& command) { return command->name() == name; };
 }
@@ -33,15 +27,15 @@ auto isCalled(const std::string& name) {
 std::string unknownCommandText(const std::string& name, const std::vector<std::string>& known) {
     const auto near = nearestNames(name, known);
     return "Unknown command: " + abbreviated(name, mostShownBytes) +
-           (near.empty() ? "" : " (did you mean: " + joined(near) + "?)");
+           (near.empty() ? "" : " (did you mean: " + joinedNames(near) + "?)");
 }
 
 }  // namespace
 
-Future<bool> CommandRegistry::registerCommand(CommandDescriptor command) {
+Future<bool> CommandRegistry::registerCommand(CommandDescriptor command, CommandTraits traits) {
     if (!isWellFormed(command)) return makeReadyFuture(false);
     auto accepted = makeReadyFuture(true);  // beforehand, since making it may fail
-    const bool isNew = add(std::make_shared<const Command>(std::move(command), CommandTraits()));
+    const bool isNew = add(std::make_shared<const Command>(std::move(command), std::move(traits)));
     return isNew ? std::move(accepted) : makeReadyFuture(false);
 }
 
@@ -82,7 +76,7 @@ CommandRegistry::CommandPtr CommandRegistry::find(const std::string& name) const
     std::vector<std::string> names;
     names.reserve(candidates.size());
     for (const auto& command : candidates) names.push_back(command->name());
-    throw CommandError("Ambiguous command: " + name + " (may be: " + joined(names) + ")");
+    throw CommandError("Ambiguous command: " + name + " (may be: " + joinedNames(names) + ")");
 }
 
 std::vector<CommandRegistry::CommandPtr> CommandRegistry::commands() const {

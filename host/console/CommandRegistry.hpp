@@ -2,6 +2,7 @@
 
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "framework/administration/Administration.hpp"
@@ -22,7 +23,13 @@ public:
 
     /// Gives false, and changes nothing, when the name is empty or taken, the handler is empty or
     /// the limits contradict each other.
-    Future<bool> registerCommand(administration::CommandDescriptor command) override;
+    Future<bool> registerCommand(administration::CommandDescriptor command) override {
+        return registerCommand(std::move(command), CommandTraits());
+    }
+
+    /// As above, with what the console is to know besides.
+    Future<bool> registerCommand(administration::CommandDescriptor command, CommandTraits traits)
+        VELKOR_EXCLUDES(mutex);
 
     Future<bool> unregisterCommand(const std::string& name) override;
 

@@ -32,6 +32,16 @@ TypedLine split(std::string_view line) {
     return typed;
 }
 
+// The text of a word that is typed so far; where it is not finished, what is typed.
+std::string meaningOf(std::string_view lastWord) {
+    CommandLine words(lastWord);
+    try {
+        return words.nextWord().value_or("");
+    } catch (const CommandLineError&) {
+        return std::string(lastWord);
+    }
+}
+
 bool begins(std::string_view beginning, std::string_view text) {
     return text.substr(0, beginning.size()) == beginning;
 }
@@ -54,29 +64,53 @@ std::string Completion::commonAddition() const {
     return common.substr(typedBytes, length - typedBytes);
 }
 
-Completer::Completer(std::shared_ptr<const CommandRegistry> commandRegistry, Words currentKeys)
-    : registry(std::move(commandRegistry)), keys(std::move(currentKeys)) {}
+Completer::Completer(std::shared_ptr<const CommandRegistry> commandRegistry,
+                     ArgumentWords wordsOfArguments)
+    : registry(std::move(commandRegistry)), argumentWords(std::move(wordsOfArguments)) {}
 
 Completion Completer::complete(std::string_view line) const {
     const TypedLine typed = split(line);
     Completion completion{typed.lastWord.size()};
-    for (const auto& candidate : candidates(typed.wordsBefore)) {
+    for (const auto& candidate : candidates(typed.wordsBefore, meaningOf(typed.lastWord))) {
         std::string word = quotedWord(candidate);
         if (begins(typed.lastWord, word)) completion.words.push_back(std::move(word));
     }
     return completion;
 }
 
-std::vector<std::string> Completer::candidates(const std::vector<std::string>& wordsBefore) const {
+std::vector<std::string> Completer::candidates(const std::vector<std::string>& wordsBefore,
+                                               const std::string& typed) const {
     if (wordsBefore.empty()) return registry->names();
-    if (wordsBefore.size() > 1) return {};
     try {
-        const auto command = registry->find(wordsBefore.front());
-        if (!command->takesArguments()) return {};
-        return command->suggestions() ? command->suggestions()() : keys();
+        return argumentCandidates(*registry->find(wordsBefore.front()), wordsBefore, typed);
     } catch (const CommandError&) {
         return {};
     }
+}
+
+std::vector<std::string> Completer::argumentCandidates(const Command& command,
+                                                       const std::vector<std::string>& wordsBefore,
+                                                       const std::string& typed) const {
+    const CommandUsage usage = command.usage();
+    std::size_t index = 0;
+    for (auto word = wordsBefore.begin() + 1; word != wordsBefore.end(); ++word) {
+        const auto* const option = usage.find(*word);
+        if (option == nullptr) {
+            ++index;
+        } else if (!option->valueName.empty() && ++word == wordsBefore.end()) {
+            return argumentWords(option->valueName, typed);
+        }
+    }
+    std::vector<std::string> words;
+    if (index == 0 && command.suggestions()) {
+        words = command.suggestions()();
+    } else {
+        words = argumentWords(usage.argumentName(index), typed);
+    }
+    if (begins("-", typed)) {
+        for (const auto& option : usage.options) words.push_back(option.name);
+    }
+    return words;
 }
 
 }  // namespace velkor::host

@@ -20,24 +20,31 @@ struct Completion {
     std::string commonAddition() const;
 };
 
-/// Completes command names (first word, full and short), and the first argument of a command: keys,
-/// or what the command suggests itself.
+/// Completes command names (first word, full and short), and what follows them as the command's
+/// usage says: options, where a dash was typed, their values, and arguments, the first of which the
+/// command may suggest itself.
 class Completer {
 public:
-    using Words = std::function<std::vector<std::string>()>;
+    /// What an argument with the given name may be that begins with the given text, and perhaps
+    /// more.
+    using ArgumentWords =
+        std::function<std::vector<std::string>(std::string_view name, const std::string& typed)>;
 
-    /// `keys` gives the keys that there are now.
-    Completer(std::shared_ptr<const CommandRegistry> registry, Words keys);
+    Completer(std::shared_ptr<const CommandRegistry> registry, ArgumentWords argumentWords);
 
     /// How `line`, all that stands before the cursor, may go on. No words when nothing fits, and
     /// inside quotes.
     Completion complete(std::string_view line) const;
 
 private:
-    std::vector<std::string> candidates(const std::vector<std::string>& wordsBefore) const;
+    std::vector<std::string> candidates(const std::vector<std::string>& wordsBefore,
+                                        const std::string& typed) const;
+    std::vector<std::string> argumentCandidates(const Command& command,
+                                                const std::vector<std::string>& wordsBefore,
+                                                const std::string& typed) const;
 
     std::shared_ptr<const CommandRegistry> registry;
-    Words keys;
+    ArgumentWords argumentWords;
 };
 
 }  // namespace velkor::host

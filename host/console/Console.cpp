@@ -5,6 +5,7 @@
 
 #include "host/console/CommandLine.hpp"
 #include "host/console/Interruption.hpp"
+#include "host/console/StreamedAnswer.hpp"
 
 namespace velkor::host {
 
@@ -53,29 +54,57 @@ bool Console::run(LineSource& lines) {
     return allFine;
 }
 
+bool Console::run(const std::vector<std::string>& words) {
+    bool isFine = true;
+    try {
+        const auto command = registry->find(words.at(0));
+        carryOut(*command, command->givenArguments({words.begin() + 1, words.end()}));
+    } catch (const std::exception& error) {
+        isFine = false;
+        remarks.clear();
+        output.message(error.what());
+    }
+    showRemarks("");
+    return isFine;
+}
+
 bool Console::runNext(LineSource& lines) {
     const auto line = lines.nextLine();
     Interruption::take();  // what came before the command is not about it
     if (line) execute(*line);
+    showRemarks(lines.position());
     return line.has_value();
 }
 
 void Console::execute(const std::string& line) {
+    remarks.clear();
     CommandLine words(line);
     const auto name = words.nextWord();
     if (!name || isComment(line, words)) return;
     const auto command = registry->find(*name);
-    auto arguments = command->readArguments(words);
+    carryOut(*command, command->readArguments(words));
+}
+
+void Console::carryOut(const Command& command, std::vector<std::string>&& arguments) {
+    const Paint paint = paintOf(command.name());
+    StreamedAnswer streamed(output, paint);
     std::string answer;
     try {
-        answer = command->run(std::move(arguments));
+        answer = command.run(std::move(arguments), streamed);
         acknowledge();
     } catch (const Interrupted&) {
         return;
     } catch (...) {
-        throw CommandError(failureText(*command));
+        streamed.flush();
+        throw CommandError(failureText(command));
     }
-    output.answer(answer);
+    streamed.flush();
+    output.answer(answer, paint);
+}
+
+void Console::showRemarks(const std::string& position) {
+    for (const auto& remark : remarks) output.message(position + remark);
+    remarks.clear();
 }
 
 }  // namespace velkor::host

@@ -3,6 +3,8 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <utility>
+#include <vector>
 
 #include "host/console/CommandRegistry.hpp"
 #include "host/console/LineSource.hpp"
@@ -29,16 +31,27 @@ public:
     /// Gives whether every line could be carried out.
     bool run(LineSource& lines);
 
+    /// Carries out one command, the words of which are its name and its arguments. Gives whether it
+    /// could be carried out.
+    bool run(const std::vector<std::string>& words);
+
+    /// Has one message shown beside the answer of the command that is being carried out, unless it
+    /// fails. For a handler to call, on its thread.
+    void remark(std::string text) { remarks.push_back(std::move(text)); }
+
     /// Ends `run` after the line that is being carried out. For a handler to call.
     void quit() noexcept { quitting = true; }
 
 private:
     bool runNext(LineSource& lines);
     void execute(const std::string& line);
+    void carryOut(const Command& command, std::vector<std::string>&& arguments);
+    void showRemarks(const std::string& position);
 
     std::shared_ptr<const CommandRegistry> registry;
     Output& output;
     const std::function<void()> acknowledge;
+    std::vector<std::string> remarks;  ///< Of the command that was carried out last.
     bool quitting = false;
 };
 

@@ -4,10 +4,14 @@
 #include <iterator>
 #include <utility>
 
+#include "host/console/OptionWords.hpp"
+#include "host/console/PutCommand.hpp"
 #include "host/console/SendCommand.hpp"
+#include "host/console/SourceCommands.hpp"
 #include "host/console/StateCommands.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
+#include "host/look/JsonAnswers.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -22,7 +26,19 @@ struct Context {
     std::weak_ptr<CommandRegistry> registry;
 };
 
-std::string showSources(const Context& context, const Arguments&) {
+constexpr const char* jsonOption = "--json";
+constexpr const char* rawOption = "--raw";
+
+constexpr const char* sourcesUsage = "[--json]";
+constexpr const char* explainUsage = "KEY [--json]";
+constexpr const char* watchUsage = "KEY [--json]";
+
+std::string showSources(const Context& context, const Arguments& arguments) {
+    const OptionWords given("sources", sourcesUsage, 0, arguments);
+    if (given.has(jsonOption)) {
+        return sourcesJson(context.services.store->describeSources().get(),
+                           context.services.problemOf);
+    }
     std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS", ""}};
     for (const auto& source : context.services.store->describeSources().get()) {
         rows.push_back({source.name, source.group.empty() ? "-" : source.group,
@@ -34,9 +50,12 @@ std::string showSources(const Context& context, const Arguments&) {
 }
 
 std::string explain(const Context& context, const Arguments& arguments) {
-    const auto options = context.services.store->explain(arguments.at(0)).get();
-    if (options.empty()) return "No configuration option with key: " + arguments.at(0);
-    const bool isSecret = settings::secretKeys(context.services.store).count(arguments.at(0)) != 0;
+    const OptionWords given("explain", explainUsage, 1, arguments);
+    const std::string& key = given.words().front().text;
+    const auto options = context.services.store->explain(key).get();
+    const bool isSecret = settings::secretKeys(context.services.store).count(key) != 0;
+    if (given.has(jsonOption)) return layersJson(key, options, isSecret);
+    if (options.empty()) return "No configuration option with key: " + key;
     std::vector<std::vector<std::string>> rows;
     rows.reserve(options.size());
     for (const auto& option : options) {
@@ -47,8 +66,13 @@ std::string explain(const Context& context, const Arguments& arguments) {
 }
 
 std::string watch(const Context& context, const Arguments& arguments) {
-    if (context.services.watches->add(arguments.at(0))) return "";
-    throw CommandError("Watched already: " + arguments.at(0));
+    const OptionWords given("watch", watchUsage, 1, arguments);
+    const std::string& key = given.words().front().text;
+    auto& watches = *context.services.watches;
+    const bool isNew =
+        given.has(jsonOption) ? watches.add(key, context.services.showJson) : watches.add(key);
+    if (isNew) return "";
+    throw CommandError("Watched already: " + key);
 }
 
 std::string unwatch(const Context& context, const Arguments& arguments) {
@@ -62,6 +86,12 @@ std::string onStore(const Context& context, const Arguments& arguments) {
     return run(context.services.store, arguments);
 }
 
+/// A command on nothing but the session's sources.
+template <std::string (*run)(SessionSources&, const Arguments&)>
+std::string onSources(const Context& context, const Arguments& arguments) {
+    return run(*context.services.sources, arguments);
+}
+
 std::string helpFor(const Command& command) {
     std::string text = command.name() + ' ' + '(' + command.argumentText() + ")\n";
     if (command.shortName() != command.name()) {
@@ -70,13 +100,21 @@ std::string helpFor(const Command& command) {
     return text + command.description() + '\n';
 }
 
+// Options would make every row of the table as long as theirs: `help COMMAND` shows them.
+std::string withoutOptions(std::string argumentText) {
+    const std::size_t options = argumentText.find(" [--");
+    return options == std::string::npos ? argumentText
+                                        : argumentText.substr(0, options) + " [OPTIONS]";
+}
+
 std::string help(const Context& context, const Arguments& arguments) {
     const auto registry = context.registry.lock();
     if (!registry) return "";
     if (!arguments.empty()) return helpFor(*registry->find(arguments.at(0)));
     std::vector<std::vector<std::string>> rows;
     for (const auto& command : registry->commands()) {
-        rows.push_back({command->name(), command->argumentText(), command->description()});
+        rows.push_back(
+            {command->name(), withoutOptions(command->argumentText()), command->description()});
     }
     return formatTable(rows) + "A command may be called by the last word of its name.\n";
 }
@@ -86,8 +124,21 @@ std::string quit(const Context& context, const Arguments&) {
     return "";
 }
 
+/// The TYPE and JSON that follow --raw, which took the place of TYPE.
+Arguments behindRaw(const Arguments& arguments) {
+    if (arguments.size() == 1) throw CommandError("send --raw takes TYPE [JSON].");
+    CommandLine rest(arguments[1]);
+    Arguments typeAndJson{rest.nextWord().value_or("")};
+    const std::string_view json = rest.takeRest();
+    if (!json.empty()) typeAndJson.emplace_back(json);
+    return typeAndJson;
+}
+
 std::string send(const Context& context, const Arguments& arguments) {
-    return sendMessage(*context.services.dispatcher, arguments);
+    auto& dispatcher = *context.services.dispatcher;
+    if (arguments.at(0) != rawOption) return sendMessage(dispatcher, arguments);
+    const std::string reply = sendMessage(dispatcher, behindRaw(arguments));
+    return reply.substr(reply.find(' ') + 1);
 }
 
 std::vector<std::string> suggestCommands(const Context& context) {
@@ -103,6 +154,9 @@ std::vector<std::string> suggestRequests(const Context&) {
     return requestTypes();
 }
 
+// How the rest of a line becomes arguments.
+enum class Reading : std::uint8_t { words, wordsAsTyped, rawRest };
+
 struct HostCommand {
     const char* name;
     const char* argumentNames;
@@ -110,28 +164,36 @@ struct HostCommand {
     std::string (*run)(const Context&, const Arguments&);
     std::uint8_t minimumArguments;
     std::uint8_t maximumArguments;
-    bool takesRawRest = false;
+    Reading reading = Reading::words;
     std::vector<std::string> (*suggest)(const Context&) = nullptr;
 };
 
 constexpr HostCommand commands[] = {
-    {"sources", "", "List the sources in order of precedence.", showSources, 0, 0},
-    {"explain", "KEY", "Show every source that holds a key.", explain, 1, 1},
-    {"watch", "KEY", "Show the value of a key now and whenever it changes.", watch, 1, 1},
-    {"unwatch", "KEY", "Stop showing the values of a key.", unwatch, 1, 1},
-    {"put", "KEY VALUE [--for TIME]", "Set a value, with --for until the time is over.",
-     onStore<putValue>, 2, 4},
-    {"unset", "KEY", "Take back what was set for a key, and show what is effective then.",
-     onStore<unsetKey>, 1, 1},
-    {"history", "[KEY] [--limit N]", "Show what was set when and by whom, the newest first.",
-     onStore<showHistory>, 0, 3},
+    {"sources", sourcesUsage, "List the sources in order of precedence.", showSources, 0, 255,
+     Reading::wordsAsTyped},
+    {"load", loadUsage, "Add a property file as a source.", onSources<loadFile>, 0, 255,
+     Reading::wordsAsTyped},
+    {"unload", unloadUsage, "Remove a source.", onSources<unloadSource>, 1, 1},
+    {"explain", explainUsage, "Show every source that holds a key.", explain, 0, 255,
+     Reading::wordsAsTyped},
+    {"watch", watchUsage, "Show the value of a key now and whenever it changes.", watch, 0, 255,
+     Reading::wordsAsTyped},
+    {"unwatch", "WATCHED-KEY", "Stop showing the values of a key.", unwatch, 1, 1},
+    {"put", putUsage, "Set a value as it was typed, or of a type, also for a time.",
+     onStore<putValue>, 0, 255, Reading::wordsAsTyped},
+    {"unset", unsetUsage, "Take back what was set for a key, and show what is effective then.",
+     onStore<unsetKey>, 0, 255, Reading::wordsAsTyped},
+    {"history", historyUsage, "Show what was set when and by whom, the newest first.",
+     onStore<showHistory>, 0, 255, Reading::wordsAsTyped},
     {"undo", "[N]", "Take back change N of the history, or the newest one.", onStore<undoChange>, 0,
-     1, false, suggestNothing},
-    {"send", "TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2, true,
-     suggestRequests},
-    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, false,
+     1, Reading::words, suggestNothing},
+    {"send", "[--raw] TYPE [JSON]", "Send a message to the service and show its reply.", send, 1, 2,
+     Reading::rawRest, suggestRequests},
+    {"help", "[COMMAND]", "List the commands, or describe one.", help, 0, 1, Reading::words,
      suggestCommands},
+    {"?", "[COMMAND]", "The same as help.", help, 0, 1, Reading::words, suggestCommands},
     {"quit", "", "End the session.", quit, 0, 0},
+    {"exit", "", "The same as quit.", quit, 0, 0},
 };
 
 CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
@@ -139,7 +201,8 @@ CommandRegistry::CommandPtr makeCommand(const HostCommand& command,
     const auto handler = [run = command.run, context](Arguments&& arguments) {
         return run(*context, arguments);
     };
-    CommandTraits traits{command.argumentNames, command.takesRawRest};
+    CommandTraits traits{command.argumentNames, command.reading == Reading::rawRest};
+    traits.takesWordsAsTyped = command.reading == Reading::wordsAsTyped;
     if (command.suggest != nullptr) {
         traits.suggestions = [suggest = command.suggest, context] { return suggest(*context); };
     }

@@ -8,6 +8,7 @@
 #include "host/SessionStore.hpp"
 #include "host/console/CommandRegistration.hpp"
 #include "host/console/Watches.hpp"
+#include "host/sources/SessionSources.hpp"
 #include "messages/MessageDispatcher.hpp"
 
 namespace velkor::host {
@@ -22,21 +23,27 @@ struct HostServices {
     std::function<std::string(const std::string& name)> problemOf = [](const auto&) {
         return std::string();
     };
+    std::shared_ptr<SessionSources> sources{};
+    /// Shows a value that is watched as JSON.
+    Watches::Show showJson = [](const auto&, const auto&) {};
 };
 
 /// Keeps the host's own commands registered while it lives:
 ///
-/// - sources: a table of all sources in order of precedence, with what is the matter with them.
-/// - explain KEY: a table of the sources that hold KEY in order of precedence, the first of which
-///   is the effective one.
-/// - watch KEY, unwatch KEY: show the values of KEY as they change, and no longer.
-/// - put KEY VALUE [--for TIME], unset KEY, history [KEY] [--limit N], undo [N]: see
-///   StateCommands.hpp.
-/// - send TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`. JSON is the rest
-///   of the line as it was typed.
-/// - help [COMMAND], quit.
+/// - sources [--json]: a table of all sources in order of precedence, with what is the matter with
+///   them.
+/// - explain KEY [--json]: a table of the sources that hold KEY in order of precedence, the first
+///   of which is the effective one.
+/// - watch KEY [--json], unwatch KEY: show the values of KEY as they change, and no longer.
+/// - load, unload: see SourceCommands.hpp.
+/// - put: see PutCommand.hpp.
+/// - unset, history [KEY] [--limit N], undo [N]: see StateCommands.hpp.
+/// - send [--raw] TYPE [JSON]: delivers a message and shows the reply, see `sendMessage`; with
+///   --raw nothing but its JSON. JSON is the rest of the line as it was typed.
+/// - help [COMMAND], quit; also as ? and exit.
 ///
-/// Values of secret keys, see `settings::secretKeys`, are shown as •••.
+/// With --json the answer is JSON, see JsonAnswers.hpp. Values of secret keys, see
+/// `settings::secretKeys`, are shown as •••.
 ///
 /// Handlers share the services, so they may run after this object is gone. Called with too few
 /// arguments they throw `std::out_of_range`.

@@ -43,9 +43,10 @@ const char* prompt(EditLine*) {
 /// The editing library's objects, and the functions that it calls back.
 class LineEditor::Session {
 public:
-    Session(Complete completeLine, Announcements& shownAnnouncements)
+    Session(Complete completeLine, Announcements& shownAnnouncements, Memory&& memory)
         : complete(std::move(completeLine)),
           announcements(shownAnnouncements),
+          remember(std::move(memory.remember)),
           lines(history_init()),
           editor(el_init("velkor-config", stdin, stdout, stderr)) {
         if (!lines || !editor) {
@@ -54,6 +55,7 @@ public:
         HistEvent event;
         history(lines.get(), &event, H_SETSIZE, historySize);
         history(lines.get(), &event, H_SETUNIQUE, 1);
+        for (const auto& line : memory.earlierLines) enter(line + '\n');
         el_set(editor.get(), EL_CLIENTDATA, this);
         el_set(editor.get(), EL_PROMPT, prompt);
         el_set(editor.get(), EL_EDITOR, "emacs");
@@ -113,10 +115,17 @@ private:
         el_set(editor.get(), EL_BIND, "^C", "velkor-cancel", nullptr);
     }
 
-    std::string remembered(std::string line) {
+    // The editing library keeps lines with their ends.
+    void enter(const std::string& line) {
         HistEvent event;
-        if (line != "\n") history(lines.get(), &event, H_ENTER, line.c_str());
+        history(lines.get(), &event, H_ENTER, line.c_str());
+    }
+
+    std::string remembered(std::string line) {
+        const bool isKept = line != "\n" && line.front() != ' ' && line.front() != '\t';
+        if (isKept) enter(line);
         if (line.back() == '\n') line.pop_back();
+        if (isKept && remember) remember(line);
         return line;
     }
 
@@ -185,7 +194,8 @@ private:
         const Completion completion = complete(std::string(line->buffer, line->cursor));
         if (completion.words.empty()) return CC_REFRESH_BEEP;
         std::string addition = completion.commonAddition();
-        if (completion.words.size() == 1) addition += ' ';
+        const bool isWhole = completion.words.size() == 1 && completion.words[0].back() != '/';
+        if (isWhole) addition += ' ';
         if (addition.empty()) return show(completion.words);
         return el_insertstr(editor.get(), addition.c_str()) == 0 ? CC_REFRESH : CC_ERROR;
     }
@@ -204,14 +214,15 @@ private:
 
     const Complete complete;
     Announcements& announcements;
+    const std::function<void(const std::string&)> remember;
     const std::unique_ptr<History, HistoryDeleter> lines;
     const std::unique_ptr<EditLine, EditLineDeleter> editor;
     bool cancelled = false;
     const Interruption interruption;
 };
 
-LineEditor::LineEditor(Complete complete, Announcements& announcements)
-    : session(std::make_unique<Session>(std::move(complete), announcements)) {}
+LineEditor::LineEditor(Complete complete, Announcements& announcements, Memory memory)
+    : session(std::make_unique<Session>(std::move(complete), announcements, std::move(memory))) {}
 
 LineEditor::~LineEditor() = default;
 

@@ -3,6 +3,7 @@
 #include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "host/console/Announcements.hpp"
 #include "host/console/Completer.hpp"
@@ -10,7 +11,7 @@
 
 namespace velkor::host {
 
-/// Lines typed on the terminal at standard input, with editing, history (kept in memory) and
+/// Lines typed on the terminal at standard input, with editing, history and
 /// completion by the Tab key. Ctrl-C drops the line, Ctrl-D on an empty line ends the input. While
 /// no line is being read, Ctrl-C is an `Interruption`. The terminal is in its ordinary mode again
 /// whenever no line is being read, and when a signal ends the program meanwhile. Reads the user's
@@ -22,9 +23,17 @@ public:
     /// What may follow the given text before the cursor.
     using Complete = std::function<Completion(const std::string&)>;
 
-    /// Takes over the terminal. `announcements` must live as long. Throws `std::runtime_error` "The
-    /// terminal can't be used for line editing.".
-    LineEditor(Complete complete, Announcements& announcements);
+    /// What outlasts the session.
+    struct Memory {
+        std::vector<std::string> earlierLines{};  ///< The oldest first.
+        /// Is told of each line as it is entered; may be empty.
+        std::function<void(const std::string& line)> remember{};
+    };
+
+    /// Takes over the terminal. `announcements` must live as long. The arrow keys reach `memory`
+    /// and what was entered since, but for lines that begin with a blank. Throws
+    /// `std::runtime_error` "The terminal can't be used for line editing.".
+    LineEditor(Complete complete, Announcements& announcements, Memory memory);
     ~LineEditor() override;
 
     LineEditor(const LineEditor&) = delete;

@@ -60,4 +60,10 @@ std::vector<std::string> nearestNames(const std::string& name,
     return names;
 }
 
+std::string joinedNames(const std::vector<std::string>& names) {
+    std::string text;
+    for (const auto& name : names) text += (text.empty() ? "" : ", ") + name;
+    return text;
+}
+
 }  // namespace velkor::host

@@ -12,4 +12,7 @@ namespace velkor::host {
 std::vector<std::string> nearestNames(const std::string& name,
                                       const std::vector<std::string>& known);
 
+/// `names` as a text: "a, b, c".
+std::string joinedNames(const std::vector<std::string>& names);
+
 }  // namespace velkor::host

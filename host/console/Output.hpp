@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "framework/common/Mutex.hpp"
+#include "host/console/Colours.hpp"
 
 namespace velkor::host {
 
@@ -16,13 +17,15 @@ namespace velkor::host {
 class Output {
 public:
     /// Whether answers are shown on a terminal, where control characters of a value must not act.
-    enum class Answers { exact, escaped };
+    /// Some terminals have colours besides.
+    enum class Answers { exact, escaped, coloured };
 
     Output(std::ostream& answerStream, Answers answerForm, std::ostream& messageStream);
 
     /// Writes `text`, with a line feed where a text that is not empty lacks one at its end. Once
     /// Ctrl-C was pressed, see `Interruption`, what is left of it is dropped; that is no failure.
-    void answer(std::string_view text) VELKOR_EXCLUDES(mutex);
+    /// Where there are colours, each line is painted by `paint`, unless that is null.
+    void answer(std::string_view text, Paint paint = nullptr) VELKOR_EXCLUDES(mutex);
 
     /// Writes one line of what the operator should know.
     void message(std::string_view text) VELKOR_EXCLUDES(mutex);

@@ -1,18 +1,16 @@
 #include "host/console/StateCommands.hpp"
 
 #include <charconv>
-#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <utility>
 
-#include "configuration/admin/TypedText.hpp"
 #include "host/console/Command.hpp"
+#include "host/console/OptionWords.hpp"
 #include "host/console/Table.hpp"
 #include "host/console/TimeText.hpp"
 #include "host/console/ValueText.hpp"
-#include "settings/Conversion.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -21,16 +19,9 @@ namespace {
 
 using configuration::ConfigurationValue;
 using Arguments = std::vector<std::string>;
-using StorePtr = std::shared_ptr<SessionStore>;
-using std::chrono::milliseconds;
+using SessionPtr = std::shared_ptr<SessionStore>;
 
 constexpr std::size_t usualLimit = 20;
-constexpr milliseconds longestLifetime = std::chrono::hours(24) * 36500;
-
-StateLayer& stateOf(const SessionStore& store) {
-    if (store.state() != nullptr) return *store.state();
-    throw CommandError("Nothing lasts in this session; start it with --state FILE for that.");
-}
 
 template <class Number>
 std::optional<Number> parseNumber(const std::string& text) {
@@ -41,32 +32,13 @@ std::optional<Number> parseNumber(const std::string& text) {
     return number;
 }
 
-milliseconds parseLifetime(const std::string& text) {
-    const auto read = settings::Conversion<milliseconds>::from(ConfigurationValue(text));
-    if (!read) throw CommandError("--for " + text + ": " + read.reason().text);
-    if (read.value() > milliseconds::zero() && read.value() <= longestLifetime) return read.value();
-    throw CommandError("--for " + text + ": not between 1ms and 36500d");
-}
-
 std::size_t parseLimit(const std::string& text) {
     const auto limit = parseNumber<std::size_t>(text);
     if (limit && *limit > 0) return *limit;
     throw CommandError("--limit " + text + ": a number from 1 on is needed");
 }
 
-/// The value of the option `name`, which may stand behind `least` to `most` other arguments.
-/// Throws `refusal` when something else is there.
-std::optional<std::string> optionBehind(std::size_t least, std::size_t most,
-                                        const Arguments& arguments, const std::string& name,
-                                        const char* refusal) {
-    const std::size_t count = arguments.size();
-    const bool isThere = count >= least + 2 && arguments[count - 2] == name;
-    if (count > most + (isThere ? 2 : 0)) throw CommandError(refusal);
-    if (isThere) return arguments.back();
-    return std::nullopt;
-}
-
-std::string effectiveText(const StorePtr& store, const std::string& key) {
+std::string effectiveText(const SessionPtr& store, const std::string& key) {
     const auto options = store->explain(key).get();
     if (options.empty()) return "No configuration option with key: " + key;
     const bool isSecret = settings::secretKeys(store).count(key) != 0;
@@ -77,7 +49,7 @@ std::string valueCell(const std::optional<ConfigurationValue>& value, bool isSec
     return value ? valueText(*value, isSecret) : "-";
 }
 
-std::string historyTable(const StorePtr& store,
+std::string historyTable(const SessionPtr& store,
                          const std::vector<configuration::RecordedChange>& changes) {
     const auto secrets = settings::secretKeys(store);
     std::vector<std::vector<std::string>> rows{
@@ -93,38 +65,30 @@ std::string historyTable(const StorePtr& store,
 
 }  // namespace
 
-std::string putValue(const StorePtr& store, const Arguments& arguments) {
-    const auto lifetime =
-        optionBehind(2, 2, arguments, "--for", "What follows VALUE is no --for TIME.");
-    ConfigurationValue value = configuration::typedText(arguments.at(1));
-    if (!lifetime) {
-        store->set(arguments.at(0), std::move(value)).get();
-        return "";
-    }
-    StateLayer& state = stateOf(*store);
-    const auto parsed = parseLifetime(*lifetime);
-    store->noteWrite();
-    state.setFor(arguments.at(0), std::move(value), parsed);
-    return "";
+StateLayer& stateOf(const SessionStore& store) {
+    if (store.state() != nullptr) return *store.state();
+    throw CommandError("Nothing lasts in this session; start it with --state FILE for that.");
 }
 
-std::string unsetKey(const StorePtr& store, const Arguments& arguments) {
-    const std::string& key = arguments.at(0);
+std::string unsetKey(const SessionPtr& store, const Arguments& arguments) {
+    const OptionWords given("unset", unsetUsage, 1, arguments);
+    const std::string& key = given.words().front().text;
+    const auto source = given.value("--source");
     store->noteWrite();
-    const bool wasThere = store->unset(key).get();
+    const bool wasThere = (source ? store->unset(key, *source) : store->unset(key)).get();
     if (!wasThere) throw CommandError("Nothing to unset: " + effectiveText(store, key));
     return effectiveText(store, key);
 }
 
-std::string showHistory(const StorePtr& store, const Arguments& arguments) {
-    const auto limit =
-        optionBehind(0, 1, arguments, "--limit", "What follows KEY is no --limit N.");
-    const bool hasKey = arguments.size() == (limit ? 3 : 1);
-    return historyTable(store, stateOf(*store).history(hasKey ? arguments.front() : "",
+std::string showHistory(const SessionPtr& store, const Arguments& arguments) {
+    const OptionWords given("history", historyUsage, 0, arguments);
+    const auto keys = given.texts();
+    const auto limit = given.value("--limit");
+    return historyTable(store, stateOf(*store).history(keys.empty() ? "" : keys.front(),
                                                        limit ? parseLimit(*limit) : usualLimit));
 }
 
-std::string undoChange(const StorePtr& store, const Arguments& arguments) {
+std::string undoChange(const SessionPtr& store, const Arguments& arguments) {
     StateLayer& state = stateOf(*store);
     std::optional<std::int64_t> number;
     if (!arguments.empty()) {

@@ -11,28 +11,27 @@ namespace velkor::host {
 // The commands on what is set in a session. They show values of secret keys, see
 // `settings::secretKeys`, as •••.
 
-/// KEY VALUE [--for TIME]: stores what `configuration::typedText` makes of VALUE where `set` would;
-/// with --for in the layer that lasts, until the time is over. TIME is a number with a unit, as
-/// `settings::Conversion` reads durations, between 1 ms and 36500 days. Gives nothing.
-///
-/// Throws `CommandError` "--for TIME: " and the reason for a TIME that is none, "What follows VALUE
-/// is no --for TIME." for other arguments, and for a session in which nothing lasts the text of
-/// `history`; what the store refuses passes on.
-std::string putValue(const std::shared_ptr<SessionStore>& store,
-                     const std::vector<std::string>& arguments);
+/// The layer that lasts. Throws `CommandError` "Nothing lasts in this session; start it with
+/// --state FILE for that." when there is none.
+StateLayer& stateOf(const SessionStore& store);
 
-/// KEY: takes the key out of the source that `set` would write it to, and gives what is effective
-/// then: "KEY = VALUE (SOURCE)" or "No configuration option with key: KEY". Throws `CommandError`
-/// "Nothing to unset: " with that text when the key was not there.
+/// What `unsetKey` takes.
+inline constexpr const char* unsetUsage = "KEY [--source SOURCE]";
+
+/// Takes the key out of SOURCE, or the source that `set` would write it to, and gives what is
+/// effective then: "KEY = VALUE (SOURCE)" or "No configuration option with key: KEY". `arguments`
+/// are words as they were typed, see `OptionWords`. Throws `CommandError` "Nothing to unset: " with
+/// that text when the key was not there, and as `OptionWords`; what the store refuses passes on.
 std::string unsetKey(const std::shared_ptr<SessionStore>& store,
                      const std::vector<std::string>& arguments);
 
-/// [KEY] [--limit N]: a table of the newest changes of the layer that lasts, the newest first, of
-/// KEY, of all keys that KEY with a "." at its end begins, or of all; at most N, or 20.
-///
-/// Throws `CommandError` "--limit N: a number from 1 on is needed", "What follows KEY is no --limit
-/// N." and, when there is no such layer, "Nothing lasts in this session; start it with --state FILE
-/// for that.".
+/// What `showHistory` takes.
+inline constexpr const char* historyUsage = "[KEY] [--limit N]";
+
+/// A table of the newest changes of the layer that lasts, the newest first, of KEY, of all keys
+/// that KEY with a "." at its end begins, or of all; at most N, or 20. `arguments` are words as
+/// they were typed, see `OptionWords`. Throws `CommandError` "--limit N: a number from 1 on is
+/// needed", and as `OptionWords` and `stateOf`.
 std::string showHistory(const std::shared_ptr<SessionStore>& store,
                         const std::vector<std::string>& arguments);
 

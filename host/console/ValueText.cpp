@@ -1,7 +1,6 @@
 #include "host/console/ValueText.hpp"
 
 #include <locale>
-#include <sstream>
 
 #include "configuration/admin/ValueFormat.hpp"
 #include "settings/Secrets.hpp"
@@ -18,6 +17,20 @@ std::string valueText(const configuration::ConfigurationValue& value, bool isSec
 std::string optionText(const std::string& key, const configuration::ConfigurationValue& value,
                        bool isSecret) {
     return key + " = " + valueText(value, isSecret);
+}
+
+OptionWriter::OptionWriter() {
+    values.imbue(std::locale::classic());
+}
+
+const std::string& OptionWriter::text(const std::string& key,
+                                      const configuration::ConfigurationValue& value,
+                                      bool isSecret) {
+    line.assign(key) += " = ";
+    if (isSecret) return line += settings::secretMark;
+    values.str("");
+    configuration::formatValue(values, value);
+    return line += values.str();
 }
 
 }  // namespace velkor::host

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <sstream>
 #include <string>
 
 #include "configuration/ConfigurationValue.hpp"
@@ -13,5 +14,19 @@ std::string valueText(const configuration::ConfigurationValue& value, bool isSec
 /// value is secret.
 std::string optionText(const std::string& key, const configuration::ConfigurationValue& value,
                        bool isSecret = false);
+
+/// Writes many options, each as `optionText` does, without the cost of a stream for each.
+class OptionWriter {
+public:
+    OptionWriter();
+
+    /// Refers to this; good until the next call.
+    const std::string& text(const std::string& key, const configuration::ConfigurationValue& value,
+                            bool isSecret);
+
+private:
+    std::ostringstream values;
+    std::string line;
+};
 
 }  // namespace velkor::host

@@ -12,6 +12,10 @@ Watches::Watches(std::shared_ptr<configuration::Configuration> watchedStore, Sho
     : store(std::move(watchedStore)), show(std::move(showValue)) {}
 
 bool Watches::add(const std::string& key) {
+    return add(key, show);
+}
+
+bool Watches::add(const std::string& key, const Show& shownBy) {
     const auto watch = std::make_shared<reactive_streams::SubscriptionHandle>();
     {
         const common::MutexLock lock(mutex);
@@ -19,7 +23,7 @@ bool Watches::add(const std::string& key) {
     }
     reactive_streams::SubscriptionHandle handle;
     try {
-        handle = open(key);
+        handle = open(key, shownBy);
     } catch (...) {
         forget(key, watch);
         throw;
@@ -42,15 +46,23 @@ bool Watches::remove(const std::string& key) {
     return true;
 }
 
+std::vector<std::string> Watches::keys() const {
+    const common::MutexLock lock(mutex);
+    std::vector<std::string> keys;
+    for (const auto& watch : watches) keys.push_back(watch.first);
+    return keys;
+}
+
 void Watches::forget(const std::string& key, const Watch& watch) {
     const common::MutexLock lock(mutex);
     const auto found = watches.find(key);
     if (found != watches.end() && found->second == watch) watches.erase(found);
 }
 
-reactive_streams::SubscriptionHandle Watches::open(const std::string& key) const {
+reactive_streams::SubscriptionHandle Watches::open(const std::string& key,
+                                                   const Show& shownBy) const {
     reactive_streams::Callbacks<ConfigurationValue> callbacks;
-    callbacks.onValue = [show = show, key](const ConfigurationValue& value) { show(key, value); };
+    callbacks.onValue = [shownBy, key](const ConfigurationValue& value) { shownBy(key, value); };
     return reactive_streams::subscribe(*store->watchOption(key), std::move(callbacks));
 }
 

@@ -4,6 +4,7 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "configuration/Configuration.hpp"
 #include "framework/common/Mutex.hpp"
@@ -28,19 +29,25 @@ public:
     /// watch is over then; so it is when the key was removed meanwhile.
     bool add(const std::string& key) VELKOR_EXCLUDES(mutex);
 
+    /// As above, but the values are shown by `shownBy`.
+    bool add(const std::string& key, const Show& shownBy) VELKOR_EXCLUDES(mutex);
+
     /// Shows no further values of `key`. Gives false when the key was not watched.
     bool remove(const std::string& key) VELKOR_EXCLUDES(mutex);
+
+    /// The keys that are watched, sorted.
+    std::vector<std::string> keys() const VELKOR_EXCLUDES(mutex);
 
 private:
     /// What keeps one watch open, once it is; its address tells it from a later one of the key.
     using Watch = std::shared_ptr<reactive_streams::SubscriptionHandle>;
 
-    reactive_streams::SubscriptionHandle open(const std::string& key) const;
+    reactive_streams::SubscriptionHandle open(const std::string& key, const Show& shownBy) const;
     void forget(const std::string& key, const Watch& watch) VELKOR_EXCLUDES(mutex);
 
     const std::shared_ptr<configuration::Configuration> store;
     const Show show;
-    common::Mutex mutex;
+    mutable common::Mutex mutex;
     // Cancelling a handle may wait for the thread that writes to the store, and that may show a
     // value meanwhile: handles end with the mutex released.
     std::map<std::string, Watch> watches VELKOR_GUARDED_BY(mutex);

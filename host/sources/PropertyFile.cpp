@@ -52,7 +52,9 @@ private:
     const int descriptor;
 };
 
-std::string readFile(const std::string& path, std::uintmax_t mostBytes) {
+}  // namespace
+
+std::string readPropertyFile(const std::string& path, const SourceLimits& limits) {
     const OpenFile file(path);
     if (file.isDirectory()) fail(configuration::store_errors::fileNotOpened, path, EISDIR);
     std::string text;
@@ -63,18 +65,16 @@ std::string readFile(const std::string& path, std::uintmax_t mostBytes) {
         if (count < 0) fail(fileNotRead, path, errno);
         if (count == 0) return text;
         text.append(block.data(), static_cast<std::size_t>(count));
-        if (text.size() > mostBytes) {
-            throw std::runtime_error("Property file is larger than " + std::to_string(mostBytes) +
-                                     " bytes: " + path);
+        if (text.size() > limits.fileBytes) {
+            throw std::runtime_error("Property file is larger than " +
+                                     std::to_string(limits.fileBytes) + " bytes: " + path);
         }
     }
 }
 
-}  // namespace
-
 std::shared_ptr<configuration::PropertyFileSource> loadPropertyFile(const std::string& path,
                                                                     const SourceLimits& limits) {
-    const std::string text = readFile(path, limits.fileBytes);
+    const std::string text = readPropertyFile(path, limits);
     return std::make_shared<configuration::PropertyFileSource>(configuration::PropertyText{text});
 }
 

@@ -8,7 +8,7 @@
 
 namespace velkor::host {
 
-/// The source of the property file at `path`, which is read as a whole or not at all.
+/// The content of the file at `path`, which is read as a whole or not at all.
 ///
 /// Throws `std::runtime_error`, in each text with the path after the first blank behind the colon:
 /// - "Property file could not be opened: PATH: REASON", REASON being the system's; for a directory,
@@ -17,6 +17,9 @@ namespace velkor::host {
 /// - "Property file is larger than N bytes: PATH", N being the limit: no more is read than that.
 ///
 /// Whatever can be read is a file: a pipe is read to its end, and waited for.
+std::string readPropertyFile(const std::string& path, const SourceLimits& limits);
+
+/// The source of the property file at `path`. Throws as `readPropertyFile`.
 std::shared_ptr<configuration::PropertyFileSource> loadPropertyFile(const std::string& path,
                                                                     const SourceLimits& limits);
 

@@ -6,6 +6,7 @@
 #include <stdexcept>
 #include <system_error>
 
+#include "host/lint/Remarks.hpp"
 #include "host/sources/PropertyFile.hpp"
 #include "layers/environment/EnvironmentSource.hpp"
 #include "layers/files/ReloadingFileSource.hpp"
@@ -26,28 +27,47 @@ bool canBeWatched(const std::string& path) {
            kind == std::filesystem::file_type::not_found;
 }
 
-std::shared_ptr<configuration::ConfigurationSource> makeFile(const SourceRequest& request,
-                                                             const SourceLimits& limits) {
+// The text is parsed for its remarks and once more for its values: what a remark needs, the places
+// of all lines and keys, is nothing that the source keeps or that other programs should pay for.
+// The remarks come first, so that both never need memory at once.
+MadeSource makePlainFile(const std::string& path, const SourceLimits& limits) {
+    const std::string text = readPropertyFile(path, limits);
+    const std::size_t remarks = countRemarks(text);
+    return {std::make_shared<configuration::PropertyFileSource>(configuration::PropertyText{text}),
+            remarks};
+}
+
+// The source has read the file for itself, and tells if it can't be read.
+std::size_t remarksOnWatched(const std::string& path, const SourceLimits& limits) {
+    try {
+        return countRemarks(readPropertyFile(path, limits));
+    } catch (const std::runtime_error&) {
+        return 0;
+    }
+}
+
+MadeSource makeFile(const SourceRequest& request, const SourceLimits& limits) {
     if (!request.watched || !canBeWatched(request.location)) {
-        return loadPropertyFile(request.location, limits);
+        return makePlainFile(request.location, limits);
     }
     layers::ReloadingFileOptions options;
     options.mustBeReadable = false;
     options.mostBytes = limits.fileBytes;
-    return std::make_shared<layers::ReloadingFileSource>(request.location, options);
+    return {std::make_shared<layers::ReloadingFileSource>(request.location, options),
+            remarksOnWatched(request.location, limits)};
 }
 
 std::string environmentName(const SourceRequest&) {
     return "environment";
 }
 
-std::shared_ptr<configuration::ConfigurationSource> makeEnvironment(const SourceRequest& request,
-                                                                    const SourceLimits&) {
-    return std::make_shared<layers::EnvironmentSource>(layers::EnvironmentNames(request.location));
+MadeSource makeEnvironment(const SourceRequest& request, const SourceLimits&) {
+    return {
+        std::make_shared<layers::EnvironmentSource>(layers::EnvironmentNames(request.location))};
 }
 
 constexpr SourceKind kinds[] = {
-    {"file", stemOfPath, makeFile},
+    {SourceRequest::fileKind, stemOfPath, makeFile},
     {"environment", environmentName, makeEnvironment},
 };
 

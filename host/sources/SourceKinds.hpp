@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -8,6 +9,12 @@
 #include "host/sources/SourceRequest.hpp"
 
 namespace velkor::host {
+
+/// A source that was made, and how many remarks `check` has on the file that it was made of.
+struct MadeSource {
+    std::shared_ptr<configuration::ConfigurationSource> source;
+    std::size_t remarks = 0;
+};
 
 /// How the sources of one kind are made.
 struct SourceKind {
@@ -18,8 +25,7 @@ struct SourceKind {
 
     /// The source that a request describes. Throws `std::runtime_error` with one line that names
     /// the location and the reason.
-    std::shared_ptr<configuration::ConfigurationSource> (*make)(const SourceRequest& request,
-                                                                const SourceLimits& limits);
+    MadeSource (*make)(const SourceRequest& request, const SourceLimits& limits);
 };
 
 /// The kind called `name`. Throws `std::invalid_argument` "Unknown kind of source: " and the name.

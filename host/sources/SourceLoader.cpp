@@ -2,8 +2,11 @@
 
 #include <exception>
 #include <new>
+#include <optional>
 #include <set>
+#include <stdexcept>
 
+#include "host/lint/Remarks.hpp"
 #include "host/sources/SourceKinds.hpp"
 
 namespace velkor::host {
@@ -37,12 +40,15 @@ private:
 
 void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
                 const SourceRequest& request, const SourceLimits& limits, LoadedSources& loaded) {
-    const auto source = sourceKind(request.kind).make(request, limits);
-    store.addSource(name, request.group, request.order, !request.writable, source).get();
+    const auto [source, remarks] = sourceKind(request.kind).make(request, limits);
     const auto file = std::dynamic_pointer_cast<const layers::ReloadingFileSource>(source);
-    if (file == nullptr) return;
-    loaded.watchedFiles.emplace(name, file);
-    if (const auto problem = file->status().problem) loaded.failures.push_back(problem->text);
+    const auto problem = file == nullptr ? std::nullopt : file->status().problem;
+    if (problem && request.mustBeReadable) throw std::runtime_error(problem->text);
+    store.addSource(name, request.group, request.order, !request.writable, source).get();
+    loaded.names.push_back(name);
+    if (file != nullptr) loaded.watchedFiles.emplace(name, file);
+    if (remarks != 0) loaded.notices.push_back(remarksNotice(request.location, remarks));
+    if (problem) loaded.failures.push_back(problem->text);
 }
 
 }  // namespace

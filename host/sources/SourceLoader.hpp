@@ -17,6 +17,8 @@ struct LoadedSources {
     using WatchedFiles = std::map<std::string, std::shared_ptr<const layers::ReloadingFileSource>>;
 
     std::vector<std::string> failures{};
+    std::vector<std::string> notices{};  ///< "PATH: N remarks, see check" for files with remarks.
+    std::vector<std::string> names{};    ///< Of the sources that were added.
     WatchedFiles watchedFiles{};
 };
 

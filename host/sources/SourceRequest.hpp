@@ -18,15 +18,24 @@ struct SourceRequest {
     /// The order of the values that the command line sets by itself.
     static constexpr int commandLineOrder = 100;
 
+    /// The kind of a property file.
+    static constexpr const char* fileKind = "file";
+
+    bool isFile() const { return kind == fileKind; }
+
     std::optional<std::string> name{};  ///< Nothing: one is made from the location.
     /// Where its values are: for a file its path, for the environment the beginning of the names.
     std::string location;
     std::string group{};
     int order = defaultOrder;
     bool writable = false;
-    std::string kind = "file";  ///< See `sourceKind`.
-    bool watched = false;       ///< It is read again when it changes, if it can be.
+    std::string kind = fileKind;  ///< See `sourceKind`.
+    bool watched = false;         ///< It is read again when it changes, if it can be.
+    bool mustBeReadable = false;  ///< A watched file that can't be read yet is a failure.
 };
+
+/// The order that `text` names; nothing when it is no number of 32 bits.
+std::optional<int> parseOrder(const std::string& text);
 
 /// What the making of a source may cost.
 struct SourceLimits {

@@ -221,33 +221,33 @@ public:
     }
 };
 
-class DerivedStore : public ::testing::Test {
+class ProtectedReading : public ::testing::Test {
 protected:
     std::shared_ptr<ProbeStore> store = std::make_shared<ProbeStore>();
 };
 
-TEST_F(DerivedStore, DoGetOfAMissingKeyThrowsATextOfItsOwn) {
+TEST_F(ProtectedReading, DoGetOfAMissingKeyThrowsATextOfItsOwn) {
     EXPECT_THAT([&] { store->probeGet("x"); },
                 ThrowsMessage<std::runtime_error>(StrEq("No option value for key: x")));
 }
 
-TEST_F(DerivedStore, DoGetOptionOfAMissingKeyThrowsATextOfItsOwn) {
+TEST_F(ProtectedReading, DoGetOptionOfAMissingKeyThrowsATextOfItsOwn) {
     EXPECT_THAT([&] { store->probeGetOption("x"); },
                 ThrowsMessage<std::runtime_error>(StrEq("No option for key: x")));
 }
 
-TEST_F(DerivedStore, DoHasIsFalseForAMissingKey) {
+TEST_F(ProtectedReading, DoHasIsFalseForAMissingKey) {
     EXPECT_FALSE(store->probeHas("x"));
 }
 
-TEST_F(DerivedStore, HelpersAnswerForAKeyThatIsThere) {
+TEST_F(ProtectedReading, HelpersAnswerForAKeyThatIsThere) {
     store->addInMemorySource("extra", "net", 5, false, {{"port", 80}});
     EXPECT_TRUE(store->probeHas("net.port"));
     EXPECT_EQ(textOf(store->probeGet("net.port")), "int 80");
     EXPECT_EQ(store->probeGetOption("net.port").source, "extra");
 }
 
-TEST_F(DerivedStore, SourcesAreCalledWithTheStoreLocked) {
+TEST_F(ProtectedReading, SourcesAreCalledWithTheStoreLocked) {
     const auto source = std::make_shared<testing::HookedSource>();
     std::vector<std::string> calls;
     source->whenCalled = [&](const std::string& call) {
@@ -263,12 +263,12 @@ TEST_F(DerivedStore, SourcesAreCalledWithTheStoreLocked) {
     EXPECT_THAT(calls, ::testing::IsSupersetOf({"keys", "attach", "set a", "has a", "get a"}));
 }
 
-TEST_F(DerivedStore, NothingIsLockedBetweenCalls) {
+TEST_F(ProtectedReading, NothingIsLockedBetweenCalls) {
     store->set("a", 1);
     EXPECT_FALSE(store->isLockedForOthers());
 }
 
-TEST_F(DerivedStore, HelpersSurviveASourceThatRemovesItself) {
+TEST_F(ProtectedReading, HelpersSurviveASourceThatRemovesItself) {
     const auto probes = {+[](ProbeStore& probed) { probed.probeHas("a"); },
                          +[](ProbeStore& probed) { probed.probeGet("a"); },
                          +[](ProbeStore& probed) { probed.probeGetOption("a"); }};

@@ -59,7 +59,7 @@ const std::vector<RefusedCall>& refusedCalls() {
     return calls;
 }
 
-class RefusalOf : public testing::TestWithParam<RefusedCall> {};
+class RefusalOf : public ::testing::TestWithParam<RefusedCall> {};
 
 TEST_P(RefusalOf, ACallOfTheStoreIsItsKind) {
     const auto store = std::make_shared<ConfigurationImpl>();
@@ -71,7 +71,7 @@ TEST_P(RefusalOf, ACallOfTheStoreIsItsKind) {
     }
 }
 
-INSTANTIATE_TEST_SUITE_P(Store, RefusalOf, testing::ValuesIn(refusedCalls()),
+INSTANTIATE_TEST_SUITE_P(Store, RefusalOf, ::testing::ValuesIn(refusedCalls()),
                          [](const auto& row) { return row.param.name; });
 
 TEST(RefusalOfText, RoutingErrorsAreTheirKind) {

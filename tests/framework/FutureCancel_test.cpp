@@ -8,6 +8,7 @@
 #include <utility>
 
 #include "framework/Future.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -16,12 +17,12 @@ namespace {
 using velkor::Future;
 using velkor::makeReadyFuture;
 using velkor::Promise;
+using velkor::testing::brokenPromise;
 using velkor::testing::completes;
 using velkor::testing::Latch;
 using velkor::testing::thrownText;
 
 constexpr auto cancelled = "Future has been cancelled.";
-constexpr auto brokenPromise = "Promise destroyed before it provided a value.";
 
 class FutureCancel : public ::testing::Test {
 protected:

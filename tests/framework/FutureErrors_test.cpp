@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "framework/Future.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace {
@@ -14,11 +15,9 @@ using velkor::Future;
 using velkor::makeFailedFuture;
 using velkor::makeReadyFuture;
 using velkor::Promise;
+using velkor::testing::alreadyResolved;
+using velkor::testing::invalidArgument;
 using velkor::testing::thrownText;
-
-std::exception_ptr invalidArgument(const std::string& text) {
-    return std::make_exception_ptr(std::invalid_argument(text));
-}
 
 // The fixed texts, one each.
 
@@ -53,29 +52,27 @@ TEST(FutureErrorText, SecondGetFutureIsRefused) {
 TEST(FutureErrorText, ValueAfterValueIsRefused) {
     Promise<int> promise;
     promise.setValue(1);
-    EXPECT_EQ(thrownText<std::runtime_error>([&] { promise.setValue(2); }),
-              "Promise already resolved.");
+    EXPECT_EQ(thrownText<std::runtime_error>([&] { promise.setValue(2); }), alreadyResolved);
 }
 
 TEST(FutureErrorText, ValueAfterExceptionIsRefused) {
     Promise<int> promise;
     promise.setException(invalidArgument("first"));
-    EXPECT_EQ(thrownText<std::runtime_error>([&] { promise.setValue(2); }),
-              "Promise already resolved.");
+    EXPECT_EQ(thrownText<std::runtime_error>([&] { promise.setValue(2); }), alreadyResolved);
 }
 
 TEST(FutureErrorText, ExceptionAfterValueIsRefused) {
     Promise<int> promise;
     promise.setValue(1);
     EXPECT_EQ(thrownText<std::runtime_error>([&] { promise.setException(invalidArgument("")); }),
-              "Promise already resolved.");
+              alreadyResolved);
 }
 
 TEST(FutureErrorText, ExceptionAfterExceptionIsRefused) {
     Promise<int> promise;
     promise.setException(invalidArgument("first"));
     EXPECT_EQ(thrownText<std::runtime_error>([&] { promise.setException(invalidArgument("")); }),
-              "Promise already resolved.");
+              alreadyResolved);
 }
 
 TEST(FutureErrorText, AbandonedPromiseIsNamed) {

@@ -10,6 +10,7 @@
 
 #include "framework/Future.hpp"
 #include "tests/framework/CountedValue.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/framework/ResultSamples.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/Thrown.hpp"
@@ -20,18 +21,14 @@ using velkor::Future;
 using velkor::makeFailedFuture;
 using velkor::makeReadyFuture;
 using velkor::Promise;
+using velkor::testing::alreadyResolved;
+using velkor::testing::alreadyTaken;
 using velkor::testing::completes;
 using velkor::testing::CountedValue;
+using velkor::testing::invalidArgument;
 using velkor::testing::ObservedMove;
 using velkor::testing::ResultSample;
 using velkor::testing::thrownText;
-
-constexpr auto alreadyTaken =
-    "Future already returned it's value or has an associated continuation.";
-
-std::exception_ptr invalidArgument(const std::string& text) {
-    return std::make_exception_ptr(std::invalid_argument(text));
-}
 
 // What every type of result has in common.
 
@@ -104,7 +101,7 @@ TYPED_TEST(FutureOfEachResult, SecondValueIsRefused) {
     this->promise.setValue(TestFixture::Sample::make());
     EXPECT_EQ(thrownText<std::runtime_error>(
                   [&] { this->promise.setValue(TestFixture::Sample::make()); }),
-              "Promise already resolved.");
+              alreadyResolved);
     EXPECT_TRUE(TestFixture::Sample::matches(this->future.get()));
 }
 

@@ -7,6 +7,7 @@
 
 #include "framework/Future.hpp"
 #include "tests/framework/CountedValue.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -15,12 +16,10 @@ namespace {
 using velkor::Future;
 using velkor::makeReadyFuture;
 using velkor::Promise;
+using velkor::testing::alreadyTaken;
 using velkor::testing::completes;
 using velkor::testing::FailsToMove;
 using velkor::testing::thrownText;
-
-constexpr auto alreadyTaken =
-    "Future already returned it's value or has an associated continuation.";
 
 TEST(FutureObject, IsMoveOnly) {
     EXPECT_FALSE(std::is_copy_constructible_v<Future<int>>);

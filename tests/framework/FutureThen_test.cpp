@@ -12,6 +12,7 @@
 
 #include "framework/Future.hpp"
 #include "tests/framework/CountedValue.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -21,14 +22,12 @@ using velkor::Future;
 using velkor::makeFailedFuture;
 using velkor::makeReadyFuture;
 using velkor::Promise;
+using velkor::testing::alreadyTaken;
+using velkor::testing::brokenPromise;
 using velkor::testing::completes;
 using velkor::testing::CountedValue;
 using velkor::testing::Latch;
 using velkor::testing::thrownText;
-
-constexpr auto alreadyTaken =
-    "Future already returned it's value or has an associated continuation.";
-constexpr auto brokenPromise = "Promise destroyed before it provided a value.";
 
 class FutureThen : public ::testing::Test {
 protected:

@@ -13,6 +13,7 @@
 #include <utility>
 
 #include "framework/Future.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/support/ScarceMemory.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -22,11 +23,10 @@ using velkor::Future;
 using velkor::makeFailedFuture;
 using velkor::makeReadyFuture;
 using velkor::Promise;
+using velkor::testing::brokenPromise;
 using velkor::testing::failEachAllocation;
 using velkor::testing::ScarceMemory;
 using velkor::testing::thrownText;
-
-constexpr auto brokenPromise = "Promise destroyed before it provided a value.";
 
 int addOne(Future<int>&& result) {
     return result.get() + 1;

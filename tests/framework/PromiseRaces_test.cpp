@@ -8,6 +8,7 @@
 #include <thread>
 
 #include "framework/Future.hpp"
+#include "tests/framework/FutureTesting.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/Thrown.hpp"
 
@@ -15,6 +16,7 @@ namespace {
 
 using velkor::Future;
 using velkor::Promise;
+using velkor::testing::alreadyResolved;
 using velkor::testing::Latch;
 using velkor::testing::thrownText;
 
@@ -35,8 +37,8 @@ TEST(PromiseRaces, OneOfTwoThreadsResolvesAndTheOtherOneIsRefused) {
             promise.setException(std::make_exception_ptr(std::invalid_argument("reason")));
         });
         other.join();
-        const bool otherWon = text == "Promise already resolved.";
-        EXPECT_EQ(otherText == "Promise already resolved.", !otherWon);
+        const bool otherWon = text == alreadyResolved;
+        EXPECT_EQ(otherText == alreadyResolved, !otherWon);
         if (otherWon) {
             EXPECT_EQ(future.get(), 1);
         } else {

@@ -1,4 +1,5 @@
 #include "framework/detail/SharedFutureState.hpp"
+#include "tests/framework/FutureTesting.hpp"
 
 #include <gtest/gtest.h>
 
@@ -22,21 +23,17 @@ namespace {
 using velkor::Future;
 using velkor::Promise;
 using velkor::detail::Continuation;
+using velkor::testing::alreadyResolved;
+using velkor::testing::alreadyTaken;
+using velkor::testing::brokenPromise;
 using velkor::testing::completes;
+using velkor::testing::invalidArgument;
 using velkor::testing::Latch;
 using velkor::testing::thrownText;
 
 using State = velkor::detail::SharedFutureState<int>;
 
-constexpr auto alreadyTaken =
-    "Future already returned it's value or has an associated continuation.";
-constexpr auto alreadyResolved = "Promise already resolved.";
-constexpr auto brokenPromise = "Promise destroyed before it provided a value.";
 constexpr auto nothingThrown = "<nothing thrown>";
-
-std::exception_ptr failure(const std::string& text) {
-    return std::make_exception_ptr(std::invalid_argument(text));
-}
 
 // A continuation made of two functions: one to be invoked, one for the destructor.
 class Scripted : public Continuation<int> {
@@ -133,7 +130,7 @@ std::ostream& operator<<(std::ostream& out, const Transition& row) {
 std::shared_ptr<State> stateIn(Status status) {
     auto state = std::make_shared<State>();
     if (status == Status::value) state->setValue(std::make_unique<int>(1), state);
-    if (status == Status::exception) state->setException(failure("first"), state);
+    if (status == Status::exception) state->setException(invalidArgument("first"), state);
     if (status == Status::cancelled) state->cancel();
     return state;
 }
@@ -143,7 +140,7 @@ void apply(Event event, const std::shared_ptr<State>& state) {
         case Event::setValue:
             return state->setValue(std::make_unique<int>(2), state);
         case Event::setException:
-            return state->setException(failure("second"), state);
+            return state->setException(invalidArgument("second"), state);
         case Event::cancel:
             return state->cancel();
         case Event::abandon:
@@ -218,7 +215,7 @@ TEST_F(SharedFutureStateContinuation, RunsOnTheResolvingThread) {
 
 TEST_F(SharedFutureStateContinuation, RunsForAnException) {
     attachCounting();
-    state->setException(failure("reason"), state);
+    state->setException(invalidArgument("reason"), state);
     EXPECT_EQ(runs, 1);
 }
 

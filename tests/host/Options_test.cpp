@@ -67,8 +67,10 @@ TEST(Options, FilesAndSourcesKeepTheirCommonOrder) {
               (Words{"a", "b", "c", "d"}));
 }
 
-TEST(Options, AfterTwoDashesEverythingIsAFile) {
-    EXPECT_EQ(pathsOf(parseOptions({"a", "--", "--log", "-c"})), (Words{"a", "--log", "-c"}));
+TEST(Options, AfterTwoDashesEverythingIsACommand) {
+    const Options options = parseOptions({"a", "--", "get", "--log", "[b]", "--", ""});
+    EXPECT_EQ(pathsOf(options), Words{"a"});
+    EXPECT_EQ(options.command, (Words{"get", "--log", "[b]", "--", ""}));
 }
 
 TEST(Options, BracketsAreTakenAsTheyAre) {
@@ -131,6 +133,11 @@ TEST(Options, TheLastWordOnWatchedFilesCounts) {
     EXPECT_EQ(parseOptions({"--watch-files", "--no-watch-files"}).watchesFiles, false);
 }
 
+TEST(Options, HistoryIsKeptUnlessTheCommandLineSaysOtherwise) {
+    EXPECT_TRUE(parseOptions({}).keepsHistory);
+    EXPECT_FALSE(parseOptions({"--no-history"}).keepsHistory);
+}
+
 TEST(Options, LogNamesAChannelAndItsSeverities) {
     const auto logs =
         parseOptions({"--log", "velkor::configuration=debug,trace", "--log=b=24"}).logs;
@@ -146,9 +153,19 @@ TEST(Options, HelpDescribesEveryOption) {
     for (const char* part :
          {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "--max-file-size SIZE",
           "--env PREFIX", "--set KEY=VALUE", "--state FILE", "--watch-files", "--no-watch-files",
-          "-c LINE", "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
+          "--check", "-c LINE", "--no-history", "--log CHANNEL=SEVERITIES", "--help", "--version",
+          "Exit status"}) {
         EXPECT_NE(help.find(part), std::string::npos) << part;
     }
+}
+
+TEST(Options, OfTheProgramAreThoseThatHelpDescribes) {
+    const std::string help = parseOptions({"--help"}).information;
+    for (const auto& option : programUsage().options) {
+        EXPECT_NE(help.find(option.help), std::string::npos) << option.help;
+        for (const auto& name : option.names) EXPECT_NE(help.find(name), std::string::npos) << name;
+    }
+    EXPECT_EQ(programUsage().options.front().names, (Words{"-h", "--help"}));
 }
 
 TEST(Options, VersionNamesTheProgram) {
@@ -184,6 +201,23 @@ INSTANTIATE_TEST_SUITE_P(
                   {"--foo"},
                   "The following argument was not expected: --foo (see --help)"},
         UsageCase{"LineMissing", {"-c"}, "-c: 1 required LINE missing (see --help)"},
+        UsageCase{"NoCommand", {"a", "--"}, "-- needs a COMMAND (see --help)"},
+        UsageCase{"LineAndCommand",
+                  {"-c", "list", "--", "list"},
+                  "-c LINE and -- COMMAND can't both be carried out (see --help)"},
+        UsageCase{"CheckAndLine",
+                  {"--check", "a", "-c", "list"},
+                  "--check goes without -c LINE, -- COMMAND and --listen (see --help)"},
+        UsageCase{"CheckAndCommand",
+                  {"--check", "a", "--", "list"},
+                  "--check goes without -c LINE, -- COMMAND and --listen (see --help)"},
+        UsageCase{"CheckAndServing",
+                  {"--check", "a", "--listen", "0"},
+                  "--check goes without -c LINE, -- COMMAND and --listen (see --help)"},
+        UsageCase{"CheckOfNothing", {"--check"}, "--check: a FILE is needed"},
+        UsageCase{"TwoDashesAreNoValue",
+                  {"-c", "--", "list"},
+                  "-c: 1 required LINE missing (see --help)"},
         UsageCase{"NoPath", {"--source", "n"}, "--source n: NAME=PATH is needed"},
         UsageCase{"EmptyPath", {"--source", "n="}, "--source n=: NAME=PATH is needed"},
         UsageCase{"EmptyName", {"--source", "=p"}, "--source =p: NAME=PATH is needed"},

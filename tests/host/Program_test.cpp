@@ -115,6 +115,48 @@ TEST(Program, GivenLinesTakeThePlaceOfStandardInput) {
     EXPECT_EQ(runProgram({"-c", "set a 1", "-c", "get a"}, "get b\n").out, "1\n");
 }
 
+TEST(Program, CarriesOutOneCommandWhoseWordsAreTakenAsTheyAre) {
+    const TemporaryFile file("a\\ 'key=b\n");
+    const auto result = runProgram({file.path().string(), "--", "get", "a 'key"}, "set a 1\n");
+    EXPECT_EQ(result.out, "'b'\n");
+    EXPECT_EQ(result.err, "");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, TakesAMessageAsOneCommand) {
+    EXPECT_EQ(runProgram({"--", "send", "ConfigurationKeys", "{ }"}).out,
+              "velkor/configuration/ConfigurationKeysResponse {\"keys\":[]}\n");
+}
+
+TEST(Program, OneCommandHasOptionsOfItsOwn) {
+    EXPECT_EQ(runProgram({"--", "put", "a", "x y", "--dry-run"}).out,
+              "LAYER      NOW  THEN\n"
+              "override   -    'x y'\n"
+              "effective  -    'x y' (override)\n");
+}
+
+TEST(Program, OneCommandThatFailsDecidesTheExitStatus) {
+    for (const std::string command : {"nope", "#"}) {
+        const auto result = runProgram({"--", command});
+        EXPECT_EQ(result.err.rfind("velkor-config: Unknown command: " + command, 0), 0U);
+        EXPECT_EQ(result.exitCode, 1);
+    }
+}
+
+TEST(Program, OneCommandMayHaveARemark) {
+    EXPECT_EQ(runProgram({"--", "set", "a", "20s"}).err,
+              "velkor-config: set a: 20s was stored as 20; put stores the whole word\n");
+}
+
+TEST(Program, RefusesACommandWhereFilesAreNamed) {
+    const auto result = runProgram({"/no/file", "get", "a key"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err,
+              "velkor-config: get is a command and no file; say: velkor-config [OPTIONS] [FILE...] "
+              "-- get a\\ key, or -c \"get a\\ key\"\n");
+    EXPECT_EQ(result.exitCode, 2);
+}
+
 TEST(Program, EndsAtQuit) {
     const auto result = runProgram({}, "set a 1\nquit\nget a\n");
     EXPECT_EQ(result.out, "");
@@ -135,6 +177,124 @@ TEST(Program, AnAbsentKeyIsAnAnswerNotAFailure) {
     const auto result = runProgram({"-c", "get a"});
     EXPECT_EQ(result.out, "No configuration option with key: a\n");
     EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, SaysWhenSetStoresSomethingElseThanWasTyped) {
+    const auto result = runProgram({}, "set host 10.20.0.9\nset a 1\nget host\n");
+    EXPECT_EQ(result.out, "10.2\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 1: set host: 10.20.0.9 was stored as 10.2; put stores the whole "
+              "word\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, PutTellsQuotedWordsFromOthers) {
+    EXPECT_EQ(runProgram({"-c", "put a 5", "-c", "put b '5'", "-c", "list"}).out,
+              "a = 5\nb = '5'\n");
+}
+
+TEST(Program, PutFailsWhereTheValueDoesNotFit) {
+    const auto result = runProgram({"-c", "put a --type uint -1", "-c", "list"});
+    EXPECT_EQ(result.out, "");
+    EXPECT_EQ(result.err, "velkor-config: --type uint: not within 0 to 4294967295\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+struct PutCase {
+    const char* type;
+    std::string words;
+    std::string value;  ///< As JSON.
+
+    friend std::ostream& operator<<(std::ostream& out, const PutCase& it) { return out << it.type; }
+};
+
+class PutTypeTest : public ::testing::TestWithParam<PutCase> {};
+
+TEST_P(PutTypeTest, IsStored) {
+    const std::string type = GetParam().type;
+    const auto result =
+        runProgram({}, "put a --type " + type + ' ' + GetParam().words + "\nshow a --json\n");
+    EXPECT_EQ(result.out,
+              "{\n\"a\":{\"type\":\"" + type + "\",\"value\":" + GetParam().value + "}\n}\n");
+    EXPECT_EQ(result.err, "");
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Types, PutTypeTest,
+    ::testing::Values(PutCase{"bool", "false", "false"}, PutCase{"int", "-5", "-5"},
+                      PutCase{"uint", "4294967295", "4294967295"}, PutCase{"double", "1", "1"},
+                      PutCase{"string", "5", "\"5\""}, PutCase{"ustring", "x", "\"x\""},
+                      PutCase{"boolArray", "true false", "[true,false]"},
+                      PutCase{"intArray", "1 -2", "[1,-2]"}, PutCase{"uintArray", "", "[]"},
+                      PutCase{"doubleArray", "0.5 2", "[0.5,2]"},
+                      PutCase{"stringArray", "a 'b c'", "[\"a\",\"b c\"]"},
+                      PutCase{"ustringArray", "\u20ac", "[\"\u20ac\"]"}),
+    [](const auto& tested) { return std::string(tested.param.type); });
+
+TEST(Program, PutTakesAWholeWordForANumberOnly) {
+    EXPECT_EQ(runProgram({}, "put a 10.20.0.9\nput b 20s\nput c 1e3\nput d true\nlist\n").out,
+              "a = '10.20.0.9'\nb = '20s'\nc = 1000\nd = true\n");
+}
+
+TEST(Program, PutAndUnsetReportWhatTheStoreRefuses) {
+    for (const std::string name : {"put", "unset"}) {
+        const std::string command = name + (name == "put" ? " a 1" : " server.port");
+        const auto result =
+            runProgram({"--source", "s=" + serviceFile, "-c", command + " --source s"});
+        EXPECT_EQ(
+            result.err.rfind("velkor-config: " + name + ": Source not found or not writable: ", 0),
+            0U)
+            << result.err;
+        EXPECT_EQ(result.out, "");
+        EXPECT_EQ(result.exitCode, 1);
+    }
+}
+
+TEST(Program, PutAndUnsetReachTheSourceThatIsNamed) {
+    const auto result = runProgram({},
+                                   "put a 1 --source default\nput a 2\n"
+                                   "unset a\nunset a --source default\nunset a\n");
+    EXPECT_EQ(result.out, "a = 1 (default)\nNo configuration option with key: a\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 5: Nothing to unset: No configuration option with key: a\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, LoadsAndUnloadsSourcesAsItGoes) {
+    const TemporaryFile file("port=80\n");
+    const std::string path = file.path().string();
+    const auto result =
+        runProgram({}, "load " + path + "\nload " + path +
+                           " --name site --group server --order 7\nsources\nget server.port\n"
+                           "unload site\nunload file\nlist\nunload override\nload /no/file\n");
+    EXPECT_EQ(result.out,
+              "Loaded as file.\n"
+              "Loaded as site.\n"
+              "NAME      GROUP    ORDER       ACCESS\n"
+              "override  -        0           writable\n"
+              "site      server.  7           read-only\n"
+              "file      -        1000        read-only\n"
+              "default   -        2147483647  writable\n"
+              "'80'\n");
+    EXPECT_EQ(result.err,
+              "velkor-config: line 8: The session needs its source: override\n"
+              "velkor-config: line 9: Property file could not be opened: /no/file: No such "
+              "file or directory\n");
+    EXPECT_EQ(result.exitCode, 1);
+}
+
+TEST(Program, DropsNoCommandBesideACheck) {
+    for (const std::vector<std::string>& command :
+         {std::vector<std::string>{"-c", "list"}, std::vector<std::string>{"--", "list"}}) {
+        std::vector<std::string> arguments{"--check", serviceFile};
+        arguments.insert(arguments.end(), command.begin(), command.end());
+        const auto result = runProgram(arguments);
+        EXPECT_EQ(result.out, "");
+        EXPECT_EQ(result.err,
+                  "velkor-config: --check goes without -c LINE, -- COMMAND and --listen (see "
+                  "--help)\n");
+        EXPECT_EQ(result.exitCode, 2);
+    }
 }
 
 TEST(Program, ReportsWhatASourceRefuses) {
@@ -202,6 +362,12 @@ TEST(Program, ShowsItsHelpOnStandardOutput) {
     EXPECT_NE(result.out.find("Usage: velkor-config [OPTIONS] [FILE...]"), std::string::npos);
     EXPECT_EQ(result.err, "");
     EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST(Program, RefusesAManualInAFormThatThereIsNot) {
+    const auto result = runProgram({"--manual", "html"});
+    EXPECT_EQ(result.err, "velkor-config: --manual: one of man, bash, usage is needed\n");
+    EXPECT_EQ(result.exitCode, 2);
 }
 
 TEST(Program, WritesALogChannelToStandardError) {

@@ -1,8 +1,11 @@
 #include <gtest/gtest.h>
 
+#include <fstream>
+#include <iterator>
 #include <string>
 
 #include "tests/host/ChildProcess.hpp"
+#include "tests/host/TerminalSession.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
 namespace velkor::host {
@@ -43,6 +46,46 @@ TEST_F(SettingsConsoleTest, ShowsASecretByNoCommand) {
     EXPECT_EQ(result.exitCode, 0);
 }
 
+TEST_F(SettingsConsoleTest, ShowsASecretInNoFormOfAValue) {
+    const auto result =
+        run("set server.password othersecret\n"
+            "show server.password\n"
+            "show server.password --all\n"
+            "show server.password --raw\n"
+            "show server.password --json\n"
+            "show server.password --json --all\n"
+            "explain server.password --json\n"
+            "watch server.password --json\n"
+            "send --raw ConfigurationGet {\"key\":\"server.password\"}\n"
+            "diff override\n");
+    const std::string value = "{\"type\":\"string\",\"value\":\"•••\"}";
+    const std::string layers = "[{\"source\":\"override\",\"value\":" + value +
+                               "},{\"source\":\"site\",\"value\":" + value + "}]";
+    EXPECT_EQ(result.out,
+              "server.password = •••\n"
+              "server.password = ••• (override)\n"
+              "server.password = ••• (site, overridden)\n"
+              "•••\n"
+              "{\n\"server.password\":" +
+                  value + "\n}\n{\n\"server.password\":" + layers +
+                  "\n}\n"
+                  "{\"key\":\"server.password\",\"layers\":" +
+                  layers + "}\n{\"key\":\"server.password\",\"value\":" + value +
+                  "}\n{\"key\":\"server.password\",\"source\":\"override\",\"value\":" + value +
+                  "}\n~ server.password = ••• -> •••\n");
+    EXPECT_EQ(result.exitCode, 0);
+}
+
+TEST_F(SettingsConsoleTest, ExportsNoSecretAndSaysSo) {
+    for (const char* const format : {"properties", "json"}) {
+        const auto result = run(std::string("export server.p* --format ") + format + '\n');
+        EXPECT_NE(result.out.find("8443"), std::string::npos);
+        EXPECT_EQ(result.out.find("server.password"), std::string::npos);
+        EXPECT_EQ(result.err, "velkor-config: Left out since they are secret: server.password\n");
+        EXPECT_EQ(result.exitCode, 0);
+    }
+}
+
 TEST_F(SettingsConsoleTest, ShowsASecretInNoRecord) {
     const auto result = runProgram({"--source", "site=" + file.path().string(), "--log",
                                     "velkor::configuration=31", "--log", "velkor::settings=31"},
@@ -56,12 +99,27 @@ TEST_F(SettingsConsoleTest, ShowsASecretInNoRecord) {
 }
 
 TEST_F(SettingsConsoleTest, NamesTheCommandAmongTheOthers) {
-    EXPECT_NE(run("help\n").out.find("settings                   [--undeclared] [KEY-PREFIX]  List "
-                                     "the settings"),
+    const std::string help = run("help\n").out;
+    EXPECT_NE(help.find("\nsettings                   [--undeclared] [KEY-PREFIX]  "),
               std::string::npos);
+    EXPECT_NE(help.find("  List the settings that are declared"), std::string::npos);
     EXPECT_EQ(run("help settings\n").out,
               "settings ([--undeclared] [KEY-PREFIX])\n"
               "List the settings that are declared, or the keys that are not.\n");
+}
+
+TEST_F(SettingsConsoleTest, KeepsNoSecretInItsHistory) {
+    TerminalSession terminal({"--source", "site=" + file.path().string()}, "dumb",
+                             {"XDG_STATE_HOME=" + file.parent().string()});
+    for (const char* line : {"set server.port 1\n", "set server.password othersecret\n",
+                             "send ConfigurationKeys\n", "quit\n"}) {
+        EXPECT_TRUE(terminal.shows("velkor> "));
+        terminal.type(line);
+    }
+    EXPECT_EQ(terminal.exitCode(), 0);
+    std::ifstream history(file.parent() / "velkor" / "history");
+    EXPECT_EQ(std::string(std::istreambuf_iterator<char>(history), {}),
+              "set server.port 1\nquit\n");
 }
 
 TEST(SettingsConsole, EndsBeforeTheFirstCommandWhenSettingsDoNotFit) {

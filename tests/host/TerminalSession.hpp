@@ -23,9 +23,11 @@ namespace velkor::host {
 /// The program under test on a terminal of its own, with a person at the keys.
 class TerminalSession {
 public:
-    /// A terminal without `abilities` shows what is written as it is.
+    /// A terminal without `abilities` shows what is written as it is. Nothing outlasts the session
+    /// unless `environment` (NAME=VALUE) says where.
     explicit TerminalSession(const std::vector<std::string>& arguments,
-                             const char* abilities = "dumb") {
+                             const char* abilities = "dumb",
+                             const std::vector<std::string>& environment = {}) {
         child = ::forkpty(&keys, nullptr, nullptr, nullptr);
         if (child < 0) throw std::runtime_error("no pseudo terminal");
         if (child == 0) {
@@ -33,6 +35,9 @@ public:
             ::setenv("TERM", abilities, 1);
             ::setenv("HOME", "/nonexistent", 1);
             ::setenv("LC_ALL", "C", 1);
+            ::unsetenv("XDG_STATE_HOME");
+            ::unsetenv("NO_COLOR");
+            for (const auto& variable : environment) ::putenv(const_cast<char*>(variable.c_str()));
             becomeProgram(arguments);
         }
     }

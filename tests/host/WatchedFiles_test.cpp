@@ -43,7 +43,7 @@ TEST_F(WatchedFilesTest, LeaveALineThatIsBeingTypedAsItIs) {
 }
 
 TEST_F(WatchedFilesTest, TakeTheRowOfTheLineWhereTheTerminalCanClearIt) {
-    TerminalSession terminal({file.path().string()}, "xterm");
+    TerminalSession terminal({file.path().string()}, "xterm", {"NO_COLOR=1"});
     begin(terminal, "1");
     terminal.type("get p");
     EXPECT_TRUE(terminal.shows("get p"));

@@ -17,12 +17,12 @@ namespace {
 
 constexpr std::size_t mostBytes = std::size_t{64} << 10U;
 
-[[noreturn]] void refuse(const std::string& path, const std::string& reason) {
+[[noreturn]] void refuseFile(const std::string& path, const std::string& reason) {
     throw Refused("can't read the token file " + path + ": " + reason);
 }
 
 [[noreturn]] void refuseForSystem(const std::string& path) {
-    refuse(path, std::generic_category().message(errno));
+    refuseFile(path, std::generic_category().message(errno));
 }
 
 std::string contentOf(const std::string& path) {
@@ -30,7 +30,7 @@ std::string contentOf(const std::string& path) {
     if (!file) refuseForSystem(path);
     struct stat status {};
     if (::fstat(file.get(), &status) != 0) refuseForSystem(path);
-    if (!S_ISREG(status.st_mode)) refuse(path, "no regular file");
+    if (!S_ISREG(status.st_mode)) refuseFile(path, "no regular file");
     if ((status.st_mode & (S_IRGRP | S_IWGRP | S_IROTH | S_IWOTH)) != 0) {
         throw Refused("the token file " + path + " is open to others than its owner (chmod 600)");
     }
@@ -43,7 +43,7 @@ std::string contentOf(const std::string& path) {
         if (count == 0) break;
         size += static_cast<std::size_t>(count);
     }
-    if (size > mostBytes) refuse(path, "larger than " + std::to_string(mostBytes) + " bytes");
+    if (size > mostBytes) refuseFile(path, "larger than " + std::to_string(mostBytes) + " bytes");
     content.resize(size);
     return content;
 }

@@ -45,8 +45,8 @@ void ChangeHub::begin(ConfigurationImpl& store, std::uint64_t watchNumber) {
          end, [end](const std::exception_ptr&) { end(); }},
         reactive_streams::Demand::oneAtATime);
     const common::MutexLock lock(mutex);
-    // What was left or has ended meanwhile is given up, without the mutex. No other watch has begun:
-    // only who joins begins one.
+    // What was left or has ended meanwhile is given up, without the mutex. No other watch has
+    // begun: only who joins begins one.
     if (isWatching) std::swap(watch, handle);
 }
 

@@ -9,6 +9,7 @@
 #include "configuration/sources/MonitoredSource.hpp"
 #include "http/detail/routes/Items.hpp"
 #include "http/detail/routes/JsonWriter.hpp"
+#include "http/detail/routes/Prefix.hpp"
 #include "settings/Describe.hpp"
 #include "settings/Secrets.hpp"
 
@@ -66,10 +67,6 @@ void writeSetting(JsonWriter& json, const settings::Description& setting) {
     json.member("needsRestart", setting.needsRestart);
     if (setting.error) json.member("error", *setting.error);
     json.endObject();
-}
-
-bool beginsWith(const std::string& text, const std::string& prefix) {
-    return text.compare(0, prefix.size(), prefix) == 0;
 }
 
 // What a source with `group` is asked for when `wanted`, a full key, a prefix with "." at its end,

@@ -6,6 +6,7 @@
 #include "configuration/StoreErrors.hpp"
 #include "http/detail/routes/Items.hpp"
 #include "http/detail/routes/JsonWriter.hpp"
+#include "http/detail/routes/Prefix.hpp"
 #include "http/detail/routes/Problem.hpp"
 #include "settings/Describe.hpp"
 
@@ -18,10 +19,6 @@ using settings::Description;
 
 constexpr std::size_t usualPage = 1000;
 constexpr std::size_t largestPage = 10'000;
-
-bool beginsWith(const std::string& key, const std::string& prefix) {
-    return key.compare(0, prefix.size(), prefix) == 0;
-}
 
 /// The keys of a page, and whether more follow.
 struct PageOfKeys {

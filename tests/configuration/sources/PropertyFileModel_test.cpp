@@ -1,11 +1,11 @@
 #include <gtest/gtest.h>
 
-#include <random>
 #include <sstream>
 #include <string>
 #include <string_view>
 
 #include "tests/configuration/sources/PropertyReading.hpp"
+#include "tests/configuration/sources/PropertyTexts.hpp"
 
 namespace velkor::configuration {
 namespace {
@@ -31,44 +31,15 @@ protected:
 };
 
 TEST_F(PropertyFileModel, AgreesOnEveryTextOfUpToFiveSpecialBytes) {
-    constexpr std::string_view alphabet = "k=\\u \t\n#";
-    constexpr std::size_t longest = 5;
-    std::size_t count = 1;
-    for (std::size_t length = 0; length <= longest; ++length, count *= alphabet.size()) {
-        for (std::size_t number = 0; number < count; ++number) {
-            std::string text;
-            for (std::size_t rest = number; text.size() < length; rest /= alphabet.size()) {
-                text += alphabet[rest % alphabet.size()];
-            }
-            ASSERT_TRUE(agreesOn(text));
-        }
-    }
+    for (const auto& text : testing::everyShortText()) ASSERT_TRUE(agreesOn(text));
 }
 
 TEST_F(PropertyFileModel, AgreesOnRandomTexts) {
-    using namespace std::string_view_literals;
-    constexpr std::string_view alphabet =
-        "kk==:: \t\n\n\r\\\\\\uuuu#!.0014189aAfFdDxX-+z\0\v\f\xC3\xA9\xA0\xFF"sv;
-    std::mt19937 random(20240607);  // NOLINT(cert-msc51-cpp): every run has the same inputs
-    for (int round = 0; round < 20000; ++round) {
-        std::string text(random() % 41, '\0');
-        for (char& byte : text) byte = alphabet[random() % alphabet.size()];
-        ASSERT_TRUE(agreesOn(text));
-    }
+    for (const auto& text : testing::randomTexts()) ASSERT_TRUE(agreesOn(text));
 }
 
 TEST_F(PropertyFileModel, AgreesOnRandomUnicodeEscapes) {
-    constexpr std::string_view alphabet = "0123456789abcdefABCDEFxX+- \tgz";
-    std::mt19937 random(7);  // NOLINT(cert-msc51-cpp): every run has the same inputs
-    for (int round = 0; round < 3000; ++round) {
-        std::string text = "k=";
-        for (int escape = 0; escape < 4; ++escape) {
-            text += "\\u";
-            const std::size_t digits = random() % 6;
-            for (std::size_t i = 0; i < digits; ++i) text += alphabet[random() % alphabet.size()];
-        }
-        ASSERT_TRUE(agreesOn(text));
-    }
+    for (const auto& text : testing::randomEscapes()) ASSERT_TRUE(agreesOn(text));
 }
 
 TEST_F(PropertyFileModel, AgreesOnEveryEscapedByte) {

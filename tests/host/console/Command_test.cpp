@@ -102,6 +102,18 @@ TEST(Command, TakesTheRawRestAsLastArgumentWhereWanted) {
               (Words{"Get", R"({"key": "it's  me"})"}));
 }
 
+TEST(Command, TakesWordsAsTypedWhereWanted) {
+    CommandTraits traits;
+    traits.takesWordsAsTyped = true;
+    const Command command = makeCommand(0, 9, traits);
+    EXPECT_EQ(argumentsOf(command, R"(run 'a' b\ c)"), (Words{"'a'", "b\\ c"}));
+    EXPECT_EQ(command.givenArguments({"5", "b c"}), (Words{"5", "b\\ c"}));
+}
+
+TEST(Command, TakesGivenWordsAsTheyAre) {
+    EXPECT_EQ(makeCommand(0, 9).givenArguments({"b c"}), (Words{"b c"}));
+}
+
 TEST(Command, HasNoLastArgumentWhenTheRestIsEmpty) {
     EXPECT_EQ(argumentsOf(makeCommand(1, 2, {"", true}), "run Get  "), (Words{"Get"}));
 }

@@ -29,11 +29,21 @@ std::shared_ptr<CommandRegistry> makeRegistry() {
     traits.suggestions = [] { return Words{"Get", "Set"}; };
     registry->add(std::make_shared<const Command>(
         administration::CommandDescriptor{"send", "", nothing, 1, 2}, traits));
+    registry->add(std::make_shared<const Command>(
+        administration::CommandDescriptor{"put", "", nothing, 0, 255},
+        CommandTraits{"KEY [VALUE...] [--type T] [--dry-run]"}));
     return registry;
 }
 
+Words wordsOf(std::string_view name, const std::string& typed) {
+    if (name == "KEY") return keys();
+    if (name == "T") return {"int", "uint"};
+    if (name == "VALUE" && typed.find('-') == std::string::npos) return {typed + "!"};
+    return {};
+}
+
 Completion complete(const std::string& line) {
-    return Completer(makeRegistry(), keys).complete(line);
+    return Completer(makeRegistry(), wordsOf).complete(line);
 }
 
 struct CompletionCase {
@@ -67,6 +77,13 @@ INSTANTIATE_TEST_SUITE_P(
         CompletionCase{"QuoteInAKeyIsQuoted", "get it", {R"(it\'s)"}},
         CompletionCase{"Suggestions", "send S", {"Set"}},
         CompletionCase{"NoFurtherArgument", "set server.port 8", {}},
+        CompletionCase{"Options", "put a --", {"--type", "--dry-run"}},
+        CompletionCase{"ValuesOfOptions", "put a --type ", {"int", "uint"}},
+        CompletionCase{"ArgumentsBehindOptions",
+                       "put --type int --dry-run serv",
+                       {"server.host", "server.port"}},
+        CompletionCase{"FurtherArguments", "put a b c", {"c!"}},
+        CompletionCase{"WhatIsTypedWithoutItsQuotes", R"(put a b\ c)", {R"(b\ c!)"}},
         CompletionCase{"NoArgumentsAtAll", "sources ", {}},
         CompletionCase{"UnknownCommand", "nope serv", {}},
         CompletionCase{"InsideQuotes", "get 'serv", {}}),

@@ -69,6 +69,21 @@ TEST_F(ControlCTest, EndsACommandThatHasShownNothingYet) {
     EXPECT_EQ(terminal.everything().find("key1099999"), std::string::npos);
 }
 
+TEST_F(ControlCTest, EndsWhatIsShown) {
+    enter("show --source");
+    EXPECT_TRUE(terminal.shows("key1000000 = "));
+    terminal.type(controlC);
+    expectTheSession();
+    EXPECT_EQ(terminal.everything().find("key1099999"), std::string::npos);
+}
+
+TEST_F(ControlCTest, EndsWhatHasNothingToShowYet) {
+    begin("show *9999");
+    terminal.type(controlC);
+    expectTheSession();
+    EXPECT_EQ(terminal.everything().find("key1099999"), std::string::npos);
+}
+
 TEST_F(ControlCTest, EndsAWaitForAFile) {
     const std::string pipe = file.path().string() + ".pipe";
     ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);

@@ -10,6 +10,7 @@
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Setting.hpp"
+#include "tests/support/TemporaryFile.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
@@ -18,8 +19,8 @@ namespace {
 using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
-const Words hostNames{"sources", "explain", "watch", "unwatch", "put", "unset",
-                      "history", "undo",    "send",  "help",    "quit"};
+const Words hostNames{"sources", "load", "unload", "explain", "watch", "unwatch", "put", "unset",
+                      "history", "undo", "send",   "help",    "?",     "quit",    "exit"};
 
 class HostCommandsTest : public ::testing::Test {
 protected:
@@ -27,8 +28,12 @@ protected:
         const auto show = [this](const auto& key, const auto& value) {
             shown.push_back(optionText(key, value));
         };
-        return {store, std::make_shared<Watches>(store, show), nullptr, [this] { quitting = true; },
-                [this](const auto& name) { return name == troubled ? "not now" : ""; }};
+        return {store,
+                std::make_shared<Watches>(store, show),
+                nullptr,
+                [this] { quitting = true; },
+                [this](const auto& name) { return name == troubled ? "not now" : ""; },
+                std::make_shared<SessionSources>(store, SourceLimits{})};
     }
 
     std::string run(const std::string& name, Words arguments = {}) {
@@ -74,8 +79,7 @@ TEST_P(HostCommandNameTest, StaysWithACommandThatGotItLater) {
     EXPECT_EQ(other->names(), Words{GetParam()});
 }
 
-INSTANTIATE_TEST_SUITE_P(Names, HostCommandNameTest, ::testing::ValuesIn(hostNames),
-                         [](const auto& tested) { return tested.param; });
+INSTANTIATE_TEST_SUITE_P(Names, HostCommandNameTest, ::testing::ValuesIn(hostNames));
 
 TEST_F(HostCommandsTest, KeepNothingAliveThroughTheRegistry) {
     const std::weak_ptr<CommandRegistry> weak = [this] {
@@ -101,6 +105,14 @@ TEST_F(HostCommandsTest, SourcesShowsWhatIsTheMatterWithOne) {
               "NAME      GROUP  ORDER       ACCESS    PROBLEM\n"
               "override  -      0           writable  not now\n"
               "default   -      2147483647  writable\n");
+}
+
+TEST_F(HostCommandsTest, LoadAndUnloadAddAndRemoveASource) {
+    const velkor::testing::TemporaryFile file("a=1\n");
+    EXPECT_EQ(run("load", {file.path().string()}), "Loaded as file.");
+    EXPECT_TRUE(store->has("a").get());
+    EXPECT_EQ(run("unload", {"file"}), "");
+    EXPECT_FALSE(store->has("a").get());
 }
 
 TEST_F(HostCommandsTest, ExplainShowsTheEffectiveValueFirst) {
@@ -167,11 +179,16 @@ TEST_F(HostCommandsTest, UndoSuggestsNoKeys) {
 TEST_F(HostCommandsTest, HelpListsAllCommandsOfTheRegistry) {
     const configuration::ConfigurationCommandProvider storeCommands(store, registry);
     const std::string help = run("help");
-    EXPECT_NE(help.find("explain                    KEY                      Show every source"),
+    EXPECT_NE(help.find("explain                    KEY [OPTIONS]             Show every source"),
               std::string::npos);
-    EXPECT_NE(help.find("velkor.configuration.set   2 arguments              Set a configuration "
+    EXPECT_NE(help.find("velkor.configuration.set   2 arguments               Set a configuration "
                         "value.\n"),
               std::string::npos);
+}
+
+TEST_F(HostCommandsTest, HelpShowsOptionsOfOneCommandOnly) {
+    EXPECT_NE(run("help").find("unset    KEY [OPTIONS]"), std::string::npos);
+    EXPECT_EQ(run("help", {"unset"}).rfind("unset (KEY [--source SOURCE])\n", 0), 0U);
 }
 
 TEST_F(HostCommandsTest, HelpDescribesOneCommand) {
@@ -181,7 +198,7 @@ TEST_F(HostCommandsTest, HelpDescribesOneCommand) {
               "Short: get\n"
               "Get a specific configuration value.\n");
     EXPECT_EQ(run("help", {"watch"}),
-              "watch (KEY)\nShow the value of a key now and whenever it changes.\n");
+              "watch (KEY [--json])\nShow the value of a key now and whenever it changes.\n");
 }
 
 TEST_F(HostCommandsTest, HelpRefusesAnUnknownCommand) {
@@ -194,6 +211,12 @@ TEST_F(HostCommandsTest, HelpSuggestsCommandNames) {
 
 TEST_F(HostCommandsTest, QuitEndsTheSession) {
     EXPECT_EQ(run("quit"), "");
+    EXPECT_TRUE(quitting);
+}
+
+TEST_F(HostCommandsTest, ExitAndTheQuestionMarkAreOtherNamesOfCommands) {
+    EXPECT_EQ(run("?"), run("help"));
+    EXPECT_EQ(run("exit"), "");
     EXPECT_TRUE(quitting);
 }
 

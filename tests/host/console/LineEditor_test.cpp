@@ -63,6 +63,35 @@ TEST_F(LineEditorTest, CompletesAKeyThatNeedsQuotes) {
     EXPECT_TRUE(terminal.shows("'b'\r\n"));
 }
 
+TEST_F(LineEditorTest, CompletesOptionsAndTheirValues) {
+    enter("put x 1 --t\tstringA\t");
+    EXPECT_TRUE(terminal.shows(prompt));
+    enter("get x");
+    EXPECT_TRUE(terminal.shows("\r\n['1']\r\n"));
+}
+
+TEST_F(LineEditorTest, CompletesASource) {
+    enter("unload f\t");
+    EXPECT_TRUE(terminal.shows(prompt));
+    enter("get server.port");
+    EXPECT_TRUE(terminal.shows("No configuration option"));
+}
+
+TEST_F(LineEditorTest, CompletesAFolderAndTheFileInIt) {
+    const std::string folder = file.parent().string();
+    enter("load " + folder.substr(0, folder.size() - 1) + "\tf\t--name again");
+    EXPECT_TRUE(terminal.shows("Loaded as again.\r\n"));
+}
+
+TEST_F(LineEditorTest, CompletesAWatchedKey) {
+    enter("watch server.port");
+    EXPECT_TRUE(terminal.shows("'8080'\r\nvelkor> "));
+    enter("unwatch s\t");
+    EXPECT_TRUE(terminal.shows(prompt));
+    enter("unwatch server.port");
+    EXPECT_TRUE(terminal.shows("Not watched: server.port"));
+}
+
 TEST_F(LineEditorTest, ListsWhatMayFollow) {
     terminal.type("get server.\t");
     EXPECT_TRUE(terminal.shows("server.host\r\nserver.port\r\n"));
@@ -141,7 +170,17 @@ TEST_F(LineEditorTest, TheTerminalMayGetAnotherSizeWhileALineIsEdited) {
 TEST_F(LineEditorTest, MessagesNameNoLineNumber) {
     enter("nope");
     EXPECT_TRUE(terminal.shows("velkor-config: Unknown command: nope\r\nvelkor> "));
+}
+
+TEST_F(LineEditorTest, ACommandThatFailedIsNoFailureOfTheSession) {
+    enter("nope");
+    EXPECT_TRUE(terminal.shows("Unknown command"));
     enter("quit");
+    EXPECT_EQ(terminal.exitCode(), 0);
+}
+
+TEST(LineEditor, GivenLinesThatFailAreAFailureAlsoOnATerminal) {
+    TerminalSession terminal({"-c", "nope"});
     EXPECT_EQ(terminal.exitCode(), 1);
 }
 

@@ -111,5 +111,23 @@ TEST_F(OutputTest, StaysOpenWhenWritingIsInterrupted) {
     EXPECT_TRUE(stream.good());
 }
 
+TEST(Output, PaintsLinesOfEscapedAnswersWhereThereAreColours) {
+    std::ostringstream answers;
+    std::ostringstream messages;
+    Output output(answers, Output::Answers::coloured, messages);
+    output.answer("a = '\x1b[31m'\nb = 1", paintOption);
+    output.answer("plain = 1");
+    EXPECT_EQ(answers.str(), "a = \x1b[32m'\\x1b[31m'\x1b[0m\nb = \x1b[36m1\x1b[0m\nplain = 1\n");
+}
+
+TEST(Output, PaintsNothingWhereThereAreNoColours) {
+    for (const auto form : {Output::Answers::exact, Output::Answers::escaped}) {
+        std::ostringstream answers;
+        std::ostringstream messages;
+        Output(answers, form, messages).answer("a = 1\n", paintOption);
+        EXPECT_EQ(answers.str(), "a = 1\n");
+    }
+}
+
 }  // namespace
 }  // namespace velkor::host

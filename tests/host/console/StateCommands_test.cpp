@@ -39,75 +39,6 @@ protected:
     std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
 };
 
-TEST_F(StateCommandsTest, PutStoresWhatTheTextMeans) {
-    EXPECT_EQ(putValue(store, {"a", "1.5"}), "");
-    putValue(store, {"b", "text"});
-    EXPECT_EQ(value("a"), "1.5");
-    EXPECT_EQ(value("b"), "'text'");
-    EXPECT_EQ(store->getOption("a").get().source, "state");
-}
-
-TEST_F(StateCommandsTest, PutTellsWhyAWriteIsRefused) {
-    store->removeSource("state");
-    store->removeSource("default");
-    EXPECT_EQ(thrownText<std::runtime_error>([this] {
-                  putValue(store, {"a", "1"});
-              }),
-              "No writable configuration source for key: a");
-}
-
-TEST_F(StateCommandsTest, PutLimitsAValueInTime) {
-    EXPECT_EQ(putValue(store, {"a", "1", "--for", "10m"}), "");
-    EXPECT_EQ(state->calls, Words{"setFor a = 1 600000"});
-    EXPECT_EQ(value("a"), "1");
-}
-
-TEST_F(StateCommandsTest, PutTakesAnyTextForKeyAndValue) {
-    putValue(store, {"--for", "--for", "--for", "1h 30min"});
-    EXPECT_EQ(state->calls, Words{"setFor --for = '--for' 5400000"});
-}
-
-struct Lifetime {
-    const char* test;
-    std::string text;
-    std::string refusal;
-
-    friend std::ostream& operator<<(std::ostream& out, const Lifetime& it) {
-        return out << it.text;
-    }
-};
-
-class BadLifetimeTest : public StateCommandsTest, public ::testing::WithParamInterface<Lifetime> {};
-
-TEST_P(BadLifetimeTest, IsRefusedAndNothingWritten) {
-    EXPECT_EQ(refusal(putValue, {"a", "1", "--for", GetParam().text}), GetParam().refusal);
-    EXPECT_EQ(state->calls, Words{});
-    EXPECT_FALSE(store->has("a").get());
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Lifetimes, BadLifetimeTest,
-    ::testing::Values(Lifetime{"Zero", "0", "--for 0: not between 1ms and 36500d"},
-                      Lifetime{"Negative", "-1s", "--for -1s: not between 1ms and 36500d"},
-                      Lifetime{"TooLong", "36501d", "--for 36501d: not between 1ms and 36500d"}),
-    [](const auto& tested) { return tested.param.test; });
-
-TEST_F(StateCommandsTest, PutRefusesATimeWithoutAUnit) {
-    EXPECT_EQ(refusal(putValue, {"a", "1", "--for", "10"}).rfind("--for 10: ", 0), 0U);
-}
-
-TEST_F(StateCommandsTest, PutTakesTheLongestTime) {
-    putValue(store, {"a", "1", "--for", "36500d"});
-    EXPECT_EQ(state->calls, Words{"setFor a = 1 3153600000000"});
-}
-
-TEST_F(StateCommandsTest, PutRefusesWhatIsNoTimeBehindTheValue) {
-    for (const Words& arguments :
-         {Words{"a", "1", "--for"}, Words{"a", "--for", "1s"}, Words{"a", "1", "2", "3"}}) {
-        EXPECT_EQ(refusal(putValue, arguments), "What follows VALUE is no --for TIME.");
-    }
-}
-
 TEST_F(StateCommandsTest, UnsetShowsWhatIsEffectiveThen) {
     store->set("a", 1, "default");
     store->set("a", 2);
@@ -124,6 +55,26 @@ TEST_F(StateCommandsTest, UnsetRefusesAKeyThatWasNotSet) {
     store->set("a", 1, "default");
     EXPECT_EQ(refusal(unsetKey, {"a"}), "Nothing to unset: a = 1 (default)");
     EXPECT_EQ(refusal(unsetKey, {"b"}), "Nothing to unset: No configuration option with key: b");
+}
+
+TEST_F(StateCommandsTest, UnsetTakesTheKeyOutOfTheSourceThatIsNamed) {
+    store->set("a", 1, "default");
+    store->set("a", 2);
+    EXPECT_EQ(unsetKey(store, {"a", "--source", "default"}), "a = 2 (state)");
+    EXPECT_EQ(unsetKey(store, {"a"}), "No configuration option with key: a");
+}
+
+TEST_F(StateCommandsTest, UnsetPassesOnWhatTheStoreRefuses) {
+    store->addInMemorySource("fixed", "", 5, true, {{"a", 1}});
+    EXPECT_EQ(thrownText<std::runtime_error>([this] {
+                  unsetKey(store, {"a", "--source", "fixed"});
+              }),
+              "Source not found or not writable: a, fixed");
+}
+
+TEST_F(StateCommandsTest, UnsetTakesAKeyThatLooksLikeAnOptionInQuotes) {
+    store->set("--source", 2);
+    EXPECT_EQ(unsetKey(store, {"'--source'"}), "No configuration option with key: --source");
 }
 
 TEST_F(StateCommandsTest, HistoryIsATableInTheOrderOfTheLayer) {
@@ -156,20 +107,24 @@ INSTANTIATE_TEST_SUITE_P(
                       HistoryCase{"AKey", {"a"}, "history 'a' 20"},
                       HistoryCase{"APrefix", {"server."}, "history 'server.' 20"},
                       HistoryCase{"AFew", {"--limit", "3"}, "history '' 3"},
-                      HistoryCase{"AFewOfAKey", {"a", "--limit", "3"}, "history 'a' 3"}),
+                      HistoryCase{"AFewOfAKey", {"a", "--limit", "3"}, "history 'a' 3"},
+                      HistoryCase{"AFewOfAKeyBehind", {"--limit", "3", "a"}, "history 'a' 3"},
+                      HistoryCase{"AKeyLikeAnOption", {"'--limit'"}, "history '--limit' 20"}),
     [](const auto& tested) { return tested.param.test; });
 
 TEST_F(StateCommandsTest, HistoryRefusesALimitThatIsNoCount) {
-    for (const char* text : {"0", "-1", "x", "1x", "", "99999999999999999999"}) {
+    for (const char* text : {"0", "-1", "x", "1x", "99999999999999999999"}) {
         EXPECT_EQ(refusal(showHistory, {"--limit", text}),
                   "--limit " + std::string(text) + ": a number from 1 on is needed");
     }
+    EXPECT_EQ(refusal(showHistory, {"--limit", "''"}), "--limit : a number from 1 on is needed");
 }
 
-TEST_F(StateCommandsTest, HistoryRefusesWhatIsNoLimitBehindTheKey) {
-    for (const Words& arguments : {Words{"a", "--limit"}, Words{"a", "b"}, Words{"a", "b", "c"}}) {
-        EXPECT_EQ(refusal(showHistory, arguments), "What follows KEY is no --limit N.");
-    }
+TEST_F(StateCommandsTest, HistoryRefusesASecondKeyAndOtherOptions) {
+    EXPECT_EQ(refusal(showHistory, {"a", "b"}), "history takes [KEY] [--limit N]");
+    EXPECT_EQ(refusal(showHistory, {"a", "--limit"}), "history: --limit needs N.");
+    EXPECT_EQ(refusal(showHistory, {"--all"}),
+              "history knows no option --all; quote it where it is an ordinary word.");
 }
 
 TEST_F(StateCommandsTest, UndoShowsTheChangeThatItMakes) {
@@ -200,30 +155,25 @@ TEST_F(StateCommandsTest, ShowNoSecrets) {
 
 TEST_F(StateCommandsTest, EveryWriteIsToBeAcknowledged) {
     state->changes = {{}};
-    putValue(store, {"a", "1"});
-    store->acknowledge();
-    putValue(store, {"a", "1", "--for", "1s"});
+    store->set("a", 1);
     store->acknowledge();
     unsetKey(store, {"a"});
     store->acknowledge();
     undoChange(store, {});
     store->acknowledge();
-    EXPECT_EQ(state->calls, (Words{"committed", "setFor a = 1 1000", "committed", "committed",
-                                   "undo the newest", "committed"}));
+    EXPECT_EQ(state->calls, (Words{"committed", "committed", "undo the newest", "committed"}));
 }
 
 TEST(StateCommands, SayWhenNothingLasts) {
     const auto store = std::make_shared<SessionStore>(SourceLimits{});
-    for (const auto& run : {putValue, showHistory, undoChange}) {
-        const Words arguments = run == putValue ? Words{"a", "1", "--for", "1s"} : Words{};
-        EXPECT_EQ(thrownText<CommandError>([&] { run(store, arguments); }), nothingLasts);
+    for (const auto& run : {showHistory, undoChange}) {
+        EXPECT_EQ(thrownText<CommandError>([&] { run(store, {}); }), nothingLasts);
     }
 }
 
 TEST(StateCommands, WorkOnWhatDoesNotLast) {
     const auto store = std::make_shared<SessionStore>(SourceLimits{});
-    putValue(store, {"a", "1"});
-    EXPECT_EQ(store->getOption("a").get().source, "override");
+    store->set("a", 1);
     EXPECT_EQ(unsetKey(store, {"a"}), "No configuration option with key: a");
 }
 

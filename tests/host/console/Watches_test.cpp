@@ -196,5 +196,11 @@ TEST_F(WatchesTest, OneThatFailsLeavesTheWatchThatReplacedItAlone) {
     EXPECT_EQ(shown, Words{"a = 2"});
 }
 
+TEST_F(WatchesTest, NameTheirKeys) {
+    watches.add("b");
+    watches.add("a");
+    EXPECT_EQ(watches.keys(), (std::vector<std::string>{"a", "b"}));
+}
+
 }  // namespace
 }  // namespace velkor::host

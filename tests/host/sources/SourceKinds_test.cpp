@@ -26,7 +26,7 @@ TEST(SourceKinds, FileIsTheKindOfARequestThatNamesNone) {
 
 TEST(SourceKinds, FileMakesASourceOfThePropertiesThere) {
     const TemporaryFile file("a=1\n");
-    EXPECT_TRUE(sourceKind("file").make(requestFor(file.path().string()), {})->has("a"));
+    EXPECT_TRUE(sourceKind("file").make(requestFor(file.path().string()), {}).source->has("a"));
 }
 
 TEST(SourceKinds, FileKeepsTheLimit) {
@@ -40,7 +40,7 @@ TEST(SourceKinds, FileIsCalledLikeItselfWithoutFolderAndLastExtension) {
 
 TEST(SourceKinds, EnvironmentMakesASourceOfTheVariablesWithAPrefix) {
     ::setenv("KINDS_TEST_A__B", "1", 1);
-    const auto source = sourceKind("environment").make(requestFor("KINDS_TEST_"), {});
+    const auto source = sourceKind("environment").make(requestFor("KINDS_TEST_"), {}).source;
     ::unsetenv("KINDS_TEST_A__B");
     EXPECT_TRUE(source->has("a.b"));
 }

@@ -12,7 +12,7 @@ namespace {
 
 constexpr std::size_t never = std::numeric_limits<std::size_t>::max();
 
-sqlite3_mem_methods usual;
+sqlite3_mem_methods ownMethods;
 
 std::mutex mutex;  // guards all below
 std::size_t successesLeft = never;
@@ -39,25 +39,25 @@ void count(std::ptrdiff_t blocks) {
 }
 
 void* allocate(int size) {
-    void* const memory = hasMemory() ? usual.xMalloc(size) : nullptr;
+    void* const memory = hasMemory() ? ownMethods.xMalloc(size) : nullptr;
     if (memory != nullptr) count(1);
     return memory;
 }
 
 void release(void* memory) {
-    usual.xFree(memory);
+    ownMethods.xFree(memory);
     count(-1);
 }
 
 void* reallocate(void* memory, int size) {
-    return hasMemory() ? usual.xRealloc(memory, size) : nullptr;
+    return hasMemory() ? ownMethods.xRealloc(memory, size) : nullptr;
 }
 
 }  // namespace
 
 void controlSqliteMemory() {
-    sqlite3_config(SQLITE_CONFIG_GETMALLOC, &usual);
-    sqlite3_mem_methods ours = usual;
+    sqlite3_config(SQLITE_CONFIG_GETMALLOC, &ownMethods);
+    sqlite3_mem_methods ours = ownMethods;
     ours.xMalloc = allocate;
     ours.xFree = release;
     ours.xRealloc = reallocate;

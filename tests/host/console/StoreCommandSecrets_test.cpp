@@ -1,4 +1,4 @@
-#include "host/console/MaskingRegistry.hpp"
+#include "host/console/StoreCommandRegistry.hpp"
 
 #include <gtest/gtest.h>
 
@@ -11,6 +11,7 @@
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "settings/Setting.hpp"
+#include "tests/support/Thrown.hpp"
 
 namespace velkor::host {
 namespace {
@@ -18,33 +19,34 @@ namespace {
 using configuration::ConfigurationCommandProvider;
 using settings::secret;
 using settings::Setting;
+using velkor::testing::thrownText;
 using Words = std::vector<std::string>;
 
-class MaskingRegistryTest : public ::testing::Test {
+class StoreCommandSecretsTest : public ::testing::Test {
 protected:
     std::string run(const std::string& name, Words arguments = {}) {
         return registry->find(name)->run(std::move(arguments));
     }
 
-    std::shared_ptr<configuration::ConfigurationImpl> store =
-        std::make_shared<configuration::ConfigurationImpl>();
+    std::shared_ptr<SessionStore> store = std::make_shared<SessionStore>(SourceLimits{});
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
-    std::shared_ptr<MaskingRegistry> masking = std::make_shared<MaskingRegistry>(store, registry);
+    std::shared_ptr<StoreCommandRegistry> masking =
+        std::make_shared<StoreCommandRegistry>(store, registry, [](const std::string&) {});
     std::optional<ConfigurationCommandProvider> commands{std::in_place, store, masking};
 };
 
-TEST_F(MaskingRegistryTest, GetShowsNoSecret) {
+TEST_F(StoreCommandSecretsTest, GetShowsNoSecret) {
     const Setting<std::string> token(store, "token", "t", secret());
     store->set("token", "verysecret");
     EXPECT_EQ(run("get", {"token"}), "•••");
 }
 
-TEST_F(MaskingRegistryTest, GetSaysWhenASecretHasNoValueInTheStore) {
+TEST_F(StoreCommandSecretsTest, GetSaysWhenASecretHasNoValueInTheStore) {
     const Setting<std::string> token(store, "token", "t", secret());
     EXPECT_EQ(run("get", {"token"}), "No configuration option with key: token");
 }
 
-TEST_F(MaskingRegistryTest, GetShowsWhatIsNoSecretAsEver) {
+TEST_F(StoreCommandSecretsTest, GetShowsWhatIsNoSecretAsEver) {
     const Setting<std::string> token(store, "token", "t", secret());
     const Setting<std::string> name(store, "token.name", "n");
     store->set("token.name", "visible");
@@ -54,13 +56,13 @@ TEST_F(MaskingRegistryTest, GetShowsWhatIsNoSecretAsEver) {
     EXPECT_EQ(run("get", {"absent"}), "No configuration option with key: absent");
 }
 
-TEST_F(MaskingRegistryTest, GetShowsTheValueOnceNobodyDeclaresItSecret) {
+TEST_F(StoreCommandSecretsTest, GetShowsTheValueOnceNobodyDeclaresItSecret) {
     { const Setting<std::string> token(store, "token", "t", secret()); }
     store->set("token", "visible");
     EXPECT_EQ(run("get", {"token"}), "'visible'");
 }
 
-TEST_F(MaskingRegistryTest, ListHidesSecretsOnly) {
+TEST_F(StoreCommandSecretsTest, ListHidesSecretsOnly) {
     const Setting<int> pin(store, "b.pin", 1, secret());
     const Setting<std::string> name(store, "c", "n");
     store->set("a", true);
@@ -70,40 +72,43 @@ TEST_F(MaskingRegistryTest, ListHidesSecretsOnly) {
     EXPECT_EQ(run("list"), "a = true\nb.pin = •••\nb.pine = 4711\nc = 'visible\nas ever'\n");
 }
 
-TEST_F(MaskingRegistryTest, ListShowsAllWhereNothingIsSecret) {
+TEST_F(StoreCommandSecretsTest, ListShowsAllWhereNothingIsSecret) {
     store->set("b", 0.1);
     store->set("a", "x");
     EXPECT_EQ(run("list"), "a = 'x'\nb = 0.1\n");
 }
 
-TEST_F(MaskingRegistryTest, ListTakesWhateverArgumentsTheCommandTakes) {
+TEST_F(StoreCommandSecretsTest, ListTakesWhateverArgumentsTheCommandTakes) {
     const Setting<int> pin(store, "pin", 1, secret());
     store->set("pin", 4711);
     EXPECT_EQ(run("list", {"any", "thing"}), "pin = •••\n");
 }
 
-TEST_F(MaskingRegistryTest, SetStaysSilentAndWrites) {
+TEST_F(StoreCommandSecretsTest, SetStaysSilentAndWrites) {
     const Setting<std::string> token(store, "token", "t", secret());
     EXPECT_EQ(run("set", {"token", "new"}), "");
     EXPECT_EQ(token.get(), "new");
 }
 
-TEST_F(MaskingRegistryTest, KeepsNamesTextsAndLimitsOfCommands) {
+TEST_F(StoreCommandSecretsTest, KeepsNamesTextsAndLimitsOfCommands) {
     const auto plain = std::make_shared<CommandRegistry>();
     const ConfigurationCommandProvider unmasked(store, plain);
     ASSERT_EQ(registry->names(), plain->names());
     for (const auto& name : plain->names()) {
         EXPECT_EQ(registry->find(name)->description(), plain->find(name)->description());
-        EXPECT_EQ(registry->find(name)->argumentText(), plain->find(name)->argumentText());
+        for (const Words& words : {Words{}, Words{"a", "b", "c"}}) {
+            EXPECT_EQ(thrownText<CommandError>([&] { run(name, words); }),
+                      thrownText<CommandError>([&] { plain->find(name)->run(Words(words)); }));
+        }
     }
 }
 
-TEST_F(MaskingRegistryTest, WithdrawsCommands) {
+TEST_F(StoreCommandSecretsTest, WithdrawsCommands) {
     commands.reset();
     EXPECT_EQ(registry->names(), Words{});
 }
 
-TEST_F(MaskingRegistryTest, GivesTheAnswersOfTheRegistry) {
+TEST_F(StoreCommandSecretsTest, GivesTheAnswersOfTheRegistry) {
     EXPECT_FALSE(masking->registerCommand({"", "", nullptr, 0, 0}).get());
     EXPECT_TRUE(masking->registerCommand({"a", "", [](Words&&) { return ""; }, 0, 0}).get());
     EXPECT_TRUE(masking->unregisterCommand("a").get());

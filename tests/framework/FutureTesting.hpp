@@ -1,0 +1,19 @@
+#pragma once
+
+#include <exception>
+#include <stdexcept>
+#include <string>
+
+namespace velkor::testing {
+
+// What futures and promises say when they refuse.
+constexpr auto alreadyTaken =
+    "Future already returned it's value or has an associated continuation.";
+constexpr auto alreadyResolved = "Promise already resolved.";
+constexpr auto brokenPromise = "Promise destroyed before it provided a value.";
+
+inline std::exception_ptr invalidArgument(const std::string& text) {
+    return std::make_exception_ptr(std::invalid_argument(text));
+}
+
+}  // namespace velkor::testing
