@@ -143,6 +143,15 @@ public:
         process = 0;
     }
 
+    /// Whatever became of the process, it runs afterwards.
+    void revive() {
+        if (process <= 0) start();
+        thaw();
+        if (!comesAbout([this] { return answers(); })) {
+            throw std::runtime_error("etcd doesn't start");
+        }
+    }
+
     void freeze() const { ::kill(process, SIGSTOP); }
     void thaw() const { ::kill(process, SIGCONT); }
 
@@ -218,11 +227,7 @@ public:
                                                            arguments));
             members.back()->start();
         }
-        for (const auto& member : members) {
-            if (!comesAbout([&] { return member->answers(); })) {
-                throw std::runtime_error("etcd doesn't start");
-            }
-        }
+        for (const auto& member : members) member->revive();
     }
 
     EtcdMember& operator[](std::size_t index) { return *members[index]; }
