@@ -106,7 +106,7 @@ void Outbox::end() noexcept {
 // Others may have written behind it.
 Group& Outbox::openGroup() {
     return *std::find_if(groups.rbegin(), groups.rend(),
-                         [this](const Group& group) { return isOpen(group); });
+                         [open = openNumber](const Group& group) { return group.number == open; });
 }
 
 bool Outbox::isOpen(const Group& group) const {
@@ -136,7 +136,8 @@ void Outbox::noteTaken(const Group& group, std::int64_t revision) {
     }
 }
 
-std::list<Group> Outbox::finish(const std::exception_ptr& refused) noexcept {
+// Whoever is told a reason has it alone then: it isn't under way here any more.
+std::list<Group> Outbox::finish(std::exception_ptr refused) noexcept {
     Waiters satisfied;
     std::list<Group> finished;
     {
@@ -150,10 +151,11 @@ std::list<Group> Outbox::finish(const std::exception_ptr& refused) noexcept {
                                       [&](const Waiter& each) { return each.upTo > group.number; });
         satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
     }
+    refused = nullptr;
     for (Waiter& each : satisfied) {
         try {
             if (each.refused) {
-                each.promise.setException(each.refused);
+                each.promise.setException(std::move(each.refused));
             } else {
                 each.promise.setValue(true);
             }
@@ -181,13 +183,15 @@ void Outbox::noteRefusal(const Group& group, const std::exception_ptr& refused) 
     }
 }
 
-void Outbox::refuseAll(const std::exception_ptr& reason) noexcept {
+void Outbox::refuseAll(std::exception_ptr reason) noexcept {
     for (;;) {
+        bool isLast = false;
         {
             const MutexLock lock(mutex);
             if (groups.empty()) return;
+            isLast = groups.size() == 1;
         }
-        finish(reason);
+        finish(isLast ? std::move(reason) : reason);
     }
 }
 

@@ -80,10 +80,10 @@ public:
 
     /// Tells who waits for the group that the server has taken it, or why not. Gives the group,
     /// which is there no more. Runs continuations.
-    std::list<Group> finish(const std::exception_ptr& refused) noexcept VELKOR_EXCLUDES(mutex);
+    std::list<Group> finish(std::exception_ptr refused) noexcept VELKOR_EXCLUDES(mutex);
 
     /// Finishes all that waits.
-    void refuseAll(const std::exception_ptr& reason) noexcept VELKOR_EXCLUDES(mutex);
+    void refuseAll(std::exception_ptr reason) noexcept VELKOR_EXCLUDES(mutex);
 
 private:
     struct Waiter {

@@ -167,14 +167,14 @@ void Sender::changeUntilDone(const Mutation& mutation) {
 
 /// Who waits is told also when the source ends meanwhile.
 template <class Mutation>
-void Sender::finish(const std::exception_ptr& outcome, const Mutation& mutation) {
+void Sender::finish(std::exception_ptr outcome, const Mutation& mutation) {
     try {
         changeUntilDone(mutation);
     } catch (const Stopped&) {
-        core->outbox.finish(outcome);
+        core->outbox.finish(std::move(outcome));
         throw;
     }
-    core->outbox.finish(outcome);
+    core->outbox.finish(std::move(outcome));
 }
 
 void Sender::onTaken(const Group& group, std::int64_t revision) {

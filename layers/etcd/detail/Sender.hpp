@@ -65,7 +65,7 @@ private:
     template <class Mutation>
     void changeUntilDone(const Mutation& mutation);
     template <class Mutation>
-    void finish(const std::exception_ptr& outcome, const Mutation& mutation);
+    void finish(std::exception_ptr outcome, const Mutation& mutation);
 
     const std::shared_ptr<Core> core;
     EndpointRound endpoints;

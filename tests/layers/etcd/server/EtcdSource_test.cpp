@@ -77,7 +77,7 @@ TEST_F(EtcdSourceTest, TellsWhatOthersWrite) {
     member().ctl("del " + prefix + "a");
     put("b", "");
     EXPECT_TRUE(fleet.shows("b", "string "));
-    EXPECT_THAT(fleet.told(), ElementsAre("a=string 1", "a=bool true", "a", "b=string "));
+    EXPECT_THAT(fleet.told(4), ElementsAre("a=string 1", "a=bool true", "a", "b=string "));
 }
 
 TEST_F(EtcdSourceTest, CarriesEveryKindExactly) {
@@ -114,7 +114,7 @@ TEST_F(EtcdSourceTest, ReadsWhatItWrites) {
               "{\"type\":\"int\",\"value\":1}\n");
     put("fence", "1");
     EXPECT_TRUE(fleet.shows("fence", "string 1"));
-    EXPECT_THAT(fleet.told(), ElementsAre("a=int 1", "fence=string 1"));
+    EXPECT_THAT(fleet.told(2), ElementsAre("a=int 1", "fence=string 1"));
 }
 
 TEST_F(EtcdSourceTest, Unsets) {
@@ -175,7 +175,7 @@ TEST_F(EtcdSourceTest, TellsAllRevisionsInTheirOrder) {
         expected.push_back("a=int " + std::to_string(i));
     }
     EXPECT_TRUE(reader.shows("a", "int 199"));
-    EXPECT_EQ(reader.told(), expected);
+    EXPECT_EQ(reader.told(expected.size()), expected);
 }
 
 TEST_F(EtcdSourceTest, SaysHowItStands) {
