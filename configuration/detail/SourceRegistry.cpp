@@ -30,6 +30,7 @@ RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
       table(nullptr),
       texts(nullptr),
       forgetting(dynamic_cast<ForgettingSource*>(source.get())),
+      grouping(dynamic_cast<GroupingSource*>(source.get())),
       attached(dynamic_cast<AttachedSource*>(source.get())),
       foreign(true) {
     if (const auto* const answering = dynamic_cast<const TableSource*>(source.get())) {

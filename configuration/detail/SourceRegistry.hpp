@@ -11,6 +11,7 @@
 #include "configuration/sources/AttachedSource.hpp"
 #include "configuration/sources/ConfigurationSourceMap.hpp"
 #include "configuration/sources/ForgettingSource.hpp"
+#include "configuration/sources/GroupingSource.hpp"
 #include "configuration/sources/SourceDescription.hpp"
 #include "configuration/sources/TextTable.hpp"
 #include "configuration/sources/ValueTable.hpp"
@@ -36,6 +37,7 @@ struct RegisteredSource : ConfigurationSourceMap {
     const ValueTable* table;       ///< What it answers from; null: not from such a table.
     const TextTable* texts;        ///< The same for texts. Neither: the source itself is asked.
     ForgettingSource* forgetting;  ///< The source, if keys can be taken out of it; else null.
+    GroupingSource* grouping;      ///< The source, if it makes several writes as one; else null.
     AttachedSource* attached;      ///< The source, if it is told of its registration; else null.
     bool foreign;                  ///< It is not of one of this library's own classes.
     bool reportsChanges = false;   ///< The store's listener is installed.

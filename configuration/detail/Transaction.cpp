@@ -15,6 +15,39 @@ std::optional<ConfigurationValue> heldBy(const RegisteredSource& target, const s
     return target.source->get(relativeKey);
 }
 
+/// Lets those of the sources that can make one of all that is written while this lives.
+class Groups {
+public:
+    explicit Groups(const std::vector<const RegisteredSource*>& all) : targets(all) {
+        try {
+            for (; begun < targets.size(); ++begun) begin(targets[begun]->grouping);
+        } catch (...) {
+            end();
+            throw;
+        }
+    }
+
+    ~Groups() { end(); }
+
+    Groups(const Groups&) = delete;
+    Groups& operator=(const Groups&) = delete;
+
+private:
+    static void begin(GroupingSource* source) {
+        if (source != nullptr) source->beginGroup();
+    }
+
+    void end() noexcept {
+        while (begun > 0) {
+            GroupingSource* const source = targets[--begun]->grouping;
+            if (source != nullptr) source->endGroup();
+        }
+    }
+
+    const std::vector<const RegisteredSource*>& targets;
+    std::size_t begun = 0;
+};
+
 }  // namespace
 
 std::string refusalOf(const Change& change, const RegisteredSource* target) {
@@ -52,6 +85,7 @@ std::string Transaction::refusals() const {
 }
 
 void Transaction::write(SourceRegistry& sources) {
+    const Groups groups(targets);
     for (std::size_t i = 0; i < changes.size(); ++i) {
         try {
             writeOne(sources, i, changes[i].value);

@@ -7,10 +7,10 @@
 #include "configuration/StoreErrors.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
 #include "framework/common/Mutex.hpp"
+#include "layers/detail/TableChange.hpp"
 #include "layers/files/Loggers.hpp"
 #include "layers/files/detail/FileReading.hpp"
 #include "layers/files/detail/FileWatcher.hpp"
-#include "layers/files/detail/TableChange.hpp"
 #include "layers/files/detail/WatchedFile.hpp"
 
 namespace velkor::layers {

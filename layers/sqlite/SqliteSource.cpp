@@ -4,9 +4,9 @@
 #include <system_error>
 #include <utility>
 
+#include "layers/detail/Endings.hpp"
 #include "layers/sqlite/SqliteErrors.hpp"
 #include "layers/sqlite/detail/Committer.hpp"
-#include "layers/sqlite/detail/Endings.hpp"
 #include "layers/sqlite/detail/TableWrite.hpp"
 
 namespace velkor::layers {

@@ -5,7 +5,7 @@
 #include <string_view>
 #include <utility>
 
-#include "layers/sqlite/detail/ValueCodec.hpp"
+#include "layers/detail/ValueCodec.hpp"
 
 namespace velkor::layers::detail {
 

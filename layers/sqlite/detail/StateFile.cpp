@@ -5,10 +5,10 @@
 #include <stdexcept>
 #include <utility>
 
+#include "layers/detail/ValueCodec.hpp"
 #include "layers/sqlite/Loggers.hpp"
 #include "layers/sqlite/SqliteErrors.hpp"
 #include "layers/sqlite/detail/Schema.hpp"
-#include "layers/sqlite/detail/ValueCodec.hpp"
 
 namespace velkor::layers::detail {
 

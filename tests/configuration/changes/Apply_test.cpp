@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "configuration/StoreErrors.hpp"
+#include "configuration/sources/GroupingSource.hpp"
 #include "tests/configuration/changes/ChangeTesting.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
@@ -166,6 +167,67 @@ TEST_F(Apply, OfManyKeysTellsEachOnce) {
     const ChangeWatch followed = follow("");
     store->apply(changes).get();
     EXPECT_EQ(followed.subscriber->values.size(), 20000U);
+}
+
+/// A source that notes its groups among the calls that it gets.
+class GroupedSource final : public HookedSource, public GroupingSource {
+public:
+    void beginGroup() override {
+        if (refuses) throw std::runtime_error("no group");
+        ++depth;
+        calls.emplace_back("begin");
+    }
+
+    void endGroup() noexcept override {
+        --depth;
+        calls.emplace_back("end");
+    }
+
+    /// The calls that write and those around them.
+    std::vector<std::string> groups() const {
+        std::vector<std::string> noted;
+        for (const auto& call : calls) {
+            if (call == "begin" || call == "end" || call.rfind("set", 0) == 0) {
+                noted.push_back(call);
+            }
+        }
+        return noted;
+    }
+
+    bool refuses = false;
+    int depth = 0;
+};
+
+TEST_F(Apply, WritesWithinAGroupOfTheSource) {
+    const auto source = std::make_shared<GroupedSource>();
+    store->addSource("grouped", "", -1, false, source);
+    store->apply({setting("a", 1), setting("b", 2)}).get();
+    EXPECT_THAT(source->groups(), ElementsAre("begin", "begin", "set a", "set b", "end", "end"));
+}
+
+TEST_F(Apply, EndsTheGroupWhenASourceThrows) {
+    const auto source = std::make_shared<GroupedSource>();
+    store->addSource("grouped", "", -1, false, source);
+    source->whenSet = [] { throw std::runtime_error("full"); };
+    EXPECT_THROW(store->apply({setting("a", 1)}).get(), std::runtime_error);
+    EXPECT_EQ(source->depth, 0);
+}
+
+TEST_F(Apply, WritesNothingWhenAGroupCannotBegin) {
+    const auto first = std::make_shared<GroupedSource>();
+    const auto second = std::make_shared<GroupedSource>();
+    store->addSource("first", "", -1, false, first);
+    store->addSource("second", "", -2, false, second);
+    second->refuses = true;
+    EXPECT_THROW(store->apply({{"a", 1, "first"}, {"b", 1, "second"}}).get(), std::runtime_error);
+    EXPECT_THAT(first->groups(), ElementsAre("begin", "end"));
+}
+
+TEST_F(Apply, OfOneKeyBySetMakesNoGroup) {
+    const auto source = std::make_shared<GroupedSource>();
+    store->addSource("grouped", "", -1, false, source);
+    store->set("a", 1);
+    EXPECT_THAT(source->groups(), ElementsAre("set a"));
 }
 
 }  // namespace

@@ -1,4 +1,4 @@
-#include "layers/files/detail/TableChange.hpp"
+#include "layers/detail/TableChange.hpp"
 
 #include <gmock/gmock.h>
 

@@ -1,4 +1,4 @@
-#include "layers/sqlite/detail/Endings.hpp"
+#include "layers/detail/Endings.hpp"
 
 namespace velkor::layers::detail {
 

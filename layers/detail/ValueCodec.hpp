@@ -8,7 +8,7 @@
 
 namespace velkor::layers::detail {
 
-/// `value` as it stands in the file: its tag, ":" and the content, so that it can be read there
+/// `value` as it stands in a file: its tag, ":" and the content, so that it can be read there
 /// with common tools. Exact for every value of every kind.
 ///
 /// - Truth values are "true" and "false", whole numbers decimal, doubles the shortest text that

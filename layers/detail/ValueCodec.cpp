@@ -1,4 +1,4 @@
-#include "layers/sqlite/detail/ValueCodec.hpp"
+#include "layers/detail/ValueCodec.hpp"
 
 #include <array>
 #include <charconv>
