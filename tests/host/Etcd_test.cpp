@@ -45,7 +45,7 @@ protected:
     static EtcdMember& member() { return (*cluster)[0]; }
 
     std::string layer(const std::string& settings = "") const {
-        return member().url() + ",prefix=" + prefix + settings;
+        return member().url() + ",wait=20s,prefix=" + prefix + settings;
     }
 
     /// What etcdctl says to a command about `key`, with what follows.
@@ -179,7 +179,12 @@ protected:
                            "get port", "-c", "sources"});
     }
 
-    std::string reason() const { return port.url() + ": Connection refused"; }
+    // Without the reason: what an attempt to connect met, or that there was no time for one.
+    static std::string told(const ChildResult& result) {
+        const std::string program = "velkor-config: ";
+        return result.err.substr(program.size(),
+                                 result.err.find(": ", program.size()) - program.size());
+    }
 
     const DeafPort port;
 };
@@ -187,7 +192,7 @@ protected:
 TEST_F(AbsentEtcdTest, FailsUnlessToldOtherwise) {
     const auto result = get("without-server=fail");
     EXPECT_EQ(result.exitCode, 3);
-    EXPECT_EQ(result.err, "velkor-config: etcd could not be read: " + reason() + "\n");
+    EXPECT_EQ(told(result), "etcd could not be read");
     EXPECT_THAT(result.out, Not(HasSubstr("etcd")));
     EXPECT_THAT(result.out, HasSubstr("No configuration option with key: port\n"));
 }
@@ -195,10 +200,10 @@ TEST_F(AbsentEtcdTest, FailsUnlessToldOtherwise) {
 TEST_F(AbsentEtcdTest, MayBeginEmptyAndSaysSo) {
     const auto result = get("without-server=empty");
     EXPECT_EQ(result.exitCode, 0);
-    EXPECT_EQ(result.err, "velkor-config: etcd began without its server: " + reason() + "\n");
+    EXPECT_EQ(told(result), "etcd began without its server");
     EXPECT_THAT(result.out, HasSubstr("No configuration option with key: port\n"));
     EXPECT_THAT(result.out, HasSubstr("ACCESS     PROBLEM\n"));
-    EXPECT_THAT(result.out, HasSubstr("Z: " + reason() + "\n"));
+    EXPECT_THAT(result.out, HasSubstr("etcd      -      300         read-only  since 20"));
 }
 
 TEST_F(AbsentEtcdTest, MayBeginWithTheLastKnownValuesAndSaysSo) {
@@ -207,13 +212,14 @@ TEST_F(AbsentEtcdTest, MayBeginWithTheLastKnownValuesAndSaysSo) {
     {
         EtcdCluster cluster;
         cluster[0].ctl("put /p/port 80");
-        const auto result = runProgram(
-            {"--etcd", cluster[0].url() + ",prefix=/p/,last-known=" + file, "-c", "get port"});
+        const auto result =
+            runProgram({"--etcd", cluster[0].url() + ",wait=20s,prefix=/p/,last-known=" + file,
+                        "-c", "get port"});
         ASSERT_EQ(result.out, "'80'\n");
     }
     const auto result = get("last-known=" + file);
     EXPECT_EQ(result.exitCode, 0);
-    EXPECT_EQ(result.err, "velkor-config: etcd began without its server: " + reason() + "\n");
+    EXPECT_EQ(told(result), "etcd began without its server");
     EXPECT_THAT(result.out, HasSubstr("'80'\n"));
     EXPECT_THAT(result.out, HasSubstr("ACCESS     STATE       PROBLEM\n"));
     EXPECT_THAT(result.out, HasSubstr("  revision 2  since 20"));
@@ -222,8 +228,8 @@ TEST_F(AbsentEtcdTest, MayBeginWithTheLastKnownValuesAndSaysSo) {
 TEST_F(AbsentEtcdTest, FailsWithoutLastKnownValues) {
     const auto result = get("last-known=/no/file");
     EXPECT_EQ(result.exitCode, 3);
-    EXPECT_THAT(result.err,
-                HasSubstr("velkor-config: etcd could not be read: " + reason() + "; /no/file: "));
+    EXPECT_EQ(told(result), "etcd could not be read");
+    EXPECT_THAT(result.err, HasSubstr("; /no/file: "));
     EXPECT_THAT(result.out, Not(HasSubstr("etcd")));
 }
 
@@ -232,8 +238,8 @@ TEST_F(AbsentEtcdTest, FailsAWriteAndSaysWhy) {
         runProgram({"--etcd", port.url() + ",wait=50ms,without-server=empty,writable", "-c",
                     "put port 1 --source etcd", "-c", "get port"});
     EXPECT_EQ(result.exitCode, 1);
-    EXPECT_THAT(result.err,
-                HasSubstr("velkor-config: put: the write was not sent: " + reason() + "\n"));
+    EXPECT_THAT(result.err, HasSubstr("\nvelkor-config: put: etcd refused the write: the write was "
+                                      "not sent: "));
     EXPECT_EQ(result.out, "No configuration option with key: port\n");
 }
 
@@ -249,7 +255,7 @@ TEST(EtcdServer, ThatGoesAwayIsShownUntilItIsBack) {
     EtcdCluster cluster;
     EtcdMember& member = cluster[0];
     member.ctl("put /p/port 80");
-    TerminalSession terminal({"--etcd", member.url() + ",prefix=/p/"});
+    TerminalSession terminal({"--etcd", member.url() + ",wait=20s,prefix=/p/"});
     watchKey(terminal, "port", "'80'");
     member.kill();
     EXPECT_TRUE(terminal.showsAfterPressing("sources\n", "PROBLEM\r\n"));
