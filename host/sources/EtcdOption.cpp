@@ -76,7 +76,7 @@ void readOption(SourceRequest& request, const std::string& text) {
     request.etcd->options.*member = text;
 }
 
-constexpr Setting settingsOfAll[] = {
+constexpr Setting knownSettings[] = {
     {"prefix", "P", [](auto& request, const auto& text) { request.etcd->prefix = text; }, true},
     {"name", "NAME", [](auto& request, const auto& text) { request.name = text; }},
     {"group", "G", [](auto& request, const auto& text) { request.group = text; }, true},
@@ -96,9 +96,9 @@ constexpr Setting settingsOfAll[] = {
 };
 
 const Setting* findSetting(std::string_view name) {
-    const auto* const found = std::find_if(std::begin(settingsOfAll), std::end(settingsOfAll),
+    const auto* const found = std::find_if(std::begin(knownSettings), std::end(knownSettings),
                                            [&](const auto& each) { return each.name == name; });
-    return found == std::end(settingsOfAll) ? nullptr : found;
+    return found == std::end(knownSettings) ? nullptr : found;
 }
 
 std::string_view nameOf(std::string_view part) {
@@ -162,7 +162,9 @@ private:
     void readSetting(const std::string& part) {
         const std::string name(nameOf(part));
         const Setting* const setting = findSetting(name);
-        if (setting == nullptr) throw std::invalid_argument("unknown setting: " + name);
+        if (setting == nullptr) {
+            throw std::invalid_argument("unknown setting: " + name + " (see --help)");
+        }
         if (!given.insert(name).second) throw std::invalid_argument(name + " is given twice");
         const bool hasValue = name.size() != part.size();
         if (hasValue && setting->value.empty()) {
