@@ -68,7 +68,7 @@ std::optional<SourceState> SessionSources::stateOf(const std::string& name) cons
 }
 
 LoadedSources SessionSources::add(const std::vector<SourceRequest>& requests) {
-    const auto loaded = loadSources(*store, requests, limits);
+    auto loaded = loadSources(*store, requests, limits);
     for (const auto& text : loaded.notices) notice(text);
     return loaded;
 }
