@@ -8,12 +8,9 @@ using configuration::SourceState;
 
 namespace {
 
-std::string sinceText(const SourceState& state) {
-    return state.since ? "since " + timeText(*state.since) : "";
-}
-
-void append(std::string& list, const std::string& item) {
-    if (!item.empty()) list += (list.empty() ? "" : ", ") + item;
+void append(std::string& list, const std::string& label, const std::string& text) {
+    if (!list.empty()) list += ", ";
+    list.append(label).append(" ").append(text);
 }
 
 }  // namespace
@@ -25,17 +22,16 @@ std::optional<SourceState> stateOf(const configuration::ConfigurationSource& sou
 
 std::string problemText(const SourceState& state) {
     if (state.isWell) return "";
-    const std::string since = sinceText(state);
-    return since.empty() ? state.lastError : since + ": " + state.lastError;
+    return (state.since ? "since " + timeText(*state.since) + ": " : "") + state.lastError;
 }
 
 std::string standingText(const SourceState& state) {
     if (state.details.empty()) return "";
     std::string text;
-    if (state.isWell) append(text, sinceText(state));
-    for (const auto& [name, detail] : state.details) append(text, name + ' ' + detail);
-    if (state.updated) append(text, "as of " + timeText(*state.updated));
-    if (state.isWell && !state.lastError.empty()) append(text, "last error: " + state.lastError);
+    if (state.isWell && state.since) append(text, "since", timeText(*state.since));
+    for (const auto& [name, detail] : state.details) append(text, name, detail);
+    if (state.updated) append(text, "as of", timeText(*state.updated));
+    if (state.isWell && !state.lastError.empty()) append(text, "last error:", state.lastError);
     return text;
 }
 
