@@ -9,7 +9,9 @@
 #include <utility>
 
 #include "host/BracketGuard.hpp"
+#include "host/CommaList.hpp"
 #include "host/Severities.hpp"
+#include "host/sources/EtcdOption.hpp"
 
 namespace velkor::host {
 
@@ -20,9 +22,13 @@ constexpr const char* description =
     "Commands are read from the terminal or from standard input; 'help' lists them.";
 
 constexpr const char* footer =
-    "Values of later files override those of earlier ones, --env overrides the files, --set the\n"
-    "environment, and what 'set' writes overrides them all, unless an order says otherwise: the\n"
-    "smaller order wins.\n"
+    "Values of later files override those of earlier ones, --etcd overrides the files, --env "
+    "etcd,\n"
+    "--set the environment, and what 'set' writes overrides them all, unless an order says\n"
+    "otherwise: the smaller order wins.\n"
+    "Settings of --etcd are prefix=P, name=NAME, group=G, order=N, writable, compare-and-swap,\n"
+    "ca=FILE, cert=FILE, key=FILE, user=NAME, password-file=FILE, wait=TIME, last-known=FILE and\n"
+    "without-server=fail|last-known|empty.\n"
     "With --env APP_ the variable APP_SERVER__MAX_SIZE is server.max_size.\n"
     "On a terminal, and with --listen, files are read again when they change, unless an option\n"
     "says otherwise.\n"
@@ -57,18 +63,6 @@ constexpr SizeUnit sizeUnits[] = {
 [[noreturn]] void fail(const std::string& option, const std::string& text,
                        const std::string& reason) {
     throw UsageError(option + ' ' + text + ": " + reason);
-}
-
-std::vector<std::string> splitAtCommas(const std::string& text) {
-    std::vector<std::string> parts(1);
-    for (const char byte : text) {
-        if (byte == ',') {
-            parts.emplace_back();
-        } else {
-            parts.back() += byte;
-        }
-    }
-    return parts;
 }
 
 std::optional<std::string> valueOf(std::string_view setting, std::string_view name) {
@@ -106,6 +100,8 @@ public:
         add(files, "FILE", "", "A property file, added as a read-only source.");
         add(sources, "--source", "NAME=PATH[,group=G][,order=N][,writable]",
             "A property file with all that a source has.");
+        add(layersInEtcd, "--etcd", "URL[,URL...][,prefix=P][,SETTING...]",
+            "Add the values below P in etcd, whose members are at the URLs, and follow them.");
         add(environments, "--env", "PREFIX",
             "Add the environment variables that begin with PREFIX.");
         add(assignments, "--set", "KEY=VALUE", "A value in front of files and environment.");
@@ -223,16 +219,19 @@ private:
             ->trigger_on_parse();
     }
 
-    // Files and --source options may be mixed: their order on the command line matters. That of the
-    // environment doesn't.
+    // Files, --source and --etcd options may be mixed: their order on the command line matters.
+    // That of the environment doesn't.
     void collectSources(Options& options) const {
         auto file = files.texts.begin();
         auto source = sources.texts.begin();
+        auto layer = layersInEtcd.texts.begin();
         for (const CLI::Option* option : app.parse_order()) {
             if (option == files.option) {
                 options.sources.push_back(SourceRequest{std::nullopt, unguarded(*file++)});
             } else if (option == sources.option) {
                 options.sources.push_back(parseSource(unguarded(*source++)));
+            } else if (option == layersInEtcd.option) {
+                options.sources.push_back(parseEtcd(unguarded(*layer++)));
             }
         }
         for (const auto& text : environments.texts) {
@@ -243,6 +242,7 @@ private:
     CLI::App app{description, "velkor-config"};
     Repeatable files;
     Repeatable sources;
+    Repeatable layersInEtcd;
     Repeatable environments;
     Repeatable assignments;
     Repeatable states;

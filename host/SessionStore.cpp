@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "configuration/sources/DurableSource.hpp"
 #include "framework/common/TextConversion.hpp"
 #include "host/console/InterruptibleWait.hpp"
 #include "host/console/Interruption.hpp"
@@ -41,8 +42,14 @@ Future<bool> SessionStore::addPropertyFileSource(const std::string& name, const 
 }
 
 void SessionStore::acknowledge() {
-    if (!written.exchange(false) || stateLayer == nullptr) return;
-    resultUnlessInterrupted(stateLayer->committed());
+    if (!written.exchange(false)) return;
+    if (stateLayer != nullptr) resultUnlessInterrupted(stateLayer->committed());
+    for (const auto& description : describeSources().get()) {
+        const auto source = findSource(description.name).get();
+        if (stateLayer != nullptr && source == stateLayer->source()) continue;
+        auto* const durable = dynamic_cast<configuration::DurableSource*>(source.get());
+        if (durable != nullptr) resultUnlessInterrupted(durable->committed());
+    }
 }
 
 }  // namespace velkor::host

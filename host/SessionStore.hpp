@@ -13,8 +13,8 @@ namespace velkor::host {
 /// The store of a session, whose user may lose patience: Ctrl-C ends a command that reads one value
 /// after the other, and property files have a limit, those that messages name as well.
 ///
-/// With a layer that lasts, what was written is to be acknowledged only when it is on disk: see
-/// `acknowledge`.
+/// Where something lasts, what was written is to be acknowledged only when it is on disk, or
+/// another machine has it: see `acknowledge`.
 class SessionStore final : public configuration::ConfigurationImpl {
 public:
     /// The name of the source of the layer that lasts.
@@ -49,8 +49,9 @@ public:
     /// Says that something is being written otherwise than by `set`.
     void noteWrite() noexcept { written = true; }
 
-    /// Waits until all that was written since the last call is on disk; returns at once when
-    /// nothing was, or no layer lasts. Throws the reason when it can't get there, and `Interrupted`
+    /// Waits until all that was written since the last call is where it lasts, on disk or on
+    /// another machine; returns at once when nothing was, or no source is a
+    /// `configuration::DurableSource`. Throws the reason when it can't get there, and `Interrupted`
     /// when Ctrl-C was pressed meanwhile. Not to be called by what runs with the store's mutex
     /// held.
     void acknowledge();

@@ -1,5 +1,7 @@
 #include "host/console/HostCommands.hpp"
 
+#include <algorithm>
+#include <cstddef>
 #include <cstdint>
 #include <iterator>
 #include <utility>
@@ -33,19 +35,32 @@ constexpr const char* sourcesUsage = "[--json]";
 constexpr const char* explainUsage = "KEY [--json]";
 constexpr const char* watchUsage = "KEY [--json]";
 
+/// Adds a column, whose heading stands first, unless it is empty below that.
+void addColumn(std::vector<std::vector<std::string>>& rows, const std::vector<std::string>& cells) {
+    const bool isEmpty =
+        std::all_of(cells.begin() + 1, cells.end(), [](const auto& cell) { return cell.empty(); });
+    if (isEmpty) return;
+    for (std::size_t i = 0; i < rows.size(); ++i) rows[i].push_back(cells[i]);
+}
+
+// The columns of those that are well and have nothing to tell are left out.
 std::string showSources(const Context& context, const Arguments& arguments) {
     const OptionWords given("sources", sourcesUsage, 0, arguments);
-    if (given.has(jsonOption)) {
-        return sourcesJson(context.services.store->describeSources().get(),
-                           context.services.problemOf);
-    }
-    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS", ""}};
-    for (const auto& source : context.services.store->describeSources().get()) {
+    const auto sources = context.services.store->describeSources().get();
+    const auto& stateOf = context.services.stateOf;
+    if (given.has(jsonOption)) return sourcesJson(sources, stateOf);
+    std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS"}};
+    std::vector<std::string> standings{"STATE"};
+    std::vector<std::string> problems{"PROBLEM"};
+    for (const auto& source : sources) {
         rows.push_back({source.name, source.group.empty() ? "-" : source.group,
-                        std::to_string(source.order), source.readOnly ? "read-only" : "writable",
-                        context.services.problemOf(source.name)});
-        if (!rows.back().back().empty()) rows.front().back() = "PROBLEM";
+                        std::to_string(source.order), source.readOnly ? "read-only" : "writable"});
+        const auto state = stateOf(source.name);
+        standings.push_back(state ? standingText(*state) : "");
+        problems.push_back(state ? problemText(*state) : "");
     }
+    addColumn(rows, standings);
+    addColumn(rows, problems);
     return formatTable(rows);
 }
 

@@ -9,6 +9,7 @@
 #include "host/console/CommandRegistration.hpp"
 #include "host/console/Watches.hpp"
 #include "host/sources/SessionSources.hpp"
+#include "host/sources/SourceStates.hpp"
 #include "messages/MessageDispatcher.hpp"
 
 namespace velkor::host {
@@ -19,10 +20,8 @@ struct HostServices {
     std::shared_ptr<Watches> watches;
     std::shared_ptr<const messages::MessageDispatcher> dispatcher;
     std::function<void()> quit;  ///< Ends the session.
-    /// What is the matter with the source of that name; empty when nothing is.
-    std::function<std::string(const std::string& name)> problemOf = [](const auto&) {
-        return std::string();
-    };
+    /// How the source of that name stands; nothing when it doesn't say.
+    StateOfSource stateOf = [](const auto&) { return std::nullopt; };
     std::shared_ptr<SessionSources> sources{};
     /// Shows a value that is watched as JSON.
     Watches::Show showJson = [](const auto&, const auto&) {};
@@ -30,8 +29,8 @@ struct HostServices {
 
 /// Keeps the host's own commands registered while it lives:
 ///
-/// - sources [--json]: a table of all sources in order of precedence, with what is the matter with
-///   them.
+/// - sources [--json]: a table of all sources in order of precedence, with how they stand and what
+///   is the matter with them.
 /// - explain KEY [--json]: a table of the sources that hold KEY in order of precedence, the first
 ///   of which is the effective one.
 /// - watch KEY [--json], unwatch KEY: show the values of KEY as they change, and no longer.

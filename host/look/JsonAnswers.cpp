@@ -2,6 +2,7 @@
 
 #include <Poco/JSON/Array.h>
 
+#include "host/console/TimeText.hpp"
 #include "host/look/JsonLines.hpp"
 #include "messages/JsonText.hpp"
 
@@ -10,8 +11,26 @@ namespace velkor::host {
 using Poco::JSON::Array;
 using Poco::JSON::Object;
 
+namespace {
+
+void addState(Object& row, const configuration::SourceState& state) {
+    const std::string problem = problemText(state);
+    if (!problem.empty()) row.set("problem", problem);
+    Object::Ptr shown = new Object;
+    shown->set("well", state.isWell);
+    if (state.since) shown->set("since", timeText(*state.since));
+    if (state.updated) shown->set("updated", timeText(*state.updated));
+    if (!state.lastError.empty()) shown->set("lastError", state.lastError);
+    Object::Ptr details = new Object;
+    for (const auto& [name, text] : state.details) details->set(name, text);
+    shown->set("details", details);
+    row.set("state", shown);
+}
+
+}  // namespace
+
 std::string sourcesJson(const std::vector<configuration::SourceDescription>& sources,
-                        const std::function<std::string(const std::string& name)>& problemOf) {
+                        const StateOfSource& stateOf) {
     Array::Ptr rows = new Array;
     for (const auto& source : sources) {
         Object::Ptr row = new Object;
@@ -19,8 +38,7 @@ std::string sourcesJson(const std::vector<configuration::SourceDescription>& sou
         row->set("group", source.group);
         row->set("order", source.order);
         row->set("readOnly", source.readOnly);
-        const std::string problem = problemOf(source.name);
-        if (!problem.empty()) row->set("problem", problem);
+        if (const auto state = stateOf(source.name)) addState(*row, *state);
         rows->add(row);
     }
     Object answer;

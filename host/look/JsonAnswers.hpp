@@ -1,21 +1,23 @@
 #pragma once
 
-#include <functional>
 #include <string>
 #include <vector>
 
 #include "configuration/Option.hpp"
 #include "configuration/sources/SourceDescription.hpp"
+#include "host/sources/SourceStates.hpp"
 
 namespace velkor::host {
 
 // Answers of commands as one JSON object on one line. Values are objects of a type and a value as
 // in messages; those of secrets are •••.
 
-/// {"sources":[{"group":...,"name":...,"order":...,"problem":...,"readOnly":...}]}; without the
-/// problem where `problemOf` the name is empty.
+/// {"sources":[{"group":...,"name":...,"order":...,"problem":...,"readOnly":...,"state":{...}}]};
+/// without the problem where there is none, and without the state where `stateOf` gives none. A
+/// state is {"details":{...},"lastError":...,"since":...,"updated":...,"well":...}, without what it
+/// has not.
 std::string sourcesJson(const std::vector<configuration::SourceDescription>& sources,
-                        const std::function<std::string(const std::string& name)>& problemOf);
+                        const StateOfSource& stateOf);
 
 /// {"key":...,"layers":[{"source":...,"value":{...}}]}.
 std::string layersJson(const std::string& key, const std::vector<configuration::Option>& holders,

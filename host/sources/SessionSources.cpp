@@ -8,9 +8,11 @@
 #include "host/SessionStore.hpp"
 #include "host/console/Command.hpp"
 #include "host/console/NearestNames.hpp"
-#include "host/console/TimeText.hpp"
+#include "host/sources/SourceStates.hpp"
 
 namespace velkor::host {
+
+using configuration::SourceState;
 
 namespace {
 
@@ -52,7 +54,6 @@ void SessionSources::unload(const std::string& name) {
         throw CommandError("The session needs its source: " + name);
     }
     store->removeSource(name).get();
-    watchedFiles.erase(name);
 }
 
 std::vector<std::string> SessionSources::names() const {
@@ -61,16 +62,13 @@ std::vector<std::string> SessionSources::names() const {
     return names;
 }
 
-std::string SessionSources::problemOf(const std::string& name) const {
-    const auto file = watchedFiles.find(name);
-    if (file == watchedFiles.end()) return "";
-    const auto problem = file->second->status().problem;
-    return problem ? "since " + timeText(problem->since) + ": " + problem->text : "";
+std::optional<SourceState> SessionSources::stateOf(const std::string& name) const {
+    const auto source = store->findSource(name).get();
+    return source == nullptr ? std::nullopt : host::stateOf(*source);
 }
 
 LoadedSources SessionSources::add(const std::vector<SourceRequest>& requests) {
     auto loaded = loadSources(*store, requests, limits);
-    watchedFiles.merge(loaded.watchedFiles);
     for (const auto& text : loaded.notices) notice(text);
     return loaded;
 }

@@ -2,10 +2,12 @@
 
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
+#include "configuration/sources/MonitoredSource.hpp"
 #include "host/sources/SourceLoader.hpp"
 #include "host/sources/SourceRequest.hpp"
 
@@ -42,8 +44,8 @@ public:
     /// The names of all sources in order of precedence.
     std::vector<std::string> names() const;
 
-    /// What is the matter with the source of that name; empty when nothing is.
-    std::string problemOf(const std::string& name) const;
+    /// How the source of that name stands; nothing when there is none, or it doesn't say.
+    std::optional<configuration::SourceState> stateOf(const std::string& name) const;
 
 private:
     LoadedSources add(const std::vector<SourceRequest>& requests);
@@ -52,7 +54,6 @@ private:
     const SourceLimits limits;
     const Notice notice;
     bool watched = false;
-    LoadedSources::WatchedFiles watchedFiles;
 };
 
 }  // namespace velkor::host

@@ -66,9 +66,18 @@ MadeSource makeEnvironment(const SourceRequest& request, const SourceLimits&) {
         std::make_shared<layers::EnvironmentSource>(layers::EnvironmentNames(request.location))};
 }
 
+std::string etcdName(const SourceRequest&) {
+    return SourceRequest::etcdKind;
+}
+
+MadeSource makeEtcd(const SourceRequest& request, const SourceLimits&) {
+    return {openEtcd(request.etcd.value())};
+}
+
 constexpr SourceKind kinds[] = {
     {SourceRequest::fileKind, stemOfPath, makeFile},
     {"environment", environmentName, makeEnvironment},
+    {SourceRequest::etcdKind, etcdName, makeEtcd},
 };
 
 }  // namespace

@@ -2,12 +2,12 @@
 
 #include <exception>
 #include <new>
-#include <optional>
 #include <set>
 #include <stdexcept>
 
 #include "host/lint/Remarks.hpp"
 #include "host/sources/SourceKinds.hpp"
+#include "host/sources/SourceStates.hpp"
 
 namespace velkor::host {
 
@@ -41,14 +41,19 @@ private:
 void loadSource(configuration::ConfigurationImpl& store, const std::string& name,
                 const SourceRequest& request, const SourceLimits& limits, LoadedSources& loaded) {
     const auto [source, remarks] = sourceKind(request.kind).make(request, limits);
-    const auto file = std::dynamic_pointer_cast<const layers::ReloadingFileSource>(source);
-    const auto problem = file == nullptr ? std::nullopt : file->status().problem;
-    if (problem && request.mustBeReadable) throw std::runtime_error(problem->text);
+    const auto state = stateOf(*source);
+    const bool isIll = state && !state->isWell;
+    if (isIll && request.mustBeReadable) throw std::runtime_error(state->lastError);
     store.addSource(name, request.group, request.order, !request.writable, source).get();
     loaded.names.push_back(name);
-    if (file != nullptr) loaded.watchedFiles.emplace(name, file);
     if (remarks != 0) loaded.notices.push_back(remarksNotice(request.location, remarks));
-    if (problem) loaded.failures.push_back(problem->text);
+    if (!isIll) return;
+    // A server that is away was allowed to be.
+    if (request.isFile()) {
+        loaded.failures.push_back(state->lastError);
+    } else {
+        loaded.notices.push_back(name + " began without its server: " + state->lastError);
+    }
 }
 
 }  // namespace

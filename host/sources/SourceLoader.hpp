@@ -1,25 +1,20 @@
 #pragma once
 
-#include <map>
-#include <memory>
 #include <string>
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "host/sources/SourceRequest.hpp"
-#include "layers/files/ReloadingFileSource.hpp"
 
 namespace velkor::host {
 
 /// What became of requested sources.
 struct LoadedSources {
-    /// Files that are read again when they change, by the names of their sources.
-    using WatchedFiles = std::map<std::string, std::shared_ptr<const layers::ReloadingFileSource>>;
-
     std::vector<std::string> failures{};
-    std::vector<std::string> notices{};  ///< "PATH: N remarks, see check" for files with remarks.
-    std::vector<std::string> names{};    ///< Of the sources that were added.
-    WatchedFiles watchedFiles{};
+    /// "PATH: N remarks, see check" for files with remarks, "NAME began without its server: REASON"
+    /// for layers that did, as they were allowed to.
+    std::vector<std::string> notices{};
+    std::vector<std::string> names{};  ///< Of the sources that were added.
 };
 
 /// Adds the requested sources to `store`, in their order. There is one failure for each that could

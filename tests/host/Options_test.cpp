@@ -152,9 +152,9 @@ TEST(Options, HelpDescribesEveryOption) {
     const std::string help = parseOptions({"--help"}).information;
     for (const char* part :
          {"FILE", "--source NAME=PATH[,group=G][,order=N][,writable]", "--max-file-size SIZE",
-          "--env PREFIX", "--set KEY=VALUE", "--state FILE", "--watch-files", "--no-watch-files",
-          "--check", "-c LINE", "--no-history", "--log CHANNEL=SEVERITIES", "--help", "--version",
-          "Exit status"}) {
+          "--etcd URL[,URL...][,prefix=P][,SETTING...]", "--env PREFIX", "--set KEY=VALUE",
+          "--state FILE", "--watch-files", "--no-watch-files", "--check", "-c LINE", "--no-history",
+          "--log CHANNEL=SEVERITIES", "--help", "--version", "Exit status"}) {
         EXPECT_NE(help.find(part), std::string::npos) << part;
     }
 }

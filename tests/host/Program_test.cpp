@@ -54,6 +54,17 @@ TEST(Program, ListsItsSources) {
               "default   -      2147483647  writable\n");
 }
 
+#if !VELKOR_HAS_ETCD
+TEST(Program, RefusesALayerInEtcdWhereItWasBuiltWithoutThat) {
+    const auto result = runProgram({"--etcd", "http://a:1,prefix=/p/", "-c", "get port"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_EQ(result.err,
+              "velkor-config: --etcd needs velkor::etcd, which this velkor-config was built "
+              "without: http://a:1\n");
+    EXPECT_EQ(result.out, "No configuration option with key: port\n");
+}
+#endif
+
 TEST(Program, HasNoCommandForSettingsWhereThereAreNone) {
     EXPECT_EQ(runProgram({"-c", "settings"}).err, "velkor-config: Unknown command: settings\n");
     EXPECT_EQ(runProgram({"-c", "help"}).out.find("settings"), std::string::npos);

@@ -5,12 +5,15 @@
 #include <atomic>
 #include <csignal>
 #include <exception>
+#include <functional>
 #include <memory>
 #include <stdexcept>
 #include <string>
 #include <thread>
 
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
+#include "configuration/sources/DurableSource.hpp"
+#include "configuration/sources/InMemorySource.hpp"
 #include "host/console/CommandRegistry.hpp"
 #include "host/console/Interruption.hpp"
 #include "host/console/ValueText.hpp"
@@ -88,6 +91,41 @@ TEST_F(SessionStoreTest, AcknowledgesAtOnceWhatDoesNotLast) {
     EXPECT_EQ(store->state(), nullptr);
     store->set("a", 1);
     store->acknowledge();
+}
+
+/// A layer of the session's own that says when another machine has what was written.
+class RemoteSource final : public configuration::InMemorySource,
+                           public configuration::DurableSource {
+public:
+    RemoteSource() : InMemorySource(configuration::ValueMap()) {}
+
+    Future<bool> committed() override {
+        ++asked;
+        return commit();
+    }
+
+    std::function<Future<bool>()> commit = [] { return makeReadyFuture(true); };
+    int asked = 0;
+};
+
+TEST_F(SessionStoreTest, AcknowledgesWhenEachSourceHasWhatWasWritten) {
+    const auto remote = std::make_shared<RemoteSource>();
+    store->addSource("remote", "", 5, false, remote);
+    store->acknowledge();
+    EXPECT_EQ(remote->asked, 0);
+    store->set("a", 1, "remote");
+    store->acknowledge();
+    EXPECT_EQ(remote->asked, 1);
+}
+
+TEST_F(SessionStoreTest, TellsWhyASourceHasNotTakenAWrite) {
+    const auto remote = std::make_shared<RemoteSource>();
+    const auto failure = std::make_exception_ptr(std::runtime_error("permission denied"));
+    remote->commit = [&] { return makeFailedFuture<bool>(failure); };
+    store->addSource("remote", "", 5, false, remote);
+    store->set("a", 1, "remote");
+    EXPECT_EQ(thrownText<std::runtime_error>([this] { store->acknowledge(); }),
+              "permission denied");
 }
 
 class DurableSessionTest : public SessionStoreTest {

@@ -26,6 +26,8 @@ expect() {
 }
 
 expect '--source --set --state' velkor-config --s
+expect '--etcd' velkor-config --et
+expect '' velkor-config --etcd o
 expect '--watch-files' velkor-config one.properties --wa
 expect 'one.properties' velkor-config o
 expect 'one.properties' velkor-config --state o

@@ -2,7 +2,10 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -32,7 +35,10 @@ protected:
                 std::make_shared<Watches>(store, show),
                 nullptr,
                 [this] { quitting = true; },
-                [this](const auto& name) { return name == troubled ? "not now" : ""; },
+                [this](const auto& name) {
+                    const auto state = states.find(name);
+                    return state == states.end() ? std::nullopt : std::optional(state->second);
+                },
                 std::make_shared<SessionSources>(store, SourceLimits{})};
     }
 
@@ -44,7 +50,7 @@ protected:
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     Words shown;
     bool quitting = false;
-    std::string troubled;
+    std::map<std::string, configuration::SourceState> states;
     HostCommands commands{services(), registry};
 };
 
@@ -100,11 +106,41 @@ TEST_F(HostCommandsTest, SourcesListsThemInOrderOfPrecedence) {
 }
 
 TEST_F(HostCommandsTest, SourcesShowsWhatIsTheMatterWithOne) {
-    troubled = "override";
+    states["override"] = {false, std::nullopt, std::nullopt, "not now"};
     EXPECT_EQ(run("sources"),
               "NAME      GROUP  ORDER       ACCESS    PROBLEM\n"
               "override  -      0           writable  not now\n"
               "default   -      2147483647  writable\n");
+}
+
+TEST_F(HostCommandsTest, SourcesShowsTheDetailsOfOneThatIsWell) {
+    states["default"].details = {{"endpoint", "http://a"}, {"revision", "7"}};
+    EXPECT_EQ(run("sources"),
+              "NAME      GROUP  ORDER       ACCESS    STATE\n"
+              "override  -      0           writable\n"
+              "default   -      2147483647  writable  endpoint http://a, revision 7\n");
+}
+
+TEST_F(HostCommandsTest, SourcesShowsDetailsBesideWhatIsTheMatter) {
+    states["override"] = {false, std::nullopt, std::nullopt, "not now"};
+    states["default"].details = {{"revision", "7"}};
+    EXPECT_EQ(run("sources"),
+              "NAME      GROUP  ORDER       ACCESS    STATE       PROBLEM\n"
+              "override  -      0           writable              not now\n"
+              "default   -      2147483647  writable  revision 7\n");
+}
+
+TEST_F(HostCommandsTest, SourcesShowsStatesAsJson) {
+    const configuration::SourceState::Time time(std::chrono::seconds(1'000'000'000));
+    states["override"] = {false, time, time, "not now", {{"revision", "7"}}};
+    states["default"] = {};
+    EXPECT_EQ(run("sources", {"--json"}),
+              R"({"sources":[{"group":"","name":"override","order":0,)"
+              R"("problem":"since 2001-09-09T01:46:40Z: not now","readOnly":false,"state":)"
+              R"({"details":{"revision":"7"},"lastError":"not now",)"
+              R"("since":"2001-09-09T01:46:40Z","updated":"2001-09-09T01:46:40Z","well":false}},)"
+              R"({"group":"","name":"default","order":2147483647,"readOnly":false,)"
+              R"("state":{"details":{},"well":true}}]})");
 }
 
 TEST_F(HostCommandsTest, LoadAndUnloadAddAndRemoveASource) {

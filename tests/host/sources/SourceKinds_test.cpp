@@ -49,6 +49,18 @@ TEST(SourceKinds, EnvironmentIsCalledSo) {
     EXPECT_EQ(sourceKind("environment").usualName(requestFor("A_")), "environment");
 }
 
+TEST(SourceKinds, EtcdIsCalledSo) {
+    EXPECT_EQ(sourceKind("etcd").usualName(requestFor("http://a")), "etcd");
+}
+
+TEST(SourceKinds, EtcdThatCanNotBeFollowedNamesTheEndpoint) {
+    SourceRequest request = requestFor("http://a:b");
+    request.etcd = EtcdRequest{{request.location}};
+    const std::string text =
+        thrownText<std::runtime_error>([&] { sourceKind("etcd").make(request, {}); });
+    EXPECT_NE(text.find("http://a:b"), std::string::npos) << text;
+}
+
 TEST(SourceKinds, OthersAreRefused) {
     EXPECT_EQ(thrownText<std::invalid_argument>([] { sourceKind("fil"); }),
               "Unknown kind of source: fil");
