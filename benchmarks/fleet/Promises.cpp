@@ -67,7 +67,8 @@ void Comparison::compare(const HostProcess& host, const History& history) {
     }
 }
 
-// A process shows its own writes before they are made, and some never are.
+// A process shows its own writes before they are made, and some never are: then the value before
+// comes again.
 void Comparison::onShown(const HostProcess& host, const Note& note, const History& history,
                          std::map<int, std::size_t>& newest) {
     if (writerOf(note.value) == host.number()) return;
@@ -75,7 +76,7 @@ void Comparison::onShown(const HostProcess& host, const Note& note, const Histor
     if (!place) return invented.broken.push_back(text(host, note));
     const auto [entry, isFirst] = newest.try_emplace(note.key, *place);
     if (isFirst) return;
-    if (*place <= entry->second) backwards.broken.push_back(text(host, note));
+    if (*place < entry->second) backwards.broken.push_back(text(host, note));
     entry->second = *place;
 }
 
