@@ -26,7 +26,7 @@ TakenWrites writesBetween(const HostProcesses& hosts, FleetClock::time_point beg
 struct Delays {
     std::vector<double> sinceSent{};
     std::vector<double> sinceTaken{};  ///< Less than 0: seen before the writer knew.
-    std::size_t unseen = 0;            ///< Replaced by a later one before anybody looked.
+    std::size_t unseen = 0;            ///< By a setting: replaced by a later one before.
 
     void add(const Delays& more);
 };

@@ -86,7 +86,7 @@ void printDelays(const char* phase, const Simulation& simulation, Simulation::Ti
     printDelay("since it was acknowledged", ours.sinceTaken, engines.sinceTaken);
     std::printf("  until it was acknowledged   %8.2f / %.2f\n", milliseconds(writing, 0.5),
                 milliseconds(writing, 0.99));
-    std::printf("  replaced before seen        %8zu of %zu %8zu of %zu\n", ours.unseen,
+    std::printf("  never seen                  %8zu of %-8zu %8zu of %zu\n", ours.unseen,
                 ours.sinceSent.size() + ours.unseen, engines.unseen,
                 engines.sinceSent.size() + engines.unseen);
 }
