@@ -93,7 +93,8 @@ public:
     Future<bool> addSource(const std::string& name, const std::string& group, int order,
                            bool readOnly, std::shared_ptr<ConfigurationSource> source);
 
-    /// All sources in order of precedence.
+    /// All sources in order of precedence, with the states of those that tell theirs. What a
+    /// source's `state` throws passes on; it runs with no mutex held.
     Future<std::vector<SourceDescription>> describeSources();
 
     /// The source that is registered under `name`; null when there is none. Its groups and order

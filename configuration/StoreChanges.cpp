@@ -57,8 +57,11 @@ std::vector<std::string> unique(const std::vector<std::string>& keys) {
 }  // namespace
 
 Future<std::vector<SourceDescription>> ConfigurationImpl::describeSources() {
-    const Operation operation(*this);
-    return makeReadyFuture(sources.describe());
+    const auto layers = [this] {
+        const Operation operation(*this);
+        return sources.list();
+    }();
+    return makeReadyFuture(detail::SourceRegistry::describe(*layers));
 }
 
 Future<std::shared_ptr<ConfigurationSource>> ConfigurationImpl::findSource(

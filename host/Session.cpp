@@ -65,7 +65,6 @@ Session::~Session() {
 HostServices Session::services() {
     HostServices services{store, watches, service.dispatcherFor(messages::allRequestTypes()),
                           [this] { console.quit(); }};
-    services.stateOf = [sources = sources](const auto& name) { return sources->stateOf(name); };
     services.sources = sources;
     services.showJson = showValue(watchedJson);
     return services;

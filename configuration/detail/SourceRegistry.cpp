@@ -30,6 +30,7 @@ RegisteredSource::RegisteredSource(ConfigurationSourceMap entry)
       table(nullptr),
       texts(nullptr),
       forgetting(dynamic_cast<ForgettingSource*>(source.get())),
+      monitored(dynamic_cast<const MonitoredSource*>(source.get())),
       grouping(dynamic_cast<GroupingSource*>(source.get())),
       attached(dynamic_cast<AttachedSource*>(source.get())),
       foreign(true) {
@@ -114,11 +115,12 @@ Layer SourceRegistry::nextHolder(const SourcePtr* from, const SourcePtr* end,
     return {};
 }
 
-std::vector<SourceDescription> SourceRegistry::describe() const {
+std::vector<SourceDescription> SourceRegistry::describe(const SourceList& sources) {
     std::vector<SourceDescription> all;
-    all.reserve(current->size());
-    for (const auto& entry : *current) {
+    all.reserve(sources.size());
+    for (const auto& entry : sources) {
         all.push_back({entry->name, entry->group, entry->order, entry->readOnly});
+        if (entry->monitored != nullptr) all.back().state = entry->monitored->state();
     }
     return all;
 }

@@ -12,6 +12,7 @@
 #include "configuration/sources/ConfigurationSourceMap.hpp"
 #include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/GroupingSource.hpp"
+#include "configuration/sources/MonitoredSource.hpp"
 #include "configuration/sources/SourceDescription.hpp"
 #include "configuration/sources/TextTable.hpp"
 #include "configuration/sources/ValueTable.hpp"
@@ -34,13 +35,14 @@ struct RegisteredSource : ConfigurationSourceMap {
                                  std::memcmp(key.data(), group.data(), group.size()) == 0);
     }
 
-    const ValueTable* table;       ///< What it answers from; null: not from such a table.
-    const TextTable* texts;        ///< The same for texts. Neither: the source itself is asked.
-    ForgettingSource* forgetting;  ///< The source, if keys can be taken out of it; else null.
-    GroupingSource* grouping;      ///< The source, if it makes several writes as one; else null.
-    AttachedSource* attached;      ///< The source, if it is told of its registration; else null.
-    bool foreign;                  ///< It is not of one of this library's own classes.
-    bool reportsChanges = false;   ///< The store's listener is installed.
+    const ValueTable* table;           ///< What it answers from; null: not from such a table.
+    const TextTable* texts;            ///< The same for texts. Neither: the source itself is asked.
+    ForgettingSource* forgetting;      ///< The source, if keys can be taken out of it; else null.
+    const MonitoredSource* monitored;  ///< The source, if it says how it stands; else null.
+    GroupingSource* grouping;     ///< The source, if it makes several writes as one; else null.
+    AttachedSource* attached;     ///< The source, if it is told of its registration; else null.
+    bool foreign;                 ///< It is not of one of this library's own classes.
+    bool reportsChanges = false;  ///< The store's listener is installed.
 };
 
 /// The layer that decides a key, the key as its source knows it, and the value if it stands in a
@@ -104,8 +106,9 @@ public:
     /// Every layer that holds `key`, in order of precedence.
     std::vector<Option> holders(const std::string& key);
 
-    /// How the sources are registered, in order of precedence.
-    std::vector<SourceDescription> describe() const;
+    /// How `sources` are registered and stand, in order of precedence. Asks them: to be called
+    /// without the store's mutex.
+    static std::vector<SourceDescription> describe(const SourceList& sources);
 
     /// All keys of all sources, with their groups.
     std::set<std::string> keys() const;

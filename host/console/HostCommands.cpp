@@ -14,6 +14,7 @@
 #include "host/console/Table.hpp"
 #include "host/console/ValueText.hpp"
 #include "host/look/JsonAnswers.hpp"
+#include "host/sources/SourceStates.hpp"
 #include "settings/Secrets.hpp"
 
 namespace velkor::host {
@@ -47,17 +48,15 @@ void addColumn(std::vector<std::vector<std::string>>& rows, const std::vector<st
 std::string showSources(const Context& context, const Arguments& arguments) {
     const OptionWords given("sources", sourcesUsage, 0, arguments);
     const auto sources = context.services.store->describeSources().get();
-    const auto& stateOf = context.services.stateOf;
-    if (given.has(jsonOption)) return sourcesJson(sources, stateOf);
+    if (given.has(jsonOption)) return sourcesJson(sources);
     std::vector<std::vector<std::string>> rows{{"NAME", "GROUP", "ORDER", "ACCESS"}};
     std::vector<std::string> standings{"STATE"};
     std::vector<std::string> problems{"PROBLEM"};
     for (const auto& source : sources) {
         rows.push_back({source.name, source.group.empty() ? "-" : source.group,
                         std::to_string(source.order), source.readOnly ? "read-only" : "writable"});
-        const auto state = stateOf(source.name);
-        standings.push_back(state ? standingText(*state) : "");
-        problems.push_back(state ? problemText(*state) : "");
+        standings.push_back(source.state ? standingText(*source.state) : "");
+        problems.push_back(source.state ? problemText(*source.state) : "");
     }
     addColumn(rows, standings);
     addColumn(rows, problems);

@@ -9,7 +9,6 @@
 #include "host/console/CommandRegistration.hpp"
 #include "host/console/Watches.hpp"
 #include "host/sources/SessionSources.hpp"
-#include "host/sources/SourceStates.hpp"
 #include "messages/MessageDispatcher.hpp"
 
 namespace velkor::host {
@@ -20,8 +19,6 @@ struct HostServices {
     std::shared_ptr<Watches> watches;
     std::shared_ptr<const messages::MessageDispatcher> dispatcher;
     std::function<void()> quit;  ///< Ends the session.
-    /// How the source of that name stands; nothing when it doesn't say.
-    StateOfSource stateOf = [](const auto&) { return std::nullopt; };
     std::shared_ptr<SessionSources> sources{};
     /// Shows a value that is watched as JSON.
     Watches::Show showJson = [](const auto&, const auto&) {};

@@ -29,8 +29,7 @@ void addState(Object& row, const configuration::SourceState& state) {
 
 }  // namespace
 
-std::string sourcesJson(const std::vector<configuration::SourceDescription>& sources,
-                        const StateOfSource& stateOf) {
+std::string sourcesJson(const std::vector<configuration::SourceDescription>& sources) {
     Array::Ptr rows = new Array;
     for (const auto& source : sources) {
         Object::Ptr row = new Object;
@@ -38,7 +37,7 @@ std::string sourcesJson(const std::vector<configuration::SourceDescription>& sou
         row->set("group", source.group);
         row->set("order", source.order);
         row->set("readOnly", source.readOnly);
-        if (const auto state = stateOf(source.name)) addState(*row, *state);
+        if (source.state) addState(*row, *source.state);
         rows->add(row);
     }
     Object answer;

@@ -5,7 +5,6 @@
 
 #include "configuration/Option.hpp"
 #include "configuration/sources/SourceDescription.hpp"
-#include "host/sources/SourceStates.hpp"
 
 namespace velkor::host {
 
@@ -13,11 +12,10 @@ namespace velkor::host {
 // in messages; those of secrets are •••.
 
 /// {"sources":[{"group":...,"name":...,"order":...,"problem":...,"readOnly":...,"state":{...}}]};
-/// without the problem where there is none, and without the state where `stateOf` gives none. A
+/// without the problem where there is none, and without the state of a source that tells none. A
 /// state is {"details":{...},"lastError":...,"since":...,"updated":...,"well":...}, without what it
 /// has not.
-std::string sourcesJson(const std::vector<configuration::SourceDescription>& sources,
-                        const StateOfSource& stateOf);
+std::string sourcesJson(const std::vector<configuration::SourceDescription>& sources);
 
 /// {"key":...,"layers":[{"source":...,"value":{...}}]}.
 std::string layersJson(const std::string& key, const std::vector<configuration::Option>& holders,

@@ -8,11 +8,8 @@
 #include "host/SessionStore.hpp"
 #include "host/console/Command.hpp"
 #include "host/console/NearestNames.hpp"
-#include "host/sources/SourceStates.hpp"
 
 namespace velkor::host {
-
-using configuration::SourceState;
 
 namespace {
 
@@ -60,11 +57,6 @@ std::vector<std::string> SessionSources::names() const {
     std::vector<std::string> names;
     for (const auto& source : store->describeSources().get()) names.push_back(source.name);
     return names;
-}
-
-std::optional<SourceState> SessionSources::stateOf(const std::string& name) const {
-    const auto source = store->findSource(name).get();
-    return source == nullptr ? std::nullopt : host::stateOf(*source);
 }
 
 LoadedSources SessionSources::add(const std::vector<SourceRequest>& requests) {

@@ -7,7 +7,6 @@
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
-#include "configuration/sources/MonitoredSource.hpp"
 #include "host/sources/SourceLoader.hpp"
 #include "host/sources/SourceRequest.hpp"
 
@@ -43,9 +42,6 @@ public:
 
     /// The names of all sources in order of precedence.
     std::vector<std::string> names() const;
-
-    /// How the source of that name stands; nothing when there is none, or it doesn't say.
-    std::optional<configuration::SourceState> stateOf(const std::string& name) const;
 
 private:
     LoadedSources add(const std::vector<SourceRequest>& requests);

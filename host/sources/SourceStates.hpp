@@ -1,6 +1,5 @@
 #pragma once
 
-#include <functional>
 #include <optional>
 #include <string>
 
@@ -8,10 +7,6 @@
 #include "configuration/sources/MonitoredSource.hpp"
 
 namespace velkor::host {
-
-/// How the source of a name stands; nothing when it doesn't say.
-using StateOfSource =
-    std::function<std::optional<configuration::SourceState>(const std::string& name)>;
 
 /// How `source` stands; nothing when it doesn't say.
 std::optional<configuration::SourceState> stateOf(const configuration::ConfigurationSource& source);

@@ -55,6 +55,36 @@ TEST_F(SourceRegistry, DescribesWhatWasAdded) {
     EXPECT_TRUE(sources[0].readOnly);
 }
 
+/// Says how it stands, and for that looks at its store from another thread.
+class ToldSource final : public InMemorySource, public MonitoredSource {
+public:
+    explicit ToldSource(std::weak_ptr<ConfigurationImpl> watched)
+        : InMemorySource(ValueMap()), store(std::move(watched)) {}
+
+    SourceState state() const override {
+        std::thread([this] { store.lock()->has("key").get(); }).join();
+        SourceState told;
+        told.isWell = false;
+        told.lastError = "away";
+        return told;
+    }
+
+private:
+    const std::weak_ptr<ConfigurationImpl> store;
+};
+
+TEST_F(SourceRegistry, DescribesHowASourceStandsWithoutTheLockOfTheStore) {
+    store->addSource("told", "", -1, true, std::make_shared<ToldSource>(store)).get();
+    const auto sources = store->describeSources().get();
+    ASSERT_TRUE(sources[0].state.has_value());
+    EXPECT_FALSE(sources[0].state->isWell);
+    EXPECT_EQ(sources[0].state->lastError, "away");
+}
+
+TEST_F(SourceRegistry, DescribesNoStateOfASourceThatTellsNone) {
+    EXPECT_FALSE(store->describeSources().get()[0].state.has_value());
+}
+
 TEST_F(SourceRegistry, OrderFiveStandsBetweenOverrideAndDefault) {
     add("five", "", 5, {});
     EXPECT_THAT(names(), ElementsAre("override", "five", "default"));

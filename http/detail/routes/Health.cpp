@@ -3,36 +3,32 @@
 #include <array>
 #include <utility>
 
-#include "configuration/sources/MonitoredSource.hpp"
+#include "configuration/sources/SourceDescription.hpp"
 #include "http/detail/routes/Layers.hpp"
 
 namespace velkor::http::detail {
 
 namespace {
 
-using configuration::ConfigurationSource;
-using configuration::MonitoredSource;
 using configuration::SourceDescription;
 
 Response plainText(int status, std::string&& text) {
     return {status, "text/plain; charset=utf-8", std::move(text), {}};
 }
 
-bool isWell(const ConfigurationSource& source) {
-    const auto* const monitored = dynamic_cast<const MonitoredSource*>(&source);
-    return monitored == nullptr || monitored->state().isWell;
+bool isWell(const SourceDescription& layer) {
+    return !layer.state || layer.state->isWell;
 }
 
 // The layers, with 1 for those that are well.
 void writeLayers(const Context& context, std::string& out) {
-    std::size_t count = 0;
     std::string states;
-    forEachSource(context, [&](const SourceDescription& layer, ConfigurationSource& source) {
-        ++count;
+    const auto layers = context.store->describeSources().get();
+    for (const auto& layer : layers) {
         states.append("velkor_layer_well{layer=\"").append(labelText(layer.name)).append("\"} ");
-        states.append(isWell(source) ? "1\n" : "0\n");
-    });
-    writeMetric(out, "velkor_layers", "gauge", "Layers of the store.", count);
+        states.append(isWell(layer) ? "1\n" : "0\n");
+    }
+    writeMetric(out, "velkor_layers", "gauge", "Layers of the store.", layers.size());
     writeMetricHead(out, "velkor_layer_well", "gauge", "Whether a layer is well.");
     out.append(states);
 }
@@ -98,9 +94,9 @@ Response alive(const Context&, const Call&) {
 
 Response ready(const Context& context, const Call& call) {
     std::string names;
-    forEachSource(context, [&](const SourceDescription& layer, ConfigurationSource& source) {
-        if (!isWell(source)) names += (names.empty() ? "" : ", ") + layer.name;
-    });
+    for (const auto& layer : context.store->describeSources().get()) {
+        if (!isWell(layer)) names += (names.empty() ? "" : ", ") + layer.name;
+    }
     if (names.empty()) return plainText(200, "ready\n");
     const bool mayKnow = call.visitor.right >= Right::read;
     Response response = plainText(503, mayKnow ? "not ready: " + names + "\n" : "not ready\n");

@@ -6,7 +6,6 @@
 
 #include "configuration/sources/ForgettingSource.hpp"
 #include "configuration/sources/JournaledSource.hpp"
-#include "configuration/sources/MonitoredSource.hpp"
 #include "http/detail/routes/Items.hpp"
 #include "http/detail/routes/JsonWriter.hpp"
 #include "http/detail/routes/Prefix.hpp"
@@ -20,7 +19,6 @@ namespace {
 using configuration::ConfigurationSource;
 using configuration::ForgettingSource;
 using configuration::JournaledSource;
-using configuration::MonitoredSource;
 using configuration::RecordedChange;
 using configuration::SourceDescription;
 using configuration::SourceState;
@@ -50,9 +48,7 @@ void writeSource(JsonWriter& json, const SourceDescription& description,
     json.name("order").number(description.order).member("readOnly", description.readOnly);
     json.member("canForget", can<ForgettingSource>(source));
     json.member("journal", can<JournaledSource>(source));
-    if (const auto* const monitored = dynamic_cast<MonitoredSource*>(&source)) {
-        writeState(json, monitored->state());
-    }
+    if (description.state) writeState(json, *description.state);
     json.endObject();
 }
 
