@@ -184,15 +184,12 @@ void Outbox::noteRefusal(const Group& group, const std::exception_ptr& refused) 
 }
 
 void Outbox::refuseAll(std::exception_ptr reason) noexcept {
-    for (;;) {
-        bool isLast = false;
-        {
-            const MutexLock lock(mutex);
-            if (groups.empty()) return;
-            isLast = groups.size() == 1;
-        }
-        finish(isLast ? std::move(reason) : reason);
-    }
+    const auto groupsLeft = [this] {
+        const MutexLock lock(mutex);
+        return groups.size();
+    };
+    while (groupsLeft() > 1) finish(reason);
+    if (groupsLeft() > 0) finish(std::move(reason));
 }
 
 }  // namespace velkor::layers::etcd

@@ -39,7 +39,9 @@ protected:
 };
 
 TEST_F(EtcdThreeMembers, GoOnWithoutTheirLeader) {
-    FleetProcess writer(cluster.urls(), "p/", patientWriter());
+    EtcdOptions options = patientWriter();
+    options.writeWithin = std::chrono::seconds(3);
+    FleetProcess writer(cluster.urls(), "p/", options);
     FleetProcess reader(cluster.urls(), "p/", patientWriter());
     const std::size_t leader = cluster.leader();
     writer.store->set("a", 1);

@@ -35,7 +35,8 @@ using ::testing::UnorderedElementsAre;
 EtcdOptions quick() {
     EtcdOptions options;
     options.writeWithin = patience;
-    options.longestPause = std::chrono::milliseconds(400);
+    options.shortestPause = std::chrono::milliseconds(10);
+    options.longestPause = std::chrono::milliseconds(100);
     return options;
 }
 
