@@ -19,12 +19,15 @@ using etcd::Outbox;
 
 namespace {
 
-/// What one of the source's threads does: `work`, which refers to `core`, until the source ends.
-template <class Work>
-auto threadFunction(std::shared_ptr<Core> core, etcd::Running Core::*running, Work work) {
-    return [core = std::move(core), running, work = std::move(work)]() mutable {
+/// What one of the source's threads does: `job`, which refers to `core`, until the source ends. All
+/// that it needs to begin is there.
+template <class Job>
+auto threadFunction(std::shared_ptr<Core> core, etcd::Running Core::*running,
+                    std::unique_ptr<Job> job) {
+    return [core = std::move(core), running, job = std::move(job)]() mutable {
         (*core.*running).begin();
-        work(core);
+        job->run();
+        job.reset();
         const bool isAlone = (*core.*running).isAlone();
         core.reset();
         if (isAlone) detail::Endings::ofAll().remove();
@@ -60,14 +63,10 @@ EtcdSource::~EtcdSource() {
 void EtcdSource::start() {
     const auto firstValues = std::make_shared<etcd::Start>();
     reader.emplace(
-        threadFunction(core, &Core::reading, [firstValues](const std::shared_ptr<Core>& shared) {
-            etcd::Follower(shared, firstValues).run();
-        }));
+        threadFunction(core, &Core::reading, std::make_unique<etcd::Follower>(core, firstValues)));
     const std::string problem = firstValues->await();
     if (!problem.empty()) throw std::runtime_error(etcd_errors::notStarted + problem);
-    writer.emplace(threadFunction(core, &Core::writing, [](const std::shared_ptr<Core>& shared) {
-        etcd::Sender(shared).run();
-    }));
+    writer.emplace(threadFunction(core, &Core::writing, std::make_unique<etcd::Sender>(core)));
 }
 
 void EtcdSource::finish() {

@@ -37,8 +37,10 @@ struct Core;
 /// `apply` of the store changes together as one transaction. Whoever acknowledges a write waits for
 /// `committed`: the server has it then. A write that the server refuses is taken back, and watchers
 /// are told. One that isn't answered is of unknown outcome, and `committed` says so; the source
-/// never sends it again, asks the server what it holds until it is answered, and shows that.
-/// Writes are made one after the other.
+/// never sends it again, asks the server what it holds until it is answered, and shows that. Should
+/// the server make it later all the same, it undoes no write that came meanwhile, and no removal
+/// unless the key was new or one of more than 64 that were changed together. Writes are made one
+/// after the other.
 ///
 /// Two threads and, once something is written, two connections. Thread-safe. Nobody waits for
 /// `committed` with the mutex of the store held or on a thread of the source, which includes all

@@ -1,5 +1,7 @@
 #include "layers/etcd/detail/Answers.hpp"
 
+#include <cstddef>
+#include <limits>
 #include <optional>
 #include <utility>
 
@@ -10,6 +12,9 @@
 namespace velkor::layers::etcd {
 
 namespace {
+
+/// The texts of the engine are shorter.
+constexpr std::size_t longestReason = 1000;
 
 std::string readBytes(JsonReader& reader) {
     auto bytes = fromBase64(reader.plainText());
@@ -122,6 +127,18 @@ ErrorAnswer readError(JsonReader& reader) {
     return error;
 }
 
+// Any server answers something.
+void requireCluster(const Header& header) {
+    const bool isRevision =
+        header.revision > 0 && header.revision < std::numeric_limits<std::int64_t>::max();
+    if (header.cluster.empty() || !isRevision) throw BadJson("JSON answer is of no cluster");
+}
+
+void requirePast(const KeyValue& entry, const Header& header) {
+    if (entry.modified > 0 && entry.modified <= header.revision) return;
+    throw BadJson("JSON revision makes no sense");
+}
+
 /// Reads one text as a whole.
 template <class Read>
 auto readWhole(std::string_view text, Read read) {
@@ -134,11 +151,14 @@ auto readWhole(std::string_view text, Read read) {
 }  // namespace
 
 RangeAnswer readRange(std::string_view text) {
-    return readWhole(text, [](JsonReader& reader) { return readRange(reader); });
+    auto answer = readWhole(text, [](JsonReader& reader) { return readRange(reader); });
+    requireCluster(answer.header);
+    for (const KeyValue& entry : answer.entries) requirePast(entry, answer.header);
+    return answer;
 }
 
 TransactionAnswer readTransaction(std::string_view text) {
-    return readWhole(text, [](JsonReader& reader) {
+    auto whole = readWhole(text, [](JsonReader& reader) {
         TransactionAnswer answer;
         reader.object([&](std::string_view name) {
             if (name == "header") {
@@ -153,6 +173,8 @@ TransactionAnswer readTransaction(std::string_view text) {
         });
         return answer;
     });
+    requireCluster(whole.header);
+    return whole;
 }
 
 std::string readToken(std::string_view text) {
@@ -184,13 +206,16 @@ WatchAnswer readWatch(std::string_view text) {
         });
         if (error) throw Refused(error->code, error->message);
         if (!answer) throw BadJson("JSON text is no change");
+        for (const Event& event : answer->events) requirePast(event.entry, answer->header);
         return std::move(*answer);
     });
 }
 
 ErrorAnswer readError(std::string_view text) {
     try {
-        return readWhole(text, [](JsonReader& reader) { return readError(reader); });
+        auto error = readWhole(text, [](JsonReader& reader) { return readError(reader); });
+        if (error.message.size() > longestReason) error.message.clear();
+        return error;
     } catch (const BadJson&) {
         return {};
     }

@@ -1,20 +1,22 @@
 #include "layers/etcd/detail/Core.hpp"
 
-#include "layers/etcd/Loggers.hpp"
 #include "layers/etcd/detail/GatewayErrors.hpp"
 
 namespace velkor::layers::etcd {
 
 void Core::change(const Mutation& mutation) const {
-    if (!changeTable(mutation)) throw Stopped();
-}
-
-void report(common::Severity severity, const std::string& text) noexcept {
+    bool isMade = false;
+    bool hasTable = true;
     try {
-        etcdLogger.write(severity, text);
+        hasTable = changeTable([&](configuration::ValueTable& table) {
+            auto changed = mutation(table);
+            isMade = true;
+            return changed;
+        });
     } catch (...) {
-        return;
+        if (!isMade) throw;
     }
+    if (!hasTable) throw Stopped();
 }
 
 }  // namespace velkor::layers::etcd

@@ -10,6 +10,7 @@
 #include "configuration/sources/ValueTable.hpp"
 #include "framework/common/DiagnosticLogger.hpp"
 #include "layers/etcd/EtcdOptions.hpp"
+#include "layers/etcd/Loggers.hpp"
 #include "layers/etcd/detail/Endpoint.hpp"
 #include "layers/etcd/detail/Outbox.hpp"
 #include "layers/etcd/detail/Replica.hpp"
@@ -32,7 +33,8 @@ struct Core {
         options.silence = std::max(options.silence, std::chrono::milliseconds(100));
     }
 
-    /// Changes the table. Throws `Stopped` when the source has gone.
+    /// Changes the table. What watchers throw is their affair and dropped. Throws what `mutation`
+    /// throws, and `Stopped` when the source has gone.
     void change(const Mutation& mutation) const;
 
     const std::vector<Endpoint> endpoints;
@@ -47,7 +49,15 @@ struct Core {
     Running writing;
 };
 
-/// Writes a record that is no matter of life and death: what a sink of the log throws is dropped.
-void report(common::Severity severity, const std::string& text) noexcept;
+/// Writes a record of `parts` that is no matter of life and death: what a sink of the log throws is
+/// dropped.
+template <class... Parts>
+void report(common::Severity severity, const Parts&... parts) noexcept {
+    try {
+        etcdLogger.write(severity, parts...);
+    } catch (...) {
+        return;
+    }
+}
 
 }  // namespace velkor::layers::etcd

@@ -34,9 +34,9 @@ std::string Start::await() {
     return *outcome;
 }
 
-void Start::finish(const std::string& problem) {
+void Start::finish(std::string&& problem) noexcept {
     const MutexLock lock(mutex);
-    if (!outcome) outcome = problem;
+    if (!outcome) outcome = std::move(problem);
     finished.notify_all();
 }
 
@@ -51,22 +51,29 @@ void Follower::run() {
     try {
         for (;;) {
             if (!hasStarted && Clock::now() >= startDeadline) startWithout();
-            try {
-                follow();
-            } catch (const Compacted&) {
-                report(common::warning, "etcd keeps the next changes no more: all keys are read");
-                mustReadAll = true;
-            } catch (const Stopped&) {
-                throw;
-            } catch (const std::exception& error) {
-                onLost(endpoints.current().text + ": " + error.what());
-                endpoints.next();
-            }
+            attempt();
             pause();
         }
-    } catch (const std::exception& end) {
+    } catch (const std::exception&) {
         if (saveDue) save();
-        start->finish(lastProblem.empty() ? end.what() : lastProblem);
+        // Nobody ends a source that has not started: without a problem there was no memory for one.
+        if (lastProblem.empty()) lastProblem = "out of memory";
+        start->finish(std::move(lastProblem));
+    }
+}
+
+// Until the source ends there is always a next one.
+void Follower::attempt() {
+    try {
+        follow();
+    } catch (const Compacted&) {
+        report(common::warning, "etcd keeps the next changes no more: all keys are read");
+        mustReadAll = true;
+    } catch (const Stopped&) {
+        throw;
+    } catch (const std::exception& error) {
+        onLost(error.what());
+        endpoints.next();
     }
 }
 
@@ -118,9 +125,8 @@ void Follower::readAll(Gateway& gateway) {
     const bool beginsAnew = hasValues && (isOtherHistory || read.cluster != position.cluster ||
                                           read.revision < position.revision);
     if (beginsAnew) {
-        report(common::warning, "etcd has another history: revision " +
-                                    std::to_string(position.revision) + " is followed by " +
-                                    std::to_string(read.revision));
+        report(common::warning, "etcd has another history: revision ", position.revision,
+               " is followed by ", read.revision);
     }
     core->change([&](ValueTable& table) {
         return core->replica.replaceAll(table, std::move(values), read.revision, beginsAnew);
@@ -136,9 +142,8 @@ void Follower::receive(Gateway& gateway) {
     const auto began = Clock::now();
     WatchStream stream(gateway, core->prefix, position.revision + 1, began + silence);
     if (core->standing.noteConnected(endpoints.current().text)) {
-        report(lastProblem.empty() ? common::debug : common::warning,
-               "etcd is followed at " + endpoints.current().text + " from revision " +
-                   std::to_string(position.revision));
+        report(lastProblem.empty() ? common::debug : common::warning, "etcd is followed at ",
+               endpoints.current().text, " from revision ", position.revision);
     }
     lastProblem.clear();
     hasStarted = true;
@@ -195,17 +200,12 @@ void Follower::onRevision(std::vector<Event>& events, std::size_t begin, std::si
         if (!events[i].isRemoval) update.value = fromValueText(events[i].entry.value);
         updates.push_back(std::move(update));
     }
-    try {
-        core->change([&](ValueTable& table) {
-            return core->replica.update(table, std::move(updates), revision);
-        });
-    } catch (const std::bad_alloc&) {
-        mustReadAll = true;
-        throw;
-    }
-    const Event& last = events[end - 1];
+    Event& last = events[end - 1];
+    core->change([&](ValueTable& table) {
+        return core->replica.update(table, std::move(updates), revision);
+    });
     position.revision = revision;
-    position.witness = last.entry.key;
+    position.witness = std::move(last.entry.key);
     position.witnessModified = last.isRemoval ? 0 : revision;
     noteChanged();
 }
@@ -216,12 +216,26 @@ std::optional<std::string> Follower::ownKey(const std::string& key) const {
     return key.substr(prefix.size());
 }
 
-// The attempt that the end of the time to start ends says less than the one before.
-void Follower::onLost(const std::string& reason) {
+// The attempt that the end of the time to start ends says less than the one before. Short of memory
+// nobody is told.
+void Follower::onLost(const char* reason) noexcept {
     const bool isOutOfTime = !hasStarted && Clock::now() >= startDeadline;
     if (isOutOfTime && !lastProblem.empty()) return;
-    lastProblem = reason;
-    if (core->standing.noteLost(reason)) report(common::warning, "etcd is lost: " + reason);
+    try {
+        lastProblem = endpoints.current().text + ": " + reason;
+    } catch (const std::bad_alloc&) {
+        lastProblem = "out of memory";  // short enough to need none
+    }
+    noteLost();
+}
+
+void Follower::noteLost() noexcept {
+    try {
+        if (!core->standing.noteLost(lastProblem)) return;
+    } catch (const std::bad_alloc&) {
+        return;
+    }
+    report(common::warning, "etcd is lost: ", lastProblem);
 }
 
 void Follower::pause() {
@@ -233,7 +247,10 @@ void Follower::pause() {
 // No member has answered by now.
 void Follower::startWithout() {
     const auto& options = core->options;
-    if (lastProblem.empty()) onLost("no member has answered in time");
+    if (lastProblem.empty()) {
+        lastProblem = "no member has answered in time";
+        noteLost();
+    }
     if (options.withoutServer == StartWithoutServer::fail) throw Unreachable(lastProblem);
     if (options.withoutServer == StartWithoutServer::lastKnown) {
         try {
@@ -249,9 +266,8 @@ void Follower::startWithout() {
         }
         hasValues = true;
         core->standing.noteRevision(position.revision);
-        report(common::warning, "etcd is not reached, the values are those of revision " +
-                                    std::to_string(position.revision) + " in " +
-                                    options.lastKnownFile.string());
+        report(common::warning, "etcd is not reached, the values are those of revision ",
+               position.revision, " in ", options.lastKnownFile.string());
     }
     hasStarted = true;
     start->finish("");
@@ -274,8 +290,7 @@ void Follower::save() noexcept {
         couldSave = true;
     } catch (const std::exception& error) {
         if (couldSave) {
-            report(common::warning,
-                   std::string("the last known values can't be kept: ") + error.what());
+            report(common::warning, "the last known values can't be kept: ", error.what());
         }
         couldSave = false;
     }

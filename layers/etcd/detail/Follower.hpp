@@ -22,7 +22,7 @@ public:
     std::string await() VELKOR_EXCLUDES(mutex);
 
     /// The first call counts.
-    void finish(const std::string& problem) VELKOR_EXCLUDES(mutex);
+    void finish(std::string&& problem) noexcept VELKOR_EXCLUDES(mutex);
 
 private:
     common::Mutex mutex;
@@ -47,13 +47,15 @@ public:
 private:
     using Clock = std::chrono::steady_clock;
 
+    void attempt();
     void follow();
     void readAll(Gateway& gateway);
     bool canResume(Gateway& gateway);
     void receive(Gateway& gateway);
     void onAnswer(WatchAnswer&& answer);
     void onRevision(std::vector<Event>& events, std::size_t begin, std::size_t end);
-    void onLost(const std::string& reason);
+    void onLost(const char* reason) noexcept;
+    void noteLost() noexcept;
     void pause();
     void startWithout();
     void noteChanged();

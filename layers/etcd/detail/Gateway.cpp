@@ -6,8 +6,10 @@
 #include <boost/beast/http/string_body.hpp>
 
 #include <algorithm>
+#include <filesystem>
 #include <fstream>
 #include <string_view>
+#include <system_error>
 #include <utility>
 
 #include "layers/etcd/detail/GatewayErrors.hpp"
@@ -37,8 +39,11 @@ constexpr milliseconds longestBlank{100};
     throw Unreachable(error.message());
 }
 
+// What is no file might wait for somebody who writes, or never end.
 std::string passwordIn(const std::string& file) {
-    std::ifstream in(file);
+    std::error_code missing;
+    std::ifstream in;
+    if (std::filesystem::is_regular_file(file, missing)) in.open(file);
     std::string password;
     if (!std::getline(in, password)) throw Unreachable("can't read the password in " + file);
     return password;

@@ -125,12 +125,13 @@ LastKnown parse(std::string_view text, const std::string& prefix) {
 /// A new file for its owner alone.
 class NewFile {
 public:
-    explicit NewFile(const fs::path& where)
-        : path(where),
-          descriptor(::open(path.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0600)) {
+    explicit NewFile(const fs::path& where) : path(where), descriptor(create(path)) {
         if (descriptor < 0) failBySystem(path);
     }
-    ~NewFile() { ::close(descriptor); }
+    ~NewFile() {
+        ::close(descriptor);
+        if (!isInPlace) ::unlink(path.c_str());
+    }
     NewFile(const NewFile&) = delete;
     NewFile& operator=(const NewFile&) = delete;
 
@@ -144,9 +145,21 @@ public:
         if (::fsync(descriptor) != 0) failBySystem(path);
     }
 
+    void replace(const fs::path& file) {
+        if (::rename(path.c_str(), file.c_str()) != 0) failBySystem(file);
+        isInPlace = true;
+    }
+
 private:
+    // What stands there may be readable for others, or lead elsewhere.
+    static int create(const fs::path& path) {
+        ::unlink(path.c_str());
+        return ::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
+    }
+
     const fs::path& path;
     const int descriptor;
+    bool isInPlace = false;
 };
 
 }  // namespace
@@ -154,11 +167,16 @@ private:
 void writeLastKnown(const fs::path& file, const std::string& prefix, const LastKnown& content) {
     fs::path beside = file;
     beside += ".new";
-    NewFile(beside).write(textOf(prefix, content));
-    if (::rename(beside.c_str(), file.c_str()) != 0) failBySystem(file);
+    NewFile replacement(beside);
+    replacement.write(textOf(prefix, content));
+    replacement.replace(file);
 }
 
 LastKnown readLastKnown(const fs::path& file, const std::string& prefix) {
+    // Some of what is no file would never end, or wait for somebody who writes.
+    std::error_code unknown;
+    const fs::file_status status = fs::status(file, unknown);
+    if (fs::exists(status) && !fs::is_regular_file(status)) fail(file, "it is no file");
     errno = 0;
     std::ifstream in(file, std::ios::binary);
     if (!in) failBySystem(file);

@@ -46,7 +46,7 @@ void Outbox::accept(Prepared&& write) noexcept {
     bytes += sizeOf(write.front());
     const bool isGrouped = openings > 0 && opener == std::this_thread::get_id();
     if (isGrouped && openNumber != 0) {
-        auto& open = groups.back().writes;
+        auto& open = openGroup().writes;
         open.splice(open.end(), write.front().writes);
         return;
     }
@@ -103,8 +103,20 @@ void Outbox::end() noexcept {
     wakeUp.notify_one();
 }
 
+// Others may have written behind it.
+Group& Outbox::openGroup() {
+    return *std::find_if(groups.rbegin(), groups.rend(),
+                         [open = openNumber](const Group& group) { return group.number == open; });
+}
+
 bool Outbox::isOpen(const Group& group) const {
     return openNumber != 0 && group.number == openNumber;
+}
+
+const Group* Outbox::overdue(std::chrono::steady_clock::time_point acceptedBefore) const {
+    const MutexLock lock(mutex);
+    if (groups.empty() || isOpen(groups.front())) return nullptr;
+    return groups.front().accepted < acceptedBefore ? &groups.front() : nullptr;
 }
 
 const Group* Outbox::await() {
@@ -124,7 +136,8 @@ void Outbox::noteTaken(const Group& group, std::int64_t revision) {
     }
 }
 
-void Outbox::finish(const std::exception_ptr& refused) noexcept {
+// Whoever is told a reason has it alone then: it isn't under way here any more.
+std::list<Group> Outbox::finish(std::exception_ptr refused) noexcept {
     Waiters satisfied;
     std::list<Group> finished;
     {
@@ -138,10 +151,11 @@ void Outbox::finish(const std::exception_ptr& refused) noexcept {
                                       [&](const Waiter& each) { return each.upTo > group.number; });
         satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
     }
+    refused = nullptr;
     for (Waiter& each : satisfied) {
         try {
             if (each.refused) {
-                each.promise.setException(each.refused);
+                each.promise.setException(std::move(each.refused));
             } else {
                 each.promise.setValue(true);
             }
@@ -150,6 +164,7 @@ void Outbox::finish(const std::exception_ptr& refused) noexcept {
             continue;
         }
     }
+    return finished;
 }
 
 // A thread that waits is told thereby. Without memory others aren't told.
@@ -162,19 +177,21 @@ void Outbox::noteRefusal(const Group& group, const std::exception_ptr& refused) 
     }
     if (isWaitedFor) return;
     try {
-        untold[group.writer] = refused;
+        untold.try_emplace(group.writer, refused);
     } catch (...) {
         return;
     }
 }
 
-void Outbox::refuseAll(const std::exception_ptr& reason) noexcept {
+void Outbox::refuseAll(std::exception_ptr reason) noexcept {
     for (;;) {
+        bool isLast = false;
         {
             const MutexLock lock(mutex);
             if (groups.empty()) return;
+            isLast = groups.size() == 1;
         }
-        finish(reason);
+        finish(isLast ? std::move(reason) : reason);
     }
 }
 

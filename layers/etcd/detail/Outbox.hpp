@@ -26,7 +26,7 @@ struct Write {
 
 /// Writes that are made together, in their order.
 struct Group {
-    std::int64_t number = 0;
+    std::int64_t number = 0;  ///< They grow; 0: it waits for nothing yet.
     std::list<Write> writes{};
     std::thread::id writer{};
     std::chrono::steady_clock::time_point accepted{};
@@ -74,12 +74,16 @@ public:
     /// A group was taken in `revision`: what waits behind it has seen that.
     void noteTaken(const Group& group, std::int64_t revision) VELKOR_EXCLUDES(mutex);
 
-    /// Tells who waits for the group, which is there no more, that the server has taken it, or why
-    /// not. Runs continuations.
-    void finish(const std::exception_ptr& refused) noexcept VELKOR_EXCLUDES(mutex);
+    /// The next group if it was accepted before that and nothing more is to come to it, else null.
+    const Group* overdue(std::chrono::steady_clock::time_point acceptedBefore) const
+        VELKOR_EXCLUDES(mutex);
+
+    /// Tells who waits for the group that the server has taken it, or why not. Gives the group,
+    /// which is there no more. Runs continuations.
+    std::list<Group> finish(std::exception_ptr refused) noexcept VELKOR_EXCLUDES(mutex);
 
     /// Finishes all that waits.
-    void refuseAll(const std::exception_ptr& reason) noexcept VELKOR_EXCLUDES(mutex);
+    void refuseAll(std::exception_ptr reason) noexcept VELKOR_EXCLUDES(mutex);
 
 private:
     struct Waiter {
@@ -90,6 +94,7 @@ private:
     };
     using Waiters = std::list<Waiter>;
 
+    Group& openGroup() VELKOR_REQUIRES(mutex);
     bool isOpen(const Group& group) const VELKOR_REQUIRES(mutex);
     void noteRefusal(const Group& group, const std::exception_ptr& refused) VELKOR_REQUIRES(mutex);
 

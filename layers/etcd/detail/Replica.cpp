@@ -160,12 +160,18 @@ void Replica::noteServerValue(Unanswered& entry, std::optional<Value> value,
     entry.revision = ofRevision;
 }
 
-// The key shows what the server has once nothing of it is unanswered.
-void Replica::answer(Table& table, UnansweredKeys::iterator entry, Keys& changed) {
+// The key shows what the server has once nothing of it is unanswered. Until then it is known which
+// group was answered last: after a lack of memory that is done again.
+void Replica::answer(Table& table, UnansweredKeys::iterator entry, const Group& group,
+                     Keys& changed) {
+    if (entry->second.answered < group.number) {
+        entry->second.writes -= countOf(group, entry->first);
+        entry->second.answered = group.number;
+    }
     if (entry->second.writes == 0) {
         if (!isSame(table.find(entry->first), entry->second.serverValue)) {
             changed.push_back(entry->first);
-            replace(table, entry->first, std::move(entry->second.serverValue));
+            replace(table, entry->first, entry->second.serverValue);
         }
         unanswered.erase(entry);
     }
@@ -179,8 +185,7 @@ void Replica::take(Table& table, const Group& group, std::int64_t newRevision, K
         if (newRevision > current) ahead[key] = newRevision;
         noteServerValue(entry->second, text ? std::optional(fromValueText(*text)) : std::nullopt,
                         newRevision);
-        entry->second.writes -= countOf(group, key);
-        answer(table, entry, changed);
+        answer(table, entry, group, changed);
     }
 }
 
@@ -188,8 +193,7 @@ void Replica::refuse(Table& table, const Group& group, Keys& changed) {
     for (const auto& key : keysOf(group)) {
         const auto entry = unanswered.find(key);
         if (entry == unanswered.end()) continue;
-        entry->second.writes -= countOf(group, key);
-        answer(table, entry, changed);
+        answer(table, entry, group, changed);
     }
 }
 
@@ -200,8 +204,7 @@ void Replica::settle(Table& table, const Group& group, const std::vector<KeyUpda
         if (entry == unanswered.end()) continue;
         if (newRevision > current) ahead[each.key] = newRevision;
         noteServerValue(entry->second, each.value, newRevision);
-        entry->second.writes -= countOf(group, each.key);
-        answer(table, entry, changed);
+        answer(table, entry, group, changed);
     }
 }
 

@@ -68,12 +68,13 @@ private:
         std::size_t writes = 0;
         std::optional<Value> serverValue{};
         std::int64_t revision = 0;  ///< Of that value, if it is newer than the first of the writes.
+        std::int64_t answered = 0;  ///< The number of the last group that the server has answered.
     };
     using UnansweredKeys = std::unordered_map<std::string, Unanswered>;
 
     bool isAhead(const std::string& key, std::int64_t ofRevision) const;
     void forgetPassed();
-    void answer(Table& table, UnansweredKeys::iterator entry, Keys& changed);
+    void answer(Table& table, UnansweredKeys::iterator entry, const Group& group, Keys& changed);
     void noteServerValue(Unanswered& entry, std::optional<Value> value, std::int64_t ofRevision);
 
     std::int64_t current = 0;

@@ -33,7 +33,7 @@ void append(std::string& list, const std::string& element) {
     list += element;
 }
 
-void appendComparisons(std::string& list, const KeyChange& change, bool isStrict) {
+void appendComparisons(std::string& list, const KeyChange& change, bool isToBeThere) {
     const auto compare = [&](const std::string& comparison) {
         append(list, R"({"key":)" + bytes(change.key) + "," + comparison + "}");
     };
@@ -42,7 +42,7 @@ void appendComparisons(std::string& list, const KeyChange& change, bool isStrict
     }
     compare(R"("target":"MOD","result":"LESS","mod_revision":)" +
             number(change.condition.revision + 1));
-    if (isStrict) compare(R"("target":"VERSION","result":"GREATER","version":"0")");
+    if (isToBeThere) compare(R"("target":"VERSION","result":"GREATER","version":"0")");
 }
 
 std::string readOperation(const std::string& key) {
@@ -83,11 +83,12 @@ std::string progressRequest() {
 }
 
 std::string transactionRequest(const std::vector<KeyChange>& changes, bool isStrict) {
+    const bool isToBeThere = isStrict || 2 * changes.size() <= mostInTransaction;
     std::string comparisons;
     std::string operations;
     std::string reads;
     for (const KeyChange& change : changes) {
-        appendComparisons(comparisons, change, isStrict);
+        appendComparisons(comparisons, change, isToBeThere);
         append(operations, operationOf(change));
         append(reads, readOperation(change.key));
     }

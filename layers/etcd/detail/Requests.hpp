@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -38,9 +39,13 @@ std::string watchRequest(const std::string& prefix, std::int64_t revision);
 /// A sign of life on the stream.
 std::string progressRequest();
 
+/// As many comparisons, or operations, the server takes in one transaction unless told otherwise.
+constexpr std::size_t mostInTransaction = 128;
+
 /// All of `changes`, each of another key, or, where a condition isn't met, the keys as they are.
-/// The server takes one comparison for each change at least; strictly there are two, and a key that
-/// is to be there and isn't meets no condition.
+/// The server takes one comparison for each change at least. A key that is to be there and isn't
+/// meets the condition, unless a second comparison says so: those are made strictly, and wherever
+/// the server takes as many.
 std::string transactionRequest(const std::vector<KeyChange>& changes, bool isStrict);
 
 /// Several keys at one moment.

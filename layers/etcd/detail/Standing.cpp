@@ -1,5 +1,7 @@
 #include "layers/etcd/detail/Standing.hpp"
 
+#include <utility>
+
 namespace velkor::layers::etcd {
 
 using common::MutexLock;
@@ -30,16 +32,16 @@ bool Standing::noteConnected(const std::string& newEndpoint) {
 bool Standing::noteLost(const std::string& reason) {
     const MutexLock lock(mutex);
     const bool isNews = current.isWell || current.lastError.empty();
-    current.lastError = reason;
     endpoint.clear();
     if (current.isWell || !current.since) current.since = std::chrono::system_clock::now();
     current.isWell = false;
+    current.lastError = reason;  // without memory that it is lost is known all the same
     return isNews;
 }
 
-void Standing::noteWriteError(const std::string& reason) {
+void Standing::noteWriteError(std::string reason) noexcept {
     const MutexLock lock(mutex);
-    current.lastError = reason;
+    current.lastError = std::move(reason);
 }
 
 void Standing::noteUpdated(SourceState::Time time) {

@@ -23,7 +23,7 @@ public:
     bool noteLost(const std::string& reason) VELKOR_EXCLUDES(mutex);
 
     /// A write was refused, or is of unknown outcome.
-    void noteWriteError(const std::string& reason) VELKOR_EXCLUDES(mutex);
+    void noteWriteError(std::string reason) noexcept VELKOR_EXCLUDES(mutex);
 
     /// The values were those of the server at `time`.
     void noteUpdated(configuration::SourceState::Time time) VELKOR_EXCLUDES(mutex);

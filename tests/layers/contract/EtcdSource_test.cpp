@@ -46,10 +46,14 @@ public:
         other = EtcdSource::open(server().urls(), prefix);
         for (const auto& [key, value] : values) other->set(key, value);
         other->committed().get();
-        return EtcdSource::open(server().urls(), prefix);
+        auto source = EtcdSource::open(server().urls(), prefix);
+        onTrial = source;
+        return source;
     }
 
+    // What the source on trial wrote before is not to come after it.
     void change(const std::string& key, const std::optional<ConfigurationValue>& value) override {
+        if (const auto source = onTrial.lock()) source->committed().get();
         if (value) {
             other->set(key, *value);
         } else {
@@ -59,6 +63,7 @@ public:
 
 private:
     std::shared_ptr<EtcdSource> other;
+    std::weak_ptr<EtcdSource> onTrial;
 };
 
 VELKOR_SOURCE_CONTRACT(EtcdSource, Etcd);

@@ -34,7 +34,7 @@ TEST(EtcdAnswers, RangeHasAllEntries) {
 
 TEST(EtcdAnswers, TransactionHasItsRanges) {
     const auto answer = readTransaction(
-        R"({"header":{"revision":"5"},"succeeded":true,"responses":[{"response_put":{}},)"
+        R"({"header":{"cluster_id":"7","revision":"5"},"succeeded":true,"responses":[{"response_put":{}},)"
         R"({"response_range":{"kvs":[{"key":"YQ=="}]}},{"response_range":{}}]})");
     EXPECT_TRUE(answer.succeeded);
     EXPECT_EQ(answer.header.revision, 5);
@@ -83,6 +83,39 @@ TEST(EtcdAnswers, OfNoSenseAreRefused) {
     }
 }
 
+// Any server answers something.
+TEST(EtcdAnswers, OfNoClusterAreRefused) {
+    for (const char* text :
+         {"{}", R"({"header":{"cluster_id":"7"}})", R"({"header":{"revision":"5"}})",
+          R"({"header":{"cluster_id":"7","revision":"0"}})",
+          R"({"header":{"cluster_id":"7","revision":"-5"}})",
+          R"({"header":{"cluster_id":"7","revision":"9223372036854775807"}})"}) {
+        EXPECT_EQ(thrownText<BadJson>([&] { readRange(text); }), "JSON answer is of no cluster")
+            << text;
+        EXPECT_EQ(thrownText<BadJson>([&] { readTransaction(text); }),
+                  "JSON answer is of no cluster")
+            << text;
+    }
+}
+
+TEST(EtcdAnswers, OfWhatIsStillToComeAreRefused) {
+    for (const char* revision : {"10", "0", "-1", "9223372036854775807"}) {
+        const std::string entry =
+            R"({"key":"YQ==","mod_revision":")" + std::string(revision) + "\"}";
+        const std::string header = R"("header":{"cluster_id":"7","revision":"9"})";
+        EXPECT_THROW(readRange("{" + header + R"(,"kvs":[)" + entry + "]}"), BadJson) << revision;
+        EXPECT_THROW(readWatch(R"({"result":{)" + header + R"(,"events":[{"kv":)" + entry + "}]}}"),
+                     BadJson)
+            << revision;
+    }
+}
+
+TEST(EtcdAnswers, ErrorIsNoLongerThanASentence) {
+    const auto error = readError(R"({"message":")" + std::string(100'000, 'x') + R"(","code":8})");
+    EXPECT_EQ(error.code, 8);
+    EXPECT_EQ(error.message, "");
+}
+
 TEST(EtcdAnswers, OfAnyDepthAreRefused) {
     const std::string deep = R"({"new":)" + std::string(1'000'000, '[');
     EXPECT_EQ(thrownText<BadJson>([&] { readRange(deep); }), "JSON is nested too deep");
@@ -126,13 +159,31 @@ TEST(EtcdRequests, CompareWhatWasSeen) {
               R"("failure":[{"request_range":{"key":"YQ=="}}]})");
 }
 
-TEST(EtcdRequests, CompareOncePerKeyUnlessStrictly) {
-    EXPECT_EQ(transactionRequest({{"a", std::nullopt, {6, true}}, {"b", "1", {6, false}}}, false),
-              R"({"compare":[{"key":"YQ==","target":"MOD","result":"LESS","mod_revision":"7"},)"
-              R"({"key":"Yg==","target":"VERSION","result":"EQUAL","version":"0"}],)"
-              R"("success":[{"request_delete_range":{"key":"YQ=="}},)"
-              R"({"request_put":{"key":"Yg==","value":"MQ=="}}],)"
-              R"("failure":[{"request_range":{"key":"YQ=="}},{"request_range":{"key":"Yg=="}}]})");
+TEST(EtcdRequests, CompareTwiceWhereTheServerTakesIt) {
+    const auto comparisonsOf = [](int keys) {
+        std::vector<KeyChange> changes;
+        for (int i = 0; i < keys; ++i) changes.push_back({std::to_string(i), "1", {6, true}});
+        const std::string request = transactionRequest(changes, false);
+        int count = 0;
+        for (auto at = request.find("target"); at != std::string::npos;
+             at = request.find("target", at + 1)) {
+            ++count;
+        }
+        return count;
+    };
+    EXPECT_EQ(comparisonsOf(1), 2);
+    EXPECT_EQ(comparisonsOf(64), 128);
+    EXPECT_EQ(comparisonsOf(65), 65);
+    EXPECT_EQ(comparisonsOf(128), 128);
+}
+
+TEST(EtcdRequests, CompareOnceWhatIsNotToBeThere) {
+    EXPECT_EQ(transactionRequest({{"b", "1", {6, false}}, {"c", std::nullopt, {6, false}}}, true),
+              R"({"compare":[{"key":"Yg==","target":"VERSION","result":"EQUAL","version":"0"},)"
+              R"({"key":"Yw==","target":"VERSION","result":"EQUAL","version":"0"}],)"
+              R"("success":[{"request_put":{"key":"Yg==","value":"MQ=="}},)"
+              R"({"request_delete_range":{"key":"Yw=="}}],)"
+              R"("failure":[{"request_range":{"key":"Yg=="}},{"request_range":{"key":"Yw=="}}]})");
 }
 
 }  // namespace

@@ -100,6 +100,42 @@ TEST_F(EtcdLastKnown, SaysWhatIsWrong) {
     EXPECT_EQ(problem(), text("No such file or directory"));
 }
 
+TEST_F(EtcdLastKnown, IsForItsOwnerAloneWhateverStoodBesideIt) {
+    const std::string beside = file.path().string() + ".new";
+    std::ofstream(beside) << "foreign";
+    ASSERT_EQ(::chmod(beside.c_str(), 0666), 0);
+    writeLastKnown(file.path(), "p/", sample());
+    struct stat status {};
+    ASSERT_EQ(::stat(file.path().c_str(), &status), 0);
+    EXPECT_EQ(status.st_mode & 0777U, 0600U);
+}
+
+TEST_F(EtcdLastKnown, FollowsNoLinkThatStandsBesideIt) {
+    const auto other = file.parent() / "other";
+    std::ofstream(other) << "foreign";
+    std::filesystem::create_symlink(other, file.path().string() + ".new");
+    writeLastKnown(file.path(), "p/", sample());
+    EXPECT_EQ(std::filesystem::file_size(other), 7U);
+    EXPECT_TRUE(readLastKnown(file.path(), "p/").values == sample().values);
+}
+
+TEST_F(EtcdLastKnown, LeavesNothingBesideItWhenItCannotBeReplaced) {
+    std::filesystem::remove(file.path());
+    std::filesystem::create_directory(file.path());
+    EXPECT_EQ(thrownText<std::runtime_error>([&] { writeLastKnown(file.path(), "", {}); }),
+              text("Is a directory"));
+    EXPECT_FALSE(std::filesystem::exists(file.path().string() + ".new"));
+}
+
+TEST_F(EtcdLastKnown, IsReadFromAFileOnly) {
+    std::filesystem::remove(file.path());
+    std::filesystem::create_directory(file.path());
+    EXPECT_EQ(problem(), text("it is no file"));
+    std::filesystem::remove(file.path());
+    ASSERT_EQ(::mkfifo(file.path().c_str(), 0600), 0);
+    EXPECT_EQ(problem(), text("it is no file")) << "does not wait for somebody who writes";
+}
+
 TEST_F(EtcdLastKnown, SaysWhyItCannotBeWritten) {
     const auto nowhere = file.parent() / "none" / "file";
     EXPECT_EQ(thrownText<std::runtime_error>([&] { writeLastKnown(nowhere, "", {}); }),

@@ -64,6 +64,17 @@ TEST_F(EtcdOutbox, GroupsOnlyWhatTheSameThreadWrites) {
     EXPECT_THAT(next(), ElementsAre("other"));
 }
 
+TEST_F(EtcdOutbox, GoesOnWithAGroupThatOthersWriteBehind) {
+    outbox.beginGroup();
+    accept("a");
+    std::thread([this] { accept("other"); }).join();
+    accept("b");
+    outbox.endGroup();
+    EXPECT_THAT(next(), ElementsAre("a", "b"));
+    outbox.finish(nullptr);
+    EXPECT_THAT(next(), ElementsAre("other"));
+}
+
 TEST_F(EtcdOutbox, IsCommittedWhenNothingWaits) {
     EXPECT_TRUE(outbox.committed().get());
 }
@@ -98,6 +109,14 @@ TEST_F(EtcdOutbox, TellsARefusalOnceToAThreadThatAsksLater) {
     std::thread([this] { EXPECT_TRUE(outbox.committed().get()); }).join();
     EXPECT_EQ(refusalOf(outbox.committed()), "full");
     EXPECT_TRUE(outbox.committed().get());
+}
+
+TEST_F(EtcdOutbox, TellsAThreadThatAsksLaterTheFirstReason) {
+    accept("a");
+    accept("b");
+    outbox.finish(full);
+    outbox.finish(std::make_exception_ptr(std::runtime_error("other")));
+    EXPECT_EQ(refusalOf(outbox.committed()), "full");
 }
 
 TEST_F(EtcdOutbox, RefusesWhatWaitsAtTheEnd) {

@@ -34,6 +34,7 @@ protected:
         auto prepared =
             Outbox::prepare({key, value ? std::optional(toValueText(*value)) : std::nullopt});
         replica.write(table, key, std::move(value));
+        prepared.front().number = ++lastNumber;
         return std::move(prepared.front());
     }
 
@@ -58,6 +59,7 @@ protected:
 
     ValueTable table{ValueMap()};
     Replica replica;
+    std::int64_t lastNumber = 0;
 };
 
 TEST_F(EtcdReplica, TellsOnlyWhatDiffersWhenAllIsReadAgain) {

@@ -15,6 +15,7 @@
 #include <cstdlib>
 #include <filesystem>
 #include <memory>
+#include <random>
 #include <stdexcept>
 #include <string>
 #include <thread>
@@ -35,19 +36,22 @@ template <class Condition>
     return true;
 }
 
-/// A port of the loopback interface that nobody uses now.
+/// A port of the loopback interface that nobody uses now, and that the system gives nobody who asks
+/// for any.
 inline int freePort() {
-    const int socket = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_in address{};
-    address.sin_family = AF_INET;
-    address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    socklen_t size = sizeof address;
-    const bool isBound =
-        ::bind(socket, reinterpret_cast<sockaddr*>(&address), sizeof address) == 0 &&
-        ::getsockname(socket, reinterpret_cast<sockaddr*>(&address), &size) == 0;
-    ::close(socket);
-    if (!isBound) throw std::runtime_error("no free port");
-    return ntohs(address.sin_port);
+    static std::random_device random;
+    for (;;) {
+        const int port = std::uniform_int_distribution<>(20'000, 32'000)(random);
+        const int socket = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+        sockaddr_in address{};
+        address.sin_family = AF_INET;
+        address.sin_port = htons(static_cast<std::uint16_t>(port));
+        address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        const bool isFree =
+            ::bind(socket, reinterpret_cast<sockaddr*>(&address), sizeof address) == 0;
+        ::close(socket);
+        if (isFree) return port;
+    }
 }
 
 /// A folder of its own, in memory where the system has that; gone with this.
@@ -143,6 +147,15 @@ public:
         process = 0;
     }
 
+    /// Whatever became of the process, it runs afterwards.
+    void revive() {
+        if (process <= 0) start();
+        thaw();
+        if (!comesAbout([this] { return answers(); })) {
+            throw std::runtime_error("etcd doesn't start");
+        }
+    }
+
     void freeze() const { ::kill(process, SIGSTOP); }
     void thaw() const { ::kill(process, SIGCONT); }
 
@@ -218,11 +231,7 @@ public:
                                                            arguments));
             members.back()->start();
         }
-        for (const auto& member : members) {
-            if (!comesAbout([&] { return member->answers(); })) {
-                throw std::runtime_error("etcd doesn't start");
-            }
-        }
+        for (const auto& member : members) member->revive();
     }
 
     EtcdMember& operator[](std::size_t index) { return *members[index]; }

@@ -11,6 +11,7 @@
 #include <mutex>
 #include <stdexcept>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "layers/testing/detail/SampleValues.hpp"
@@ -76,7 +77,7 @@ TEST_F(EtcdSourceTest, TellsWhatOthersWrite) {
     member().ctl("del " + prefix + "a");
     put("b", "");
     EXPECT_TRUE(fleet.shows("b", "string "));
-    EXPECT_THAT(fleet.told(), ElementsAre("a=string 1", "a=bool true", "a", "b=string "));
+    EXPECT_THAT(fleet.told(4), ElementsAre("a=string 1", "a=bool true", "a", "b=string "));
 }
 
 TEST_F(EtcdSourceTest, CarriesEveryKindExactly) {
@@ -113,7 +114,7 @@ TEST_F(EtcdSourceTest, ReadsWhatItWrites) {
               "{\"type\":\"int\",\"value\":1}\n");
     put("fence", "1");
     EXPECT_TRUE(fleet.shows("fence", "string 1"));
-    EXPECT_THAT(fleet.told(), ElementsAre("a=int 1", "fence=string 1"));
+    EXPECT_THAT(fleet.told(2), ElementsAre("a=int 1", "fence=string 1"));
 }
 
 TEST_F(EtcdSourceTest, Unsets) {
@@ -174,7 +175,7 @@ TEST_F(EtcdSourceTest, TellsAllRevisionsInTheirOrder) {
         expected.push_back("a=int " + std::to_string(i));
     }
     EXPECT_TRUE(reader.shows("a", "int 199"));
-    EXPECT_EQ(reader.told(), expected);
+    EXPECT_EQ(reader.told(expected.size()), expected);
 }
 
 TEST_F(EtcdSourceTest, SaysHowItStands) {
@@ -276,6 +277,67 @@ TEST_F(EtcdSourceTest, KeepsOneConnectionForReadingAndOneForWriting) {
     for (int i = 0; i < 20; ++i) fleet.store->set("a", i);
     EXPECT_EQ(fleet.refusal(), "");
     EXPECT_EQ(proxy.count(), 2);
+}
+
+TEST_F(EtcdSourceTest, GoesOnWhateverWatchersThrow) {
+    const auto source = EtcdSource::open(cluster->urls(), prefix);
+    source->setChangeListener([](const std::string&) { throw 1; });
+    put("a", "1");
+    put("b", "1");
+    EXPECT_TRUE(comesAbout([&] { return source->has("b"); }));
+    EXPECT_EQ(source->state().lastError, "");
+}
+
+TEST_F(EtcdSourceTest, AgreesWithAllWhateverThreadsWriteAtOnce) {
+    FleetProcess fleet(cluster->urls(), prefix);
+    const FleetProcess other(cluster->urls(), prefix);
+    std::vector<std::thread> threads;
+    for (int thread = 0; thread < 4; ++thread) {
+        threads.emplace_back([&fleet, thread] {
+            for (int i = 0; i < 40; ++i) {
+                const std::string key = "k" + std::to_string((i + thread) % 5);
+                fleet.store->set(key, 100 * thread + i);
+                if (i % 3 == 0) fleet.source->unset(key);
+                if (i % 4 == 0) fleet.store->apply({{"k0", i}, {"k1", thread}});
+                EXPECT_EQ(i % 10 == 0 ? fleet.refusal() : "", "");
+            }
+        });
+    }
+    for (auto& each : threads) each.join();
+    EXPECT_EQ(fleet.refusal(), "");
+    put("fence", "1");
+    ASSERT_TRUE(fleet.shows("fence", "string 1"));
+    ASSERT_TRUE(other.shows("fence", "string 1"));
+    EXPECT_EQ(fleet.source->keys(), other.source->keys());
+    for (const auto& key : other.source->keys()) EXPECT_EQ(fleet.at(key), other.at(key)) << key;
+}
+
+TEST_F(EtcdSourceTest, MayEndWhileItIsWritten) {
+    for (int round = 0; round < 5; ++round) {
+        auto source = EtcdSource::open(cluster->urls(), prefix);
+        std::vector<std::thread> threads;
+        for (int thread = 0; thread < 3; ++thread) {
+            threads.emplace_back([source, thread]() mutable {
+                std::vector<Future<bool>> answers;
+                for (int i = 0; i < 10 * thread + 5; ++i) {
+                    source->set("k" + std::to_string(thread), i);
+                    answers.push_back(source->committed());
+                }
+                source.reset();
+                for (auto& each : answers) {
+                    try {
+                        each.get();
+                    } catch (const std::runtime_error&) {
+                        continue;  // given up at the end
+                    }
+                }
+            });
+        }
+        source.reset();
+        EXPECT_TRUE(completes([&] {
+            for (auto& each : threads) each.join();
+        }));
+    }
 }
 
 TEST_F(EtcdSourceTest, MayEndInsideAWatcher) {

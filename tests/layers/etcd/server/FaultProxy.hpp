@@ -69,6 +69,27 @@ public:
     void stallNew() { limitNew(0, 0); }
     void dropNewAnswers() { limitNew(endless, 0); }
 
+    /// Keeps what comes over connections to come back until it is delivered.
+    void holdNew() {
+        const std::lock_guard<std::mutex> lock(mutex);
+        holdsNew = true;
+    }
+
+    /// Lets the member have what was kept back, also of clients that have gone, and waits for its
+    /// answers.
+    void deliverHeld() {
+        const std::lock_guard<std::mutex> lock(mutex);
+        for (auto& each : pairs) {
+            if (each.held.empty()) continue;
+            char answer = 0;
+            const bool isAnswered =
+                ::send(each.member, each.held.data(), each.held.size(), MSG_NOSIGNAL) > 0 &&
+                ::recv(each.member, &answer, 1, 0) > 0;
+            if (!isAnswered) throw std::runtime_error("the member doesn't answer");
+            each.isBroken = true;
+        }
+    }
+
     /// Lets as many bytes of answers through the connections there are, and ends them then.
     void endAnswersAfter(std::size_t bytes) {
         const std::lock_guard<std::mutex> lock(mutex);
@@ -84,7 +105,7 @@ public:
     /// Nothing is spoiled of what comes from now on. What is stalled stays so.
     void mend() {
         const std::lock_guard<std::mutex> lock(mutex);
-        isCut = false;
+        isCut = holdsNew = false;
         newRequests = newAnswers = endless;
         pause = std::chrono::milliseconds(0);
     }
@@ -102,6 +123,9 @@ private:
         std::size_t answers;
         bool endsAfterwards = false;
         bool isBroken = false;
+        bool holds = false;
+        bool isLeft = false;  // by its client
+        std::string held{};
     };
 
     static sockaddr_in loopback(int port) {
@@ -130,7 +154,8 @@ private:
                     return true;
                 });
                 for (const auto& each : pairs) {
-                    polled.push_back({each.requests > 0 ? each.client : -1, POLLIN, 0});
+                    const bool isRead = each.requests > 0 && !each.isLeft;
+                    polled.push_back({isRead ? each.client : -1, POLLIN, 0});
                     polled.push_back({each.answers > 0 ? each.member : -1, POLLIN, 0});
                 }
             }
@@ -139,10 +164,14 @@ private:
             const std::lock_guard<std::mutex> lock(mutex);
             std::size_t index = 1;
             for (auto& each : pairs) {
-                if (polled[index++].revents != 0)
+                const bool hasRequest = polled[index++].revents != 0;
+                const bool hasAnswer = polled[index++].revents != 0;
+                if (hasRequest && each.holds) {
+                    hold(each);
+                } else if (hasRequest) {
                     pass(each, each.client, each.member, each.requests);
-                if (polled[index++].revents != 0)
-                    pass(each, each.member, each.client, each.answers);
+                }
+                if (hasAnswer) pass(each, each.member, each.client, each.answers);
             }
             if (polled[0].revents != 0) welcome();
         }
@@ -150,6 +179,13 @@ private:
             ::close(each.client);
             ::close(each.member);
         }
+    }
+
+    static void hold(Pair& pair) {
+        char bytes[16384];
+        const auto size = ::recv(pair.client, bytes, sizeof bytes, MSG_DONTWAIT);
+        pair.isLeft = size <= 0;
+        if (size > 0) pair.held.append(bytes, static_cast<std::size_t>(size));
     }
 
     static void pass(Pair& pair, int from, int to, std::size_t& limit) {
@@ -182,6 +218,7 @@ private:
             return;
         }
         pairs.push_back({client, member, newRequests, newAnswers});
+        pairs.back().holds = holdsNew;
     }
 
     int connectTarget() const {
@@ -205,6 +242,7 @@ private:
     std::mutex mutex;
     std::list<Pair> pairs;              // guarded by mutex
     bool isCut = false;                 // guarded by mutex
+    bool holdsNew = false;              // guarded by mutex
     std::size_t newRequests = endless;  // guarded by mutex
     std::size_t newAnswers = endless;   // guarded by mutex
     std::thread thread;

@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "configuration/ConfigurationImpl.hpp"
 #include "layers/etcd/EtcdSource.hpp"
 #include "tests/layers/etcd/server/EtcdMember.hpp"
 #include "tests/layers/etcd/server/FaultProxy.hpp"
@@ -30,31 +31,89 @@ using ::testing::IsEmpty;
 using ::testing::StartsWith;
 using ::testing::UnorderedElementsAre;
 
-EtcdOptions impatient() {
+/// Comes back soon.
+EtcdOptions quick() {
     EtcdOptions options;
-    options.silence = std::chrono::milliseconds(900);
-    options.writeWithin = std::chrono::milliseconds(1500);
+    options.writeWithin = patience;
     options.longestPause = std::chrono::milliseconds(400);
     return options;
 }
 
-class EtcdFaults : public ::testing::Test {
+/// Gives up soon, too.
+EtcdOptions impatient() {
+    EtcdOptions options = quick();
+    options.silence = std::chrono::milliseconds(900);
+    options.writeWithin = std::chrono::milliseconds(1500);
+    return options;
+}
+
+/// A member, and something in between that fails. Each test has keys of its own.
+class FaultyServer : public ::testing::Test {
 protected:
+    explicit FaultyServer(EtcdCluster& members)
+        : cluster(members), prefix("p" + std::to_string(++number) + "/") {}
+
     void put(const std::string& key, const std::string& text) {
-        cluster[0].ctl("put p/" + key + " -- " + quoted(text));
+        cluster[0].ctl("put " + prefix + key + " -- " + quoted(text));
     }
 
-    FleetProcess follow(const EtcdOptions& options = impatient()) {
-        return FleetProcess({proxy.url()}, "p/", options);
+    std::string valueAtServer(const std::string& key) {
+        return cluster[0].ctl("get --print-value-only " + prefix + key);
     }
 
-    EtcdCluster cluster;
+    FleetProcess follow(const EtcdOptions& options = quick()) {
+        return FleetProcess({proxy.url()}, prefix, options);
+    }
+
+    static int number;
+    EtcdCluster& cluster;
+    const std::string prefix;
     FaultProxy proxy{cluster[0].port()};
+};
+
+int FaultyServer::number = 0;
+
+/// All of these have one server, which is well again after each.
+class EtcdFaults : public FaultyServer {
+protected:
+    static void SetUpTestSuite() { shared = std::make_unique<EtcdCluster>(); }
+    static void TearDownTestSuite() { shared.reset(); }
+
+    EtcdFaults() : FaultyServer(*shared) {}
+    void TearDown() override { cluster[0].revive(); }
+
+private:
+    static std::unique_ptr<EtcdCluster> shared;
+};
+
+std::unique_ptr<EtcdCluster> EtcdFaults::shared;
+
+struct OwnServer {
+    EtcdCluster own;
+};
+
+/// One that takes a former state up.
+class EtcdRestoredServer : private OwnServer, public FaultyServer {
+protected:
+    EtcdRestoredServer() : FaultyServer(own) {}
+
+    std::string snapshot() const { return (cluster[0].place() / "snapshot").string(); }
+
+    void save() { cluster[0].ctl("snapshot save " + snapshot()); }
+
+    void restore() {
+        cluster[0].kill();
+        std::filesystem::remove_all(cluster[0].data());
+        outputOf("ETCDCTL_API=3 etcdctl snapshot restore " + snapshot() + " --name=m0 --data-dir=" +
+                 cluster[0].data().string() + " --initial-cluster=" + cluster[0].peer() +
+                 " --initial-advertise-peer-urls=" + cluster[0].peer().substr(3));
+        cluster[0].revive();
+    }
 };
 
 TEST_F(EtcdFaults, OfTheConnectionLeaveTheValues) {
     put("a", "1");
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow();
     proxy.cut();
     ASSERT_TRUE(fleet.becomesWell(false));
     EXPECT_EQ(fleet.at("a"), "string 1");
@@ -64,23 +123,23 @@ TEST_F(EtcdFaults, OfTheConnectionLeaveTheValues) {
 }
 
 TEST_F(EtcdFaults, OfTheConnectionLoseNoRevision) {
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow();
     put("b", "1");
     ASSERT_TRUE(fleet.shows("b", "string 1"));
     proxy.cut();
     ASSERT_TRUE(fleet.becomesWell(false));
     put("a", "1");
     put("a", "2");
-    cluster[0].ctl("del p/b");
+    cluster[0].ctl("del " + prefix + "b");
     proxy.mend();
     ASSERT_TRUE(fleet.shows("b", "none"));
     EXPECT_TRUE(fleet.becomesWell());
-    EXPECT_THAT(fleet.told(), ElementsAre("b=string 1", "a=string 1", "a=string 2", "b"));
+    EXPECT_THAT(fleet.told(4), ElementsAre("b=string 1", "a=string 1", "a=string 2", "b"));
 }
 
 TEST_F(EtcdFaults, OfTheConnectionStandInTheLog) {
     const LogCapture log("velkor::layers::etcd", common::warning | common::error);
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow();
     EXPECT_THAT(log.messages(), IsEmpty());
     proxy.cut();
     ASSERT_TRUE(fleet.becomesWell(false));
@@ -92,7 +151,7 @@ TEST_F(EtcdFaults, OfTheConnectionStandInTheLog) {
 }
 
 TEST_F(EtcdFaults, InTheMiddleOfAnAnswerInventNothing) {
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow();
     std::vector<std::string> expected;
     for (int i = 0; i < 12; ++i) {
         proxy.endAnswersAfter(static_cast<std::size_t>(1 + 37 * i));
@@ -101,12 +160,12 @@ TEST_F(EtcdFaults, InTheMiddleOfAnAnswerInventNothing) {
         ASSERT_TRUE(fleet.shows("a", "string " + text)) << i;
         expected.push_back("a=string " + text);
     }
-    EXPECT_EQ(fleet.told(), expected);
+    EXPECT_EQ(fleet.told(expected.size()), expected);
 }
 
 TEST_F(EtcdFaults, OfSilenceAreNoticed) {
     EtcdOptions options;
-    FleetProcess fleet({proxy.url()}, "p/", options);
+    FleetProcess fleet({proxy.url()}, prefix, options);
     proxy.stall();
     put("a", "1");
     ASSERT_TRUE(fleet.shows("a", "string 1")) << "by a new connection";
@@ -114,7 +173,7 @@ TEST_F(EtcdFaults, OfSilenceAreNoticed) {
 }
 
 TEST_F(EtcdFaults, OfAFrozenMemberAreNoticed) {
-    FleetProcess fleet(cluster.urls(), "p/", impatient());
+    FleetProcess fleet(cluster.urls(), prefix, impatient());
     cluster[0].freeze();
     EXPECT_TRUE(fleet.becomesWell(false));
     cluster[0].thaw();
@@ -124,7 +183,7 @@ TEST_F(EtcdFaults, OfAFrozenMemberAreNoticed) {
 }
 
 TEST_F(EtcdFaults, OfAKilledMemberLoseNothingThatWasTaken) {
-    FleetProcess fleet(cluster.urls(), "p/", impatient());
+    FleetProcess fleet(cluster.urls(), prefix, quick());
     for (int i = 0; i < 50; ++i) fleet.store->set("k" + std::to_string(i), i);
     ASSERT_EQ(fleet.refusal(), "");
     cluster[0].kill();
@@ -133,7 +192,7 @@ TEST_F(EtcdFaults, OfAKilledMemberLoseNothingThatWasTaken) {
     cluster[0].start();
     ASSERT_TRUE(fleet.becomesWell());
     EXPECT_EQ(fleet.source->keys().size(), 50U);
-    EXPECT_EQ(cluster[0].ctl("get --prefix --keys-only p/ | grep -c p/"), "50\n");
+    EXPECT_EQ(cluster[0].ctl("get --prefix --keys-only " + prefix + " | grep -c /"), "50\n");
     fleet.store->set("after", 1);
     EXPECT_EQ(fleet.refusal(), "");
 }
@@ -142,60 +201,49 @@ TEST_F(EtcdFaults, BeyondACompactionTellWhatDiffers) {
     put("same", "1");
     put("changed", "1");
     put("gone", "1");
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow();
     proxy.cut();
     ASSERT_TRUE(fleet.becomesWell(false));
     put("changed", "2");
     put("changed", "3");
     put("new", "1");
-    cluster[0].ctl("del p/gone");
-    cluster[0].ctl("compact $(ETCDCTL_API=3 etcdctl --endpoints=" + cluster[0].url() +
-                   " get p/new -w fields | sed -n 's/^\"Revision\" : //p')");
+    cluster[0].ctl("del " + prefix + "gone");
+    cluster[0].ctl("compact $(ETCDCTL_API=3 etcdctl --endpoints=" + cluster[0].url() + " get " +
+                   prefix + "new -w fields | sed -n 's/^\"Revision\" : //p')");
     proxy.mend();
     ASSERT_TRUE(fleet.becomesWell());
     ASSERT_TRUE(fleet.shows("new", "string 1"));
-    EXPECT_THAT(fleet.told(), UnorderedElementsAre("changed=string 3", "gone", "new=string 1"));
+    EXPECT_THAT(fleet.told(3), UnorderedElementsAre("changed=string 3", "gone", "new=string 1"));
 }
 
-TEST_F(EtcdFaults, OfARestoredServerAreFollowed) {
+TEST_F(EtcdRestoredServer, IsFollowed) {
     put("a", "old");
     put("gone", "1");
-    const std::string file = (cluster[0].place() / "snapshot").string();
-    cluster[0].ctl("snapshot save " + file);
+    save();
     put("a", "new");
     put("b", "new");
-    FleetProcess fleet(cluster.urls(), "p/", impatient());
-    cluster[0].kill();
+    FleetProcess fleet = follow();
+    proxy.cut();
     ASSERT_TRUE(fleet.becomesWell(false));
-    std::filesystem::remove_all(cluster[0].data());
-    outputOf("ETCDCTL_API=3 etcdctl snapshot restore " + file + " --name=m0 --data-dir=" +
-             cluster[0].data().string() + " --initial-cluster=" + cluster[0].peer() +
-             " --initial-advertise-peer-urls=" + cluster[0].peer().substr(3));
-    cluster[0].start();
+    restore();
+    proxy.mend();
     ASSERT_TRUE(fleet.becomesWell());
     EXPECT_TRUE(fleet.shows("a", "string old"));
     EXPECT_TRUE(fleet.shows("b", "none"));
     put("a", "newer");
     EXPECT_TRUE(fleet.shows("a", "string newer"));
-    EXPECT_THAT(fleet.told(), ElementsAre(StartsWith("a"), StartsWith("b"), "a=string newer"));
+    EXPECT_THAT(fleet.told(3), ElementsAre(StartsWith("a"), StartsWith("b"), "a=string newer"));
 }
 
 // The revision alone doesn't show that.
-TEST_F(EtcdFaults, OfARestoredServerThatHasGoneOnAreFollowed) {
+TEST_F(EtcdRestoredServer, IsFollowedAlsoWhenItHasGoneOn) {
     put("a", "old");
-    const std::string file = (cluster[0].place() / "snapshot").string();
-    cluster[0].ctl("snapshot save " + file);
+    save();
     put("b", "lost");
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow();
     proxy.cut();
     ASSERT_TRUE(fleet.becomesWell(false));
-    cluster[0].kill();
-    std::filesystem::remove_all(cluster[0].data());
-    outputOf("ETCDCTL_API=3 etcdctl snapshot restore " + file + " --name=m0 --data-dir=" +
-             cluster[0].data().string() + " --initial-cluster=" + cluster[0].peer() +
-             " --initial-advertise-peer-urls=" + cluster[0].peer().substr(3));
-    cluster[0].start();
-    ASSERT_TRUE(comesAbout([&] { return cluster[0].answers(); }));
+    restore();
     for (int i = 0; i < 5; ++i) put("c", std::to_string(i));
     proxy.mend();
     EXPECT_TRUE(fleet.shows("b", "none"));
@@ -204,7 +252,7 @@ TEST_F(EtcdFaults, OfARestoredServerThatHasGoneOnAreFollowed) {
 
 TEST_F(EtcdFaults, BeforeAWriteIsSentTakeItBack) {
     put("a", "1");
-    FleetProcess fleet(cluster.urls(), "p/", impatient());
+    FleetProcess fleet(cluster.urls(), prefix, impatient());
     cluster[0].kill();
     fleet.store->set("a", 2);
     EXPECT_EQ(fleet.at("a"), "int 2");
@@ -213,71 +261,129 @@ TEST_F(EtcdFaults, BeforeAWriteIsSentTakeItBack) {
     EXPECT_TRUE(fleet.shows("a", "string 1"));
     cluster[0].start();
     EXPECT_TRUE(fleet.becomesWell());
-    EXPECT_EQ(cluster[0].ctl("get --print-value-only p/a"), "1\n");
-    EXPECT_THAT(fleet.told(), ElementsAre("a=int 2", "a=string 1"));
+    EXPECT_EQ(valueAtServer("a"), "1\n");
+    EXPECT_THAT(fleet.told(2), ElementsAre("a=int 2", "a=string 1"));
 }
 
 TEST_F(EtcdFaults, WhileAWriteIsAnsweredLeaveItsOutcomeUnknownUntilItIsRead) {
     put("a", "1");
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow(impatient());
     proxy.dropNewAnswers();
     fleet.store->set("a", 2);
     EXPECT_THAT(fleet.refusal<UnknownOutcome>(),
                 StartsWith("etcd has not said whether it has written: " + proxy.url()));
     EXPECT_EQ(fleet.detail("waiting writes"), "");
     proxy.mend();
-    fleet.store->set("b", 1);
-    EXPECT_EQ(fleet.refusal(), "") << "sent once the outcome is known";
+    EXPECT_TRUE(comesAbout([&] {
+        fleet.store->set("b", 1);
+        return fleet.refusal().empty();
+    })) << "sent once the outcome is known";
     EXPECT_EQ(fleet.at("a"), "int 2");
-    EXPECT_THAT(fleet.told(), ElementsAre("a=int 2", "b=int 1"));
+    EXPECT_THAT(fleet.toldOf("a", 1), ElementsAre("a=int 2"));
 }
 
 TEST_F(EtcdFaults, WhileAWriteIsSentLeaveItsOutcomeUnknownUntilItIsRead) {
     put("a", "1");
-    FleetProcess fleet({proxy.url()}, "p/", impatient());
+    FleetProcess fleet = follow(impatient());
     proxy.stallNew();
     fleet.store->set("a", 2);
     EXPECT_THAT(fleet.refusal<UnknownOutcome>(),
                 StartsWith("etcd has not said whether it has written: " + proxy.url()));
     proxy.mend();
     EXPECT_TRUE(fleet.shows("a", "string 1"));
-    EXPECT_THAT(fleet.told(), ElementsAre("a=int 2", "a=string 1"));
+    EXPECT_THAT(fleet.told(2), ElementsAre("a=int 2", "a=string 1"));
+}
+
+TEST_F(EtcdFaults, ThatLastRefuseWritesThatWaitForAnUnknownOutcome) {
+    FleetProcess fleet = follow(impatient());
+    proxy.stallNew();
+    fleet.store->set("a", 1);
+    EXPECT_THAT(fleet.refusal<UnknownOutcome>(), StartsWith("etcd has not said "));
+    fleet.store->set("b", 1);
+    ASSERT_TRUE(comesAbout([&] { return fleet.detail("waiting writes").empty(); }));
+    EXPECT_THAT(fleet.refusal(), StartsWith("etcd refused the write: the write was not sent: "));
+    EXPECT_TRUE(fleet.shows("b", "none"));
+}
+
+TEST_F(EtcdFaults, WhileManyKeysAreSentLeaveTheirOutcomeUnknownUntilItIsRead) {
+    FleetProcess fleet = follow(impatient());
+    proxy.stallNew();
+    std::vector<configuration::Change> changes;
+    for (int i = 0; i < 200; ++i) changes.push_back({"k" + std::to_string(i), i});
+    fleet.store->apply(changes);
+    EXPECT_THAT(fleet.refusal<UnknownOutcome>(), StartsWith("etcd has not said "));
+    proxy.mend();
+    EXPECT_TRUE(comesAbout([&] { return fleet.source->keys().empty(); }));
+}
+
+/// A write that the server gets long after it was given up.
+class EtcdLateWrite : public EtcdFaults {
+protected:
+    EtcdLateWrite() {
+        put("a", "1");
+        fleet = std::make_unique<FleetProcess>(std::vector<std::string>{proxy.url()}, prefix,
+                                               impatient());
+        proxy.holdNew();
+        fleet->store->set("a", 2);
+        EXPECT_THAT(fleet->refusal<UnknownOutcome>(), StartsWith("etcd has not said "));
+        proxy.mend();
+        EXPECT_TRUE(fleet->shows("a", "string 1"));
+    }
+
+    std::unique_ptr<FleetProcess> fleet;
+};
+
+TEST_F(EtcdLateWrite, IsShownLikeAnybodys) {
+    proxy.deliverHeld();
+    EXPECT_TRUE(fleet->shows("a", "int 2"));
+}
+
+TEST_F(EtcdLateWrite, OverwritesNothingThatWasWrittenMeanwhile) {
+    put("a", "3");
+    proxy.deliverHeld();
+    EXPECT_EQ(valueAtServer("a"), "3\n");
+}
+
+TEST_F(EtcdLateWrite, RevivesNothing) {
+    cluster[0].ctl("del " + prefix + "a");
+    proxy.deliverHeld();
+    EXPECT_EQ(valueAtServer("a"), "");
 }
 
 TEST_F(EtcdFaults, AtTheStartEndIt) {
     EtcdOptions options;
-    options.startWithin = std::chrono::milliseconds(300);
+    options.startWithin = std::chrono::seconds(1);
     proxy.cut();
     EXPECT_THAT(
-        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); }),
+        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, prefix, options); }),
         StartsWith("etcd could not be read: " + proxy.url() + ": "));
     proxy.mend();
     proxy.stallNew();
     EXPECT_THAT(
-        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); }),
+        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, prefix, options); }),
         StartsWith("etcd could not be read: " + proxy.url() + ": "));
 }
 
 TEST_F(EtcdFaults, AtTheStartAreWaitedOut) {
     put("a", "1");
-    EtcdOptions options = impatient();
+    EtcdOptions options = quick();
     options.startWithin = 2 * patience;
     proxy.cut();
     std::thread repair([&] {
         EXPECT_TRUE(comesAbout([&] { return proxy.count() > 2; }));
         proxy.mend();
     });
-    EXPECT_EQ(FleetProcess({proxy.url()}, "p/", options).at("a"), "string 1");
+    EXPECT_EQ(FleetProcess({proxy.url()}, prefix, options).at("a"), "string 1");
     repair.join();
 }
 
 TEST_F(EtcdFaults, AtTheStartCanBeLivedWithWithoutValues) {
     put("a", "1");
-    EtcdOptions options = impatient();
+    EtcdOptions options = quick();
     options.startWithin = std::chrono::milliseconds(0);
     options.withoutServer = StartWithoutServer::empty;
     proxy.cut();
-    FleetProcess fleet({proxy.url()}, "p/", options);
+    FleetProcess fleet({proxy.url()}, prefix, options);
     EXPECT_THAT(fleet.source->keys(), IsEmpty());
     EXPECT_FALSE(fleet.source->state().isWell);
     EXPECT_FALSE(fleet.source->state().updated);
@@ -294,7 +400,7 @@ protected:
     }
 
     const TemporaryFile folder{""};
-    EtcdOptions options = impatient();
+    EtcdOptions options = quick();
 };
 
 TEST_F(EtcdLastKnownStart, HasTheValuesOfTheFile) {
@@ -302,7 +408,7 @@ TEST_F(EtcdLastKnownStart, HasTheValuesOfTheFile) {
     std::string revision;
     {
         options.startWithin = patience;
-        FleetProcess fleet({proxy.url()}, "p/", options);
+        FleetProcess fleet({proxy.url()}, prefix, options);
         put("b", "1");
         ASSERT_TRUE(fleet.shows("b", "string 1"));
         proxy.stallNew();
@@ -311,7 +417,7 @@ TEST_F(EtcdLastKnownStart, HasTheValuesOfTheFile) {
         proxy.cut();
     }
     options.startWithin = std::chrono::milliseconds(100);
-    FleetProcess fleet({proxy.url()}, "p/", options);
+    FleetProcess fleet({proxy.url()}, prefix, options);
     EXPECT_EQ(fleet.at("a"), "string 1");
     EXPECT_THAT(fleet.source->keys(), ElementsAre("a", "b"));
     EXPECT_FALSE(fleet.source->state().isWell);
@@ -320,12 +426,12 @@ TEST_F(EtcdLastKnownStart, HasTheValuesOfTheFile) {
     put("a", "3");
     proxy.mend();
     EXPECT_TRUE(fleet.shows("a", "string 3"));
-    EXPECT_THAT(fleet.told(), ElementsAre("a=string 2", "a=string 3")) << "resumed by revision";
+    EXPECT_THAT(fleet.told(2), ElementsAre("a=string 2", "a=string 3")) << "resumed by revision";
 }
 
 TEST_F(EtcdLastKnownStart, KeepsTheFileWhileItRuns) {
     options.startWithin = patience;
-    const FleetProcess fleet(cluster.urls(), "p/", options);
+    const FleetProcess fleet(cluster.urls(), prefix, options);
     ASSERT_TRUE(comesAbout([&] { return std::filesystem::exists(options.lastKnownFile); }));
     const auto before = std::filesystem::last_write_time(options.lastKnownFile);
     put("a", "1");
@@ -336,14 +442,14 @@ TEST_F(EtcdLastKnownStart, KeepsTheFileWhileItRuns) {
 TEST_F(EtcdLastKnownStart, IsRefusedWithoutTheFile) {
     proxy.cut();
     const std::string problem =
-        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, "p/", options); });
+        thrownText<std::runtime_error>([&] { EtcdSource::open({proxy.url()}, prefix, options); });
     EXPECT_THAT(problem, StartsWith("etcd could not be read: " + proxy.url() + ": "));
     EXPECT_THAT(problem, HasSubstr("; " + options.lastKnownFile.string() + ": No such file"));
 }
 
 TEST(EtcdFullServer, RefusesAndKeepsWhatItHas) {
     EtcdCluster cluster(1, {"--quota-backend-bytes=1048576"});
-    FleetProcess fleet(cluster.urls(), "p/", impatient());
+    FleetProcess fleet(cluster.urls(), "p/", quick());
     fleet.store->set("a", 1);
     ASSERT_EQ(fleet.refusal(), "");
     std::string refusal;

@@ -2,10 +2,13 @@
 
 #include <algorithm>
 #include <condition_variable>
+#include <cstddef>
 #include <functional>
+#include <iterator>
 #include <memory>
 #include <mutex>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "configuration/ConfigurationImpl.hpp"
@@ -56,20 +59,22 @@ public:
         return "";
     }
 
-    /// "KEY=int 5", or "KEY" alone when it has gone, in the order in which it was told.
-    std::vector<std::string> told() {
-        const std::lock_guard<std::mutex> lock(mutex);
-        return changes;
-    }
+    /// "KEY=int 5", or "KEY" alone when it has gone, in the order in which it was told. Waits for
+    /// as many: a value can be read before it is told.
+    std::vector<std::string> told(std::size_t least = 0) { return toldOf("", least); }
 
     /// What was told of the keys that `prefix` begins.
-    std::vector<std::string> toldOf(const std::string& prefix) {
-        auto all = told();
-        all.erase(std::remove_if(all.begin(), all.end(),
-                                 [&](const std::string& each) {
-                                     return each.compare(0, prefix.size(), prefix) != 0;
-                                 }),
-                  all.end());
+    std::vector<std::string> toldOf(const std::string& prefix, std::size_t least = 0) {
+        std::vector<std::string> all;
+        std::ignore = comesAbout([&] {
+            all.clear();
+            const std::lock_guard<std::mutex> lock(mutex);
+            std::copy_if(changes.begin(), changes.end(), std::back_inserter(all),
+                         [&](const std::string& each) {
+                             return each.compare(0, prefix.size(), prefix) == 0;
+                         });
+            return all.size() >= least;
+        });
         return all;
     }
 
