@@ -120,7 +120,7 @@ public:
     }
 
 private:
-    const EtcdOptions options;
+    const EtcdOptions options{};
     const layers::etcd::Stop stop;
     layers::etcd::Gateway gateway{server().endpoints().front(), options, stop,
                                   layers::etcd::Link::Time::max()};
