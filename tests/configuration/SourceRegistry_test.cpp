@@ -5,8 +5,12 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <thread>
+#include <utility>
 
+#include "configuration/ConfigurationImpl.hpp"
 #include "configuration/sources/InMemorySource.hpp"
+#include "configuration/sources/MonitoredSource.hpp"
 #include "tests/configuration/StoreTesting.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
