@@ -4,6 +4,7 @@
 
 #include "host/console/TimeText.hpp"
 #include "host/look/JsonLines.hpp"
+#include "host/sources/SourceStates.hpp"
 #include "messages/JsonText.hpp"
 
 namespace velkor::host {

@@ -94,7 +94,8 @@ public:
     Future<bool> committed() override;
 
     /// What is written in between on one thread is one transaction. The server takes up to 128
-    /// keys in one, unless it was told otherwise, and refuses more.
+    /// keys in one, unless it was told otherwise, and refuses more; with `compareAndSwap` a key
+    /// that it has counts twice.
     void beginGroup() override;
     void endGroup() noexcept override;
 
