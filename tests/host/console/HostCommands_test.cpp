@@ -3,7 +3,6 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
-#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -11,6 +10,8 @@
 #include <vector>
 
 #include "configuration/admin/ConfigurationCommandProvider.hpp"
+#include "configuration/sources/InMemorySource.hpp"
+#include "configuration/sources/MonitoredSource.hpp"
 #include "host/console/ValueText.hpp"
 #include "settings/Setting.hpp"
 #include "tests/support/TemporaryFile.hpp"
@@ -25,21 +26,31 @@ using Words = std::vector<std::string>;
 const Words hostNames{"sources", "load", "unload", "explain", "watch", "unwatch", "put", "unset",
                       "history", "undo", "send",   "help",    "?",     "quit",    "exit"};
 
+class ToldSource final : public configuration::InMemorySource,
+                         public configuration::MonitoredSource {
+public:
+    explicit ToldSource(configuration::SourceState&& state)
+        : InMemorySource(configuration::ValueMap()), told(std::move(state)) {}
+
+    configuration::SourceState state() const override { return told; }
+
+private:
+    const configuration::SourceState told;
+};
+
 class HostCommandsTest : public ::testing::Test {
 protected:
     HostServices services() {
         const auto show = [this](const auto& key, const auto& value) {
             shown.push_back(optionText(key, value));
         };
-        return {store,
-                std::make_shared<Watches>(store, show),
-                nullptr,
-                [this] { quitting = true; },
-                [this](const auto& name) {
-                    const auto state = states.find(name);
-                    return state == states.end() ? std::nullopt : std::optional(state->second);
-                },
+        return {store, std::make_shared<Watches>(store, show), nullptr, [this] { quitting = true; },
                 std::make_shared<SessionSources>(store, SourceLimits{})};
+    }
+
+    /// Adds a source that stands as `state` says, in front of those that are there.
+    void addTold(const std::string& name, configuration::SourceState state) {
+        store->addSource(name, "", 0, true, std::make_shared<ToldSource>(std::move(state))).get();
     }
 
     std::string run(const std::string& name, Words arguments = {}) {
@@ -50,7 +61,6 @@ protected:
     std::shared_ptr<CommandRegistry> registry = std::make_shared<CommandRegistry>();
     Words shown;
     bool quitting = false;
-    std::map<std::string, configuration::SourceState> states;
     HostCommands commands{services(), registry};
 };
 
@@ -106,40 +116,50 @@ TEST_F(HostCommandsTest, SourcesListsThemInOrderOfPrecedence) {
 }
 
 TEST_F(HostCommandsTest, SourcesShowsWhatIsTheMatterWithOne) {
-    states["override"] = {false, std::nullopt, std::nullopt, "not now"};
+    addTold("ill", {false, std::nullopt, std::nullopt, "not now"});
     EXPECT_EQ(run("sources"),
-              "NAME      GROUP  ORDER       ACCESS    PROBLEM\n"
-              "override  -      0           writable  not now\n"
+              "NAME      GROUP  ORDER       ACCESS     PROBLEM\n"
+              "ill       -      0           read-only  not now\n"
+              "override  -      0           writable\n"
               "default   -      2147483647  writable\n");
 }
 
 TEST_F(HostCommandsTest, SourcesShowsTheDetailsOfOneThatIsWell) {
-    states["default"].details = {{"endpoint", "http://a"}, {"revision", "7"}};
+    configuration::SourceState well;
+    well.details = {{"endpoint", "http://a"}, {"revision", "7"}};
+    addTold("well", well);
     EXPECT_EQ(run("sources"),
-              "NAME      GROUP  ORDER       ACCESS    STATE\n"
+              "NAME      GROUP  ORDER       ACCESS     STATE\n"
+              "well      -      0           read-only  endpoint http://a, revision 7\n"
               "override  -      0           writable\n"
-              "default   -      2147483647  writable  endpoint http://a, revision 7\n");
+              "default   -      2147483647  writable\n");
 }
 
 TEST_F(HostCommandsTest, SourcesShowsDetailsBesideWhatIsTheMatter) {
-    states["override"] = {false, std::nullopt, std::nullopt, "not now"};
-    states["default"].details = {{"revision", "7"}};
+    configuration::SourceState well;
+    well.details = {{"revision", "7"}};
+    addTold("well", well);
+    addTold("ill", {false, std::nullopt, std::nullopt, "not now"});
     EXPECT_EQ(run("sources"),
-              "NAME      GROUP  ORDER       ACCESS    STATE       PROBLEM\n"
-              "override  -      0           writable              not now\n"
-              "default   -      2147483647  writable  revision 7\n");
+              "NAME      GROUP  ORDER       ACCESS     STATE       PROBLEM\n"
+              "ill       -      0           read-only              not now\n"
+              "well      -      0           read-only  revision 7\n"
+              "override  -      0           writable\n"
+              "default   -      2147483647  writable\n");
 }
 
 TEST_F(HostCommandsTest, SourcesShowsStatesAsJson) {
+    store->removeSource("override").get();
+    store->removeSource("default").get();
     const configuration::SourceState::Time time(std::chrono::seconds(1'000'000'000));
-    states["override"] = {false, time, time, "not now", {{"revision", "7"}}};
-    states["default"] = {};
+    addTold("well", {});
+    addTold("ill", {false, time, time, "not now", {{"revision", "7"}}});
     EXPECT_EQ(run("sources", {"--json"}),
-              R"({"sources":[{"group":"","name":"override","order":0,)"
-              R"("problem":"since 2001-09-09T01:46:40Z: not now","readOnly":false,"state":)"
+              R"({"sources":[{"group":"","name":"ill","order":0,)"
+              R"("problem":"since 2001-09-09T01:46:40Z: not now","readOnly":true,"state":)"
               R"({"details":{"revision":"7"},"lastError":"not now",)"
               R"("since":"2001-09-09T01:46:40Z","updated":"2001-09-09T01:46:40Z","well":false}},)"
-              R"({"group":"","name":"default","order":2147483647,"readOnly":false,)"
+              R"({"group":"","name":"well","order":0,"readOnly":true,)"
               R"("state":{"details":{},"well":true}}]})");
 }
 
