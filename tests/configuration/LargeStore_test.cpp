@@ -5,16 +5,12 @@
 #include <utility>
 
 #include "tests/configuration/StoreTesting.hpp"
+#include "tests/support/Sanitizers.hpp"
 
 namespace velkor::configuration {
 namespace {
 
-// The sanitizers make everything several times larger and slower.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr int keyCount = 50'000;
-#else
-constexpr int keyCount = 1'000'000;
-#endif
+constexpr int keyCount = velkor::testing::isSanitized ? 50'000 : 1'000'000;
 
 std::string keyOf(int number) {
     return "some.group.key" + std::to_string(number);

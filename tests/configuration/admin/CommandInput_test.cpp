@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "tests/configuration/admin/CommandTesting.hpp"
+#include "tests/support/Sanitizers.hpp"
 
 namespace velkor::configuration {
 namespace {
@@ -75,12 +76,7 @@ TEST_F(CommandInput, AnyNumberOfArgumentsIsAnsweredOrOutOfRange) {
     }
 }
 
-// The sanitizers make everything several times larger and slower.
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr int largeKeyCount = 50'000;
-#else
-constexpr int largeKeyCount = 1'000'000;
-#endif
+constexpr int largeKeyCount = velkor::testing::isSanitized ? 50'000 : 1'000'000;
 
 TEST_F(CommandInput, ListOfALargeStoreShowsEveryKey) {
     ValueMap values;

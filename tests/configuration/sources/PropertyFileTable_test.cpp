@@ -6,6 +6,7 @@
 #include <string_view>
 
 #include "tests/configuration/sources/PropertyReading.hpp"
+#include "tests/support/Sanitizers.hpp"
 
 namespace velkor::configuration {
 namespace {
@@ -104,11 +105,7 @@ TEST(PropertyFileTable, AgreesWithAMapOnRandomProperties) {
 }
 
 TEST(PropertyFileTable, HoldsAsManyKeysAsThereAre) {
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-    constexpr int keyCount = 20'000;
-#else
-    constexpr int keyCount = 500'000;
-#endif
+    constexpr int keyCount = velkor::testing::isSanitized ? 20'000 : 500'000;
     std::string text;
     for (int number = 0; number < keyCount; ++number) {
         text += "some.group.key" + std::to_string(number) + "=" + std::to_string(number) + "\n";
