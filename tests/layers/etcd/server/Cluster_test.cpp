@@ -48,16 +48,18 @@ TEST_F(EtcdThreeMembers, GoOnWithoutTheirLeader) {
     ASSERT_EQ(writer.refusal(), "");
     cluster[leader].kill();
     // What is sent while there is no leader, or another one, may be of unknown outcome.
+    std::string refusal;
     const auto takes = [&](int value) {
         return comesAbout([&] {
             writer.store->set("a", value);
-            return writer.refusal().empty();
+            refusal = writer.refusal();
+            return refusal.empty();
         });
     };
-    ASSERT_TRUE(takes(2));
+    ASSERT_TRUE(takes(2)) << refusal;
     EXPECT_TRUE(reader.shows("a", "int 2"));
     cluster[leader].start();
-    ASSERT_TRUE(takes(3));
+    ASSERT_TRUE(takes(3)) << refusal;
     EXPECT_TRUE(reader.shows("a", "int 3"));
 }
 
