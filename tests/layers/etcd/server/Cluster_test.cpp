@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <iostream>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -35,6 +36,11 @@ EtcdOptions patientWriter() {
 
 class EtcdThreeMembers : public ::testing::Test {
 protected:
+    ~EtcdThreeMembers() override {
+        if (!HasFailure()) return;
+        for (std::size_t i = 0; i < cluster.size(); ++i) std::cerr << cluster[i].report();
+    }
+
     EtcdCluster cluster{3};
 };
 

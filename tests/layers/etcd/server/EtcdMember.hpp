@@ -14,6 +14,8 @@
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
+#include <iterator>
 #include <memory>
 #include <random>
 #include <stdexcept>
@@ -172,6 +174,18 @@ public:
     std::string ctl(const std::string& command) const {
         return outputOf("ETCDCTL_API=3 etcdctl --command-timeout=20s --endpoints=" + url() + " " +
                         options + " " + command);
+    }
+
+    /// What the process has said, and what it says of itself now.
+    std::string report() const {
+        std::ifstream log(folder.path() / "log");
+        std::string text{std::istreambuf_iterator<char>(log), {}};
+        try {
+            text += ctl("--command-timeout=2s endpoint status -w fields");
+        } catch (const std::runtime_error& error) {
+            text += error.what();
+        }
+        return name + " at " + url() + ":\n" + text + '\n';
     }
 
     /// For each call of etcdctl from now on.
