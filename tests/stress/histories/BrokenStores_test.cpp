@@ -11,7 +11,6 @@
 #include <mutex>
 #include <optional>
 #include <string>
-#include <thread>
 #include <utility>
 #include <vector>
 
@@ -26,11 +25,6 @@ using reactive_streams::PublisherAPI;
 using reactive_streams::Subscriber;
 using reactive_streams::Subscription;
 using Kind = StoreCall::Kind;
-
-// Where a lock is missing, others get in between.
-void leaveTheLock() {
-    for (int i = 0; i < 3; ++i) std::this_thread::yield();
-}
 
 /// Every second `get` of a key answers what the one before did.
 class StaleReads : public StoreSubject {
@@ -62,7 +56,7 @@ public:
         StoreCall dryRun{Kind::dryRun};
         dryRun.changes = {{call.key, call.value}};
         const std::string before = StoreSubject::perform(dryRun).text;
-        leaveTheLock();
+        letOthersIn();  // in the place of the lock that is missing
         const Answer answer = StoreSubject::perform(call);
         const auto colon = before.rfind(':');
         if (before.rfind("Changes refused", 0) == 0) return answer;
@@ -84,7 +78,7 @@ public:
             StoreCall one{Kind::apply};
             one.changes = {change};
             StoreSubject::perform(one);
-            leaveTheLock();
+            letOthersIn();  // in the place of the lock that is missing
         }
         return answer;
     }
@@ -122,7 +116,7 @@ public:
         if (call.kind != Kind::remove) return StoreSubject::perform(call);
         const std::string all = StoreSubject::perform({Kind::describe}).text;
         const bool known = ("," + all).find("," + *call.source + "(") != std::string::npos;
-        leaveTheLock();
+        letOthersIn();  // in the place of the lock that is missing
         StoreSubject::perform(call);
         return {known ? "true" : "false"};
     }
@@ -138,7 +132,7 @@ public:
         empty.layer.readOnly = false;
         const Answer answer = StoreSubject::perform(empty);
         if (answer.text != "true") return answer;
-        leaveTheLock();
+        letOthersIn();  // in the place of the lock that is missing
         StoreSubject::perform({Kind::remove, "", 0, call.layer.name});
         StoreSubject::perform(call);
         return answer;
@@ -157,7 +151,7 @@ public:
             const Answer part = StoreSubject::perform(one);
             answer.text += (answer.text.empty() ? "" : ",") + part.text;
             answer.version = part.version;
-            leaveTheLock();
+            letOthersIn();  // in the place of the lock that is missing
         }
         return answer;
     }
@@ -169,7 +163,7 @@ public:
     Answer perform(const StoreCall& call) override {
         if (call.kind != Kind::read) return StoreSubject::perform(call);
         const auto before = StoreSubject::perform(call).version;
-        leaveTheLock();
+        letOthersIn();  // in the place of the lock that is missing
         return {StoreSubject::perform(call).text, before};
     }
 };

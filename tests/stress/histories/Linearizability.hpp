@@ -53,6 +53,12 @@ private:
     // So many different situations that the search is given up: far more than an order takes.
     static constexpr std::size_t mostSituations = 1'000'000;
 
+    struct Situation {
+        std::vector<std::size_t> order;
+        std::vector<std::size_t> next;
+        Model model;
+    };
+
     explicit Linearizability(History recorded) : calls(sorted(std::move(recorded))) {
         placed.assign(calls.size(), '0');
     }
@@ -78,7 +84,7 @@ private:
         if (search(initial)) return "";
         return (seen.size() < mostSituations ? "no order of the calls explains the answers"
                                              : "no order of the calls found") +
-               furthest;
+               textOf(*furthest);
     }
 
     bool search(const Model& model) {
@@ -150,12 +156,16 @@ private:
     }
 
     void noteHowFar(const Model& model) {
-        if (order.size() < mostPlaced) return;
-        mostPlaced = order.size();
-        furthest = "\nthese do, as far as any:\n";
-        for (const std::size_t index : order) furthest += textOf(index);
-        furthest += "which leaves " + model.state() + "\nand next should come one of\n";
-        for (const std::size_t index : mayComeNext()) furthest += textOf(index);
+        if (furthest && order.size() < furthest->order.size()) return;
+        furthest = Situation{order, mayComeNext(), model};
+    }
+
+    std::string textOf(const Situation& situation) const {
+        std::string text = "\nthese do, as far as any:\n";
+        for (const std::size_t index : situation.order) text += textOf(index);
+        text += "which leaves " + situation.model.state() + "\nand next should come one of\n";
+        for (const std::size_t index : situation.next) text += textOf(index);
+        return text;
     }
 
     std::string textOf(std::size_t index) const {
@@ -169,8 +179,7 @@ private:
     std::string placed;   // '1' for each call that has its place in the order
     std::vector<std::size_t> order;
     std::unordered_set<std::string> seen;
-    std::size_t mostPlaced = 0;
-    std::string furthest;
+    std::optional<Situation> furthest;
 };
 
 }  // namespace velkor::testing

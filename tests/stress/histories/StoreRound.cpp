@@ -1,5 +1,7 @@
 #include "tests/stress/histories/StoreRound.hpp"
 
+#include <gtest/gtest.h>
+
 #include <utility>
 
 namespace velkor::testing {
@@ -60,8 +62,7 @@ void StoreRound::work(std::size_t thread) {
     StoreRecorder::beThread(thread);
     std::mt19937 random(plan.seed * 1000 + static_cast<unsigned>(thread));
     int lastValue = static_cast<int>(thread) * valuesOfAThread;
-    ++arrived;
-    while (arrived < plan.threads) std::this_thread::yield();
+    EXPECT_TRUE(start.arriveAndWait());
     for (std::size_t i = 0; i < plan.calls; ++i) {
         if (plan.everything && random() % 8 == 0) takePart(random, watchesOf[thread]);
         recorder.perform(randomCall(random, plan.everything, lastValue));

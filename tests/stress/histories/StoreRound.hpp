@@ -8,6 +8,7 @@
 #include <vector>
 
 #include "tests/stress/histories/RecordedWatch.hpp"
+#include "tests/support/BoundedWait.hpp"
 
 namespace velkor::testing {
 
@@ -38,7 +39,8 @@ private:
         : subject(called),
           plan(roundPlan),
           recorder(called, roundPlan.threads + 1),
-          watchesOf(roundPlan.threads + 1) {}
+          watchesOf(roundPlan.threads + 1),
+          start(roundPlan.threads) {}
 
     void run();
     void watchFromTheStart();
@@ -55,7 +57,7 @@ private:
     const RoundPlan plan;
     StoreRecorder recorder;
     std::vector<Watches> watchesOf;  // one for each thread, used by it alone
-    std::atomic<std::size_t> arrived{0};
+    Latch start;
 };
 
 /// A call that `random` chooses, with values that no other call has.

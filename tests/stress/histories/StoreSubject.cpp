@@ -1,5 +1,6 @@
 #include "tests/stress/histories/StoreSubject.hpp"
 
+#include <chrono>
 #include <exception>
 #include <set>
 #include <thread>
@@ -82,12 +83,16 @@ std::string textOf(const configuration::SourceDescription& source) {
 
 }  // namespace
 
+void letOthersIn() {
+    std::this_thread::sleep_for(std::chrono::microseconds(1));
+}
+
 void stumble() {
     thread_local unsigned state = 2463534242U;
     state ^= state << 13U;
     state ^= state >> 17U;
     state ^= state << 5U;
-    if (state % 4 == 0) std::this_thread::yield();
+    if (state % 8 == 0) letOthersIn();
 }
 
 std::string StoreSubject::textOf(const ConfigurationValue& value) {

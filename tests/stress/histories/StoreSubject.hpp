@@ -48,8 +48,12 @@ private:
         std::make_shared<configuration::ConfigurationImpl>();
 };
 
-/// Gives up the rest of the thread's time now and then, so that threads meet in more places than
-/// the machine would choose by itself.
+/// Lets the threads that wait for a processor have this one's. By a short sleep: on a machine where
+/// other processes wait as well, those would get what a thread gives up by a yield.
+void letOthersIn();
+
+/// Lets others in now and then, so that threads meet in more places than the machine would choose
+/// by itself.
 void stumble();
 
 }  // namespace velkor::testing
