@@ -6,6 +6,21 @@ namespace {
 
 using Kind = StoreCall::Kind;
 
+// Made before the threads, which only read them.
+const std::vector<std::string> allKeys{"a", "b", "g.a", "g.b"};
+const std::vector<std::string> allNames{"override", "default", "one", "two"};
+const std::vector<std::string> allGroups{"", "g."};
+const std::vector<int> allOrders{-2, -1, 5, 5, 6};
+const std::vector<Kind> allKinds{
+    Kind::get,      Kind::has,    Kind::getOption, Kind::keys, Kind::keysFrom, Kind::explain,
+    Kind::describe, Kind::dryRun, Kind::read,      Kind::read, Kind::set,      Kind::set,
+    Kind::set,      Kind::unset,  Kind::apply,     Kind::add,  Kind::add,      Kind::remove};
+
+const std::vector<std::string> singleKeys{"a", "b"};
+const std::vector<std::string> fixedNames{"override", "default", "none"};
+const std::vector<Kind> kindsOfOneKey{Kind::get,   Kind::has, Kind::getOption, Kind::explain,
+                                      Kind::unset, Kind::set, Kind::set,       Kind::set};
+
 /// Chooses what a call is about.
 class Chooser {
 public:
@@ -25,17 +40,14 @@ public:
         return among(names);
     }
 
-    StoreCall::Change change(const std::vector<std::string>& keys,
-                             const std::vector<std::string>& names) {
-        StoreCall::Change chosen{among(keys), std::nullopt, maybe(names)};
+    StoreCall::Change change() {
+        StoreCall::Change chosen{among(allKeys), std::nullopt, maybe(allNames)};
         if (!oneIn(3)) chosen.value = newValue();
         return chosen;
     }
 
     ModelLayer layer(const std::string& name) {
-        static const std::vector<std::string> groups{"", "g."};
-        static const std::vector<int> orders{-2, -1, 5, 5, 6};
-        ModelLayer chosen{name, among(groups), among(orders), oneIn(3), {}};
+        ModelLayer chosen{name, among(allGroups), among(allOrders), oneIn(3), {}};
         for (const char* const key : {"a", "b"}) {
             if (!oneIn(3)) chosen.values[key] = newValue();
         }
@@ -47,28 +59,17 @@ private:
     int& value;
 };
 
-const std::vector<std::string> allKeys{"a", "b", "g.a", "g.b"};
-const std::vector<std::string> allNames{"override", "default", "one", "two"};
-
 StoreCall callOfOneKey(Chooser& choose) {
-    static const std::vector<std::string> keys{"a", "b"};
-    static const std::vector<std::string> names{"override", "default", "none"};
-    static const std::vector<Kind> kinds{Kind::get,   Kind::has, Kind::getOption, Kind::explain,
-                                         Kind::unset, Kind::set, Kind::set,       Kind::set};
-    StoreCall call{choose.among(kinds)};
-    call.key = choose.among(keys);
+    StoreCall call{choose.among(kindsOfOneKey)};
+    call.key = choose.among(singleKeys);
     if (StoreModel::isRead(call)) return call;
-    call.source = choose.maybe(names);
+    call.source = choose.maybe(fixedNames);
     if (call.kind == Kind::set) call.value = choose.newValue();
     return call;
 }
 
 StoreCall anyCall(Chooser& choose) {
-    static const std::vector<Kind> kinds{
-        Kind::get,      Kind::has,    Kind::getOption, Kind::keys, Kind::keysFrom, Kind::explain,
-        Kind::describe, Kind::dryRun, Kind::read,      Kind::read, Kind::set,      Kind::set,
-        Kind::set,      Kind::unset,  Kind::apply,     Kind::add,  Kind::add,      Kind::remove};
-    StoreCall call{choose.among(kinds)};
+    StoreCall call{choose.among(allKinds)};
     switch (call.kind) {
         case Kind::keys:
         case Kind::describe:
@@ -79,7 +80,7 @@ StoreCall anyCall(Chooser& choose) {
         case Kind::dryRun:
         case Kind::apply:
             for (std::size_t i = 0; i < 3; ++i) {
-                call.changes.push_back(choose.change(allKeys, allNames));
+                call.changes.push_back(choose.change());
             }
             break;
         case Kind::add:
@@ -89,7 +90,7 @@ StoreCall anyCall(Chooser& choose) {
             call.source = choose.among(allNames);
             break;
         default: {
-            const auto change = choose.change(allKeys, allNames);
+            const auto change = choose.change();
             call.key = change.key;
             if (call.kind == Kind::set || call.kind == Kind::unset) call.source = change.source;
             if (call.kind == Kind::set) call.value = choose.newValue();
