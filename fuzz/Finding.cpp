@@ -1,7 +1,7 @@
 #include "fuzz/Finding.hpp"
 
+#include <cstdio>
 #include <cstdlib>
-#include <iostream>
 
 namespace velkor::fuzz {
 
@@ -20,8 +20,12 @@ std::string spelled(std::string_view bytes) {
 }
 
 void report(std::string_view what, std::string_view expected, std::string_view actual) {
-    std::cerr << "\nFINDING: " << what << "\n  expected: " << expected << "\n  actual:   " << actual
-              << std::endl;
+    const auto print = [](const char* label, std::string_view text) {
+        std::fprintf(stderr, "%s%.*s\n", label, static_cast<int>(text.size()), text.data());
+    };
+    print("\nFINDING: ", what);
+    print("  expected: ", expected);
+    print("  actual:   ", actual);
     std::abort();
 }
 
