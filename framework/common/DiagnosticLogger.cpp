@@ -10,6 +10,7 @@
 #include <locale>
 #include <map>
 #include <mutex>
+#include <new>
 #include <utility>
 
 namespace velkor::common {
@@ -85,6 +86,8 @@ void DiagnosticLogger::push(Severity severity,
     message.stream().unsetf(std::ios_base::boolalpha);
     compose(message.stream());
     message.flush();
+    // A stream only notes lack of memory; half of a message is no record.
+    if (message.stream().bad()) throw std::bad_alloc();
     core->push_record(boost::move(record));
 }
 
