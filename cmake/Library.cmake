@@ -11,7 +11,7 @@ cmake_path(RELATIVE_PATH CMAKE_INSTALL_PREFIX
 # Declares the shared library velkor::<name>, whose sources and headers are those of the folder that
 # calls this:
 #
-#     velkor_add_library(<name> [REQUIRED]
+#     velkor_add_library(<name> [REQUIRED] [TESTED_PARTS]
 #         SUMMARY <text>        one line for the pkg-config module velkor-<name>
 #         NEEDS <need>...       what it needs of others: each the arguments of one find_package(),
 #                               in quotes ("SQLite3 3.40")
@@ -24,12 +24,15 @@ cmake_path(RELATIVE_PATH CMAKE_INSTALL_PREFIX
 # A library whose needs are not met is an error if it is REQUIRED. Otherwise it is left out and
 # configuring says so; whatever depends on it asks for if(TARGET velkor::<name>).
 #
+# With TESTED_PARTS its sources are compiled into the object library velkor-<name>-parts, which tests
+# of what it keeps to itself link instead.
+#
 # It exports its own API only, has an ABI number of its own, and is installed as the component
 # <name>: by `cmake --install --component`, as find_package(velkor COMPONENTS <name>), and as the
 # pkg-config module velkor-<name>. The global property VELKOR_LIBRARIES lists the names of all.
 function(velkor_add_library name)
     cmake_parse_arguments(PARSE_ARGV 1 ARG
-        "REQUIRED" "SUMMARY" "NEEDS;PUBLIC;PRIVATE;PKG_CONFIG_LIBS;SOURCES;HEADERS")
+        "REQUIRED;TESTED_PARTS" "SUMMARY" "NEEDS;PUBLIC;PRIVATE;PKG_CONFIG_LIBS;SOURCES;HEADERS")
     if(ARG_UNPARSED_ARGUMENTS)
         message(FATAL_ERROR "velkor_add_library(${name}): what is ${ARG_UNPARSED_ARGUMENTS}?")
     endif()
@@ -41,7 +44,17 @@ function(velkor_add_library name)
     endif()
 
     set(target velkor-${name})
+    if(ARG_TESTED_PARTS)
+        add_library(${target}-parts OBJECT ${ARG_SOURCES})
+        velkor_compile_for_library(${target}-parts)
+        set_target_properties(${target}-parts PROPERTIES POSITION_INDEPENDENT_CODE ON)
+        target_link_libraries(${target}-parts
+            PUBLIC ${ARG_PUBLIC} ${ARG_PRIVATE}
+            PRIVATE velkor-build-options)
+        set(ARG_SOURCES $<TARGET_OBJECTS:${target}-parts>)
+    endif()
     add_library(${target} SHARED ${ARG_SOURCES})
+    velkor_compile_for_library(${target})
     add_library(velkor::${name} ALIAS ${target})
     target_sources(${target} PUBLIC
         FILE_SET HEADERS BASE_DIRS ${PROJECT_SOURCE_DIR} FILES ${ARG_HEADERS})
@@ -54,13 +67,9 @@ function(velkor_add_library name)
         VERSION ${PROJECT_VERSION}
         SOVERSION ${PROJECT_VERSION_MAJOR}
         INSTALL_RPATH $ORIGIN
-        CXX_EXTENSIONS OFF
-        CXX_VISIBILITY_PRESET hidden
-        VISIBILITY_INLINES_HIDDEN ON
+        LINKER_LANGUAGE CXX
         LINK_DEPENDS ${script})
     target_compile_features(${target} PUBLIC cxx_std_17)
-    # A call within the library goes straight to its target, so that it can be inlined.
-    target_compile_options(${target} PRIVATE -fno-semantic-interposition)
     target_link_options(${target} PRIVATE
         LINKER:--version-script=${script} LINKER:--no-undefined-version)
     target_link_libraries(${target}
@@ -73,6 +82,16 @@ function(velkor_add_library name)
     if(VELKOR_INSTALL)
         velkor_install_library(${name} ARG)
     endif()
+endfunction()
+
+# How the sources of a library are compiled.
+function(velkor_compile_for_library target)
+    set_target_properties(${target} PROPERTIES
+        CXX_EXTENSIONS OFF
+        CXX_VISIBILITY_PRESET hidden
+        VISIBILITY_INLINES_HIDDEN ON)
+    # A call within the library goes straight to its target, so that it can be inlined.
+    target_compile_options(${target} PRIVATE -fno-semantic-interposition)
 endfunction()
 
 # The names of this project's libraries among `targets`.

@@ -32,7 +32,8 @@ namespace velkor::layers {
 /// - It calls `change` with no lock of its own held that `set` or `unset` take.
 /// - Its thread keeps the source alive for the time of a call of `change`, and for nothing longer:
 ///   by a shared pointer that it locks for it. That one may be the last, of the source or of the
-///   store; both then end on that thread, which must not wait for itself (see `OwnThread`).
+///   store; both then end on that thread, which must not wait for itself, while the end of the
+///   process waits for it (see `OwnThread` and its `Borrowing`).
 ///
 /// What it is given:
 /// - Changes of a registered source are made with the mutex of the store held and then this one's

@@ -2,29 +2,50 @@
 
 #include <signal.h>
 
+#include <memory>
 #include <thread>
 #include <utility>
+
+#include "layers/detail/Endings.hpp"
 
 namespace velkor::layers {
 
 /// A thread that its owner waits for, unless the owner ends on that very thread, which then goes on
-/// alone. What it runs shares its state by shared pointers, and touches its owner no more once it
-/// has given up its reference to it. It takes no signals of the process: those are for threads that
-/// know what they mean.
+/// alone; the end of the process waits for it, and so does the unloading of the library that
+/// started it. What it runs shares its state by shared pointers, and touches its owner no more once
+/// it has given up its reference to it. It takes no signals of the process: those are for threads
+/// that know what they mean.
 ///
 /// The owner asks the thread to end before it destroys this.
 class OwnThread {
 public:
-    /// Starts a thread that runs `function`. Throws `std::system_error` when the system refuses.
+    /// Lives on such a thread while that holds a reference which may become the last one, of the
+    /// owner or of what keeps the owner alive: others may give up theirs meanwhile and end the
+    /// process, which waits. Made before the reference is taken, and destroyed after it is given
+    /// up.
+    class Borrowing {
+    public:
+        Borrowing() { detail::Endings::ofLibrary().add(); }
+        ~Borrowing() { detail::Endings::ofLibrary().remove(); }
+
+        Borrowing(const Borrowing&) = delete;
+        Borrowing& operator=(const Borrowing&) = delete;
+    };
+
+    /// Starts a thread that runs `function` and destroys it. Throws `std::system_error` when the
+    /// system refuses.
     template <class F>
-    explicit OwnThread(F function) : OwnThread(SignalsBlocked(), std::move(function)) {}
+    explicit OwnThread(F function)
+        : OwnThread(SignalsBlocked(), std::make_shared<bool>(false), std::move(function)) {}
 
     ~OwnThread() {
-        if (thread.get_id() == std::this_thread::get_id()) {
-            thread.detach();
-        } else {
+        if (thread.get_id() != std::this_thread::get_id()) {
             thread.join();
+            return;
         }
+        detail::Endings::ofLibrary().add();
+        *isAlone = true;
+        thread.detach();
     }
 
     OwnThread(const OwnThread&) = delete;
@@ -50,8 +71,18 @@ private:
     };
 
     template <class F>
-    OwnThread(const SignalsBlocked&, F&& function) : thread(std::forward<F>(function)) {}
+    OwnThread(const SignalsBlocked&, const std::shared_ptr<bool>& alone, F&& function)
+        : isAlone(alone), thread([alone, function = std::forward<F>(function)]() mutable {
+              run(std::move(function));
+              if (*alone) detail::Endings::ofLibrary().remove();
+          }) {}
 
+    template <class F>
+    static void run(F function) {
+        function();
+    }
+
+    const std::shared_ptr<bool> isAlone;  // used by the thread itself alone
     std::thread thread;
 };
 

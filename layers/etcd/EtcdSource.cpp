@@ -3,7 +3,6 @@
 #include <stdexcept>
 #include <utility>
 
-#include "layers/detail/Endings.hpp"
 #include "layers/etcd/detail/Core.hpp"
 #include "layers/etcd/detail/Follower.hpp"
 #include "layers/etcd/detail/Sender.hpp"
@@ -17,30 +16,12 @@ using configuration::ValueTable;
 using etcd::Core;
 using etcd::Outbox;
 
-namespace {
-
-/// What one of the source's threads does: `job`, which refers to `core`, until the source ends. All
-/// that it needs to begin is there.
-template <class Job>
-auto threadFunction(std::shared_ptr<Core> core, etcd::Running Core::*running,
-                    std::unique_ptr<Job> job) {
-    return [core = std::move(core), running, job = std::move(job)]() mutable {
-        (*core.*running).begin();
-        job->run();
-        job.reset();
-        const bool isAlone = (*core.*running).isAlone();
-        core.reset();
-        if (isAlone) detail::Endings::ofAll().remove();
-    };
-}
-
-}  // namespace
-
 std::shared_ptr<EtcdSource> EtcdSource::open(const std::vector<std::string>& endpoints,
                                              const std::string& prefix, EtcdOptions options) {
     auto core = std::make_shared<Core>(etcd::toEndpoints(endpoints), prefix, std::move(options));
     auto source = std::make_shared<EtcdSource>(Key(), core);
     core->changeTable = [weak = std::weak_ptr(source)](const Core::Mutation& mutation) {
+        const OwnThread::Borrowing waitedFor;
         const auto alive = weak.lock();
         if (alive) alive->change(mutation);
         return alive != nullptr;
@@ -62,16 +43,13 @@ EtcdSource::~EtcdSource() {
 
 void EtcdSource::start() {
     const auto firstValues = std::make_shared<etcd::Start>();
-    reader.emplace(
-        threadFunction(core, &Core::reading, std::make_unique<etcd::Follower>(core, firstValues)));
+    reader.emplace([job = std::make_unique<etcd::Follower>(core, firstValues)] { job->run(); });
     const std::string problem = firstValues->await();
     if (!problem.empty()) throw std::runtime_error(etcd_errors::notStarted + problem);
-    writer.emplace(threadFunction(core, &Core::writing, std::make_unique<etcd::Sender>(core)));
+    writer.emplace([job = std::make_unique<etcd::Sender>(core)] { job->run(); });
 }
 
 void EtcdSource::finish() {
-    if (reader && core->reading.isHere()) core->reading.goOnAlone();
-    if (writer && core->writing.isHere()) core->writing.goOnAlone();
     core->stop.request();
     core->outbox.end();
     reader.reset();

@@ -7,6 +7,7 @@
 #include "configuration/StoreErrors.hpp"
 #include "configuration/sources/PropertyFileSource.hpp"
 #include "framework/common/Mutex.hpp"
+#include "layers/OwnThread.hpp"
 #include "layers/detail/TableChange.hpp"
 #include "layers/files/Loggers.hpp"
 #include "layers/files/detail/FileReading.hpp"
@@ -125,6 +126,7 @@ std::optional<Look> ReloadingFileSource::File::reload(
     const FileReading reading = detail::readFile(path, mostBytes);
     if (reading.torn) return std::nullopt;
     ValueMap properties = propertiesOf(reading);
+    const OwnThread::Borrowing waitedFor;
     const auto living = source.lock();
     if (living == nullptr) return Look{reading.identity, true};
     return living->file->take(*living, reading, std::move(properties));

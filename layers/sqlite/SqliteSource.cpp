@@ -4,7 +4,6 @@
 #include <system_error>
 #include <utility>
 
-#include "layers/detail/Endings.hpp"
 #include "layers/sqlite/SqliteErrors.hpp"
 #include "layers/sqlite/detail/Committer.hpp"
 #include "layers/sqlite/detail/TableWrite.hpp"
@@ -15,7 +14,6 @@ using configuration::ConfigurationValue;
 using configuration::ValueMap;
 using configuration::ValueTable;
 using detail::Committer;
-using detail::Endings;
 using detail::PreparedWrite;
 
 std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& path,
@@ -27,17 +25,13 @@ std::shared_ptr<SqliteSource> SqliteSource::open(const std::filesystem::path& pa
     // Made here, since the thread has nobody to tell when it lacks the memory.
     const Committer::ChangeTable changeTable =
         [weak = std::weak_ptr(source)](const Committer::Mutation& mutation) {
+            const OwnThread::Borrowing waitedFor;
             const auto alive = weak.lock();
             if (alive) alive->change(mutation);
             return alive != nullptr;
         };
     try {
-        source->thread.emplace([shared, changeTable]() mutable {
-            shared->run(changeTable);
-            const bool isAlone = shared->isAlone();
-            shared.reset();
-            if (isAlone) Endings::ofAll().remove();
-        });
+        source->thread.emplace([shared, changeTable] { shared->run(changeTable); });
     } catch (const std::system_error& noThread) {
         throw std::runtime_error(sqlite_errors::notOpened + path.string() + ": " + noThread.what());
     }
@@ -57,10 +51,6 @@ SqliteSource::~SqliteSource() {
 }
 
 void SqliteSource::finish() {
-    if (thread && committer->runsHere()) {
-        committer->goOnAlone();
-        Endings::ofAll().add();
-    }
     committer->queue().end();
     thread.reset();
 }

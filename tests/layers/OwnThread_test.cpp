@@ -4,8 +4,10 @@
 
 #include <atomic>
 #include <csignal>
+#include <cstdlib>
 #include <memory>
 
+#include "tests/layers/ProcessEnd.hpp"
 #include "tests/support/BoundedWait.hpp"
 
 namespace velkor::layers {
@@ -32,6 +34,47 @@ TEST(OwnThread, GoesOnAloneWhenItEndsItsOwner) {
     owned->countDown();
 
     EXPECT_TRUE(finished->wait());
+}
+
+using Owner = std::unique_ptr<OwnThread>;
+
+[[noreturn]] void endWhileOneGoesOnAlone() {
+    const auto owner = std::make_shared<Owner>();
+    const auto owned = std::make_shared<velkor::testing::Latch>();
+    const auto ended = std::make_shared<velkor::testing::Latch>();
+    *owner = std::make_unique<OwnThread>([owner, owned, ended] {
+        if (!owned->wait()) return;
+        owner->reset();
+        ended->countDown();
+        velkor::testing::outlastTheEnd();
+    });
+    owned->countDown();
+    if (!ended->wait()) std::_Exit(EXIT_FAILURE);
+    velkor::testing::endProcess();
+}
+
+[[noreturn]] void endWhileOneHasTheLastReference() {
+    auto owner = std::make_shared<Owner>();
+    const auto borrowed = std::make_shared<velkor::testing::Latch>();
+    *owner = std::make_unique<OwnThread>([weak = std::weak_ptr(owner), borrowed] {
+        const OwnThread::Borrowing waitedFor;
+        const auto borrowedOwner = weak.lock();
+        borrowed->countDown();
+        velkor::testing::outlastTheEnd();
+    });
+    if (!borrowed->wait()) std::_Exit(EXIT_FAILURE);
+    owner.reset();
+    velkor::testing::endProcess();
+}
+
+TEST(OwnThread, IsWaitedForByTheEndOfTheProcessWhenItGoesOnAlone) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(endWhileOneGoesOnAlone(), ::testing::ExitedWithCode(0), "waited for");
+}
+
+TEST(OwnThread, IsWaitedForByTheEndOfTheProcessWhileItBorrows) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(endWhileOneHasTheLastReference(), ::testing::ExitedWithCode(0), "waited for");
 }
 
 bool blocks(int signal) {

@@ -14,7 +14,6 @@
 #include "layers/etcd/detail/Endpoint.hpp"
 #include "layers/etcd/detail/Outbox.hpp"
 #include "layers/etcd/detail/Replica.hpp"
-#include "layers/etcd/detail/Running.hpp"
 #include "layers/etcd/detail/Standing.hpp"
 #include "layers/etcd/detail/Stop.hpp"
 
@@ -45,8 +44,6 @@ struct Core {
     Standing standing;
     Replica replica;          // used by mutations alone, see `Replica`
     ChangeTable changeTable;  // set before the threads start
-    Running reading;
-    Running writing;
 };
 
 /// Writes a record of `parts` that is no matter of life and death: what a sink of the log throws is

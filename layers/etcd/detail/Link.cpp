@@ -2,8 +2,6 @@
 
 #include <arpa/inet.h>
 #include <netdb.h>
-#include <netinet/in.h>
-#include <netinet/tcp.h>
 #include <openssl/err.h>
 #include <openssl/ssl.h>
 #include <openssl/x509v3.h>
@@ -18,6 +16,7 @@
 #include <string>
 #include <system_error>
 
+#include "layers/etcd/detail/Connecting.hpp"
 #include "layers/etcd/detail/GatewayErrors.hpp"
 #include "layers/etcd/detail/Tls.hpp"
 
@@ -38,10 +37,6 @@ Addresses addressesOf(const Endpoint& endpoint) {
         ::getaddrinfo(endpoint.host.c_str(), endpoint.port.c_str(), &wanted, &found);
     if (problem != 0) throw Unreachable(::gai_strerror(problem));
     return {found, ::freeaddrinfo};
-}
-
-std::string textOf(int error) {
-    return std::generic_category().message(error);
 }
 
 bool isAddress(const std::string& host) {
@@ -68,41 +63,20 @@ int bounded(std::size_t size) {
 }  // namespace
 
 Link::Link(const Endpoint& endpoint, const EtcdOptions& options, const Stop& ending, Time end)
-    : stop(ending), deadline(end), tls(nullptr, ::SSL_free) {
+    : stop(ending),
+      deadline(end),
+      socket(connectToOne(*addressesOf(endpoint), ending, end)),
+      tls(nullptr, ::SSL_free) {
     try {
-        connect(endpoint);
         if (endpoint.isSecure) secure(endpoint, options);
     } catch (...) {
-        if (socket >= 0) ::close(socket);
+        ::close(socket);
         throw;
     }
 }
 
 Link::~Link() {
     ::close(socket);
-}
-
-// One address after the other; the reason of the last one counts.
-void Link::connect(const Endpoint& endpoint) {
-    std::string problem;
-    const Addresses addresses = addressesOf(endpoint);
-    for (const addrinfo* each = addresses.get(); each != nullptr; each = each->ai_next) {
-        socket = ::socket(each->ai_family, SOCK_STREAM | SOCK_NONBLOCK | SOCK_CLOEXEC, 0);
-        if (socket < 0) throw Unreachable(textOf(errno));
-        const int on = 1;
-        ::setsockopt(socket, IPPROTO_TCP, TCP_NODELAY, &on, sizeof on);
-        int error = ::connect(socket, each->ai_addr, each->ai_addrlen) == 0 ? 0 : errno;
-        if (error == EINPROGRESS) {
-            if (!stop.await(socket, POLLOUT, deadline)) throw Unreachable(textOf(ETIMEDOUT));
-            socklen_t size = sizeof error;
-            ::getsockopt(socket, SOL_SOCKET, SO_ERROR, &error, &size);
-        }
-        if (error == 0) return;
-        problem = textOf(error);
-        ::close(socket);
-        socket = -1;
-    }
-    throw Unreachable(problem);
 }
 
 void Link::secure(const Endpoint& endpoint, const EtcdOptions& options) {
@@ -121,7 +95,8 @@ void Link::secure(const Endpoint& endpoint, const EtcdOptions& options) {
     }
     error_code error;
     untilDone([this] { return ::SSL_connect(tls.get()); }, 0, error);
-    if (error == boost::asio::error::timed_out) throw Unreachable(textOf(ETIMEDOUT));
+    if (error == boost::asio::error::timed_out)
+        throw Unreachable(std::generic_category().message(ETIMEDOUT));
     if (error) throw Unreachable(tlsProblem(tls.get()));
 }
 

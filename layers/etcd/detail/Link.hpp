@@ -80,7 +80,6 @@ private:
         return {};
     }
 
-    void connect(const Endpoint& endpoint);
     void secure(const Endpoint& endpoint, const EtcdOptions& options);
     std::size_t read(void* target, std::size_t size, boost::system::error_code& error);
     std::size_t write(const void* content, std::size_t size, boost::system::error_code& error);
@@ -91,7 +90,7 @@ private:
 
     const Stop& stop;
     Time deadline;
-    int socket = -1;
+    const int socket;
     std::unique_ptr<SSL, void (*)(SSL*)> tls;
 };
 

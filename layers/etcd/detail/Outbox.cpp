@@ -6,6 +6,7 @@
 namespace velkor::layers::etcd {
 
 using common::MutexLock;
+using layers::detail::CommitWaiters;
 
 namespace {
 
@@ -69,27 +70,12 @@ void Outbox::endGroup() noexcept {
 }
 
 Future<bool> Outbox::committed() {
-    Waiters waiter(1);
-    auto future = waiter.front().promise.getFuture();
-    const auto thread = std::this_thread::get_id();
-    std::exception_ptr refused;
+    CommitWaiters::Question question;
     {
         const MutexLock lock(mutex);
-        const auto mine = untold.find(thread);
-        if (mine != untold.end()) {
-            refused = mine->second;
-            untold.erase(mine);
-        }
-        if (!groups.empty()) {
-            waiter.front().refused = refused;
-            waiter.front().upTo = lastNumber;
-            waiter.front().thread = thread;
-            waiters.splice(waiters.end(), waiter);
-            return future;
-        }
+        waiters.ask(question, groups.empty() ? std::nullopt : std::optional(lastNumber));
     }
-    if (refused) return makeFailedFuture<bool>(refused);
-    return makeReadyFuture(true);
+    return question.answer();
 }
 
 std::size_t Outbox::count() const {
@@ -138,7 +124,7 @@ void Outbox::noteTaken(const Group& group, std::int64_t revision) {
 
 // Whoever is told a reason has it alone then: it isn't under way here any more.
 std::list<Group> Outbox::finish(std::exception_ptr refused) noexcept {
-    Waiters satisfied;
+    CommitWaiters::Waiters satisfied;
     std::list<Group> finished;
     {
         const MutexLock lock(mutex);
@@ -147,37 +133,17 @@ std::list<Group> Outbox::finish(std::exception_ptr refused) noexcept {
         writes -= group.writes.size();
         bytes -= sizeOf(group);
         if (refused) noteRefusal(group, refused);
-        const auto end = std::find_if(waiters.begin(), waiters.end(),
-                                      [&](const Waiter& each) { return each.upTo > group.number; });
-        satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
+        satisfied = waiters.takeUpTo(group.number);
     }
     refused = nullptr;
-    for (Waiter& each : satisfied) {
-        try {
-            if (each.refused) {
-                each.promise.setException(std::move(each.refused));
-            } else {
-                each.promise.setValue(true);
-            }
-        } catch (...) {
-            // Without memory the promise is broken, which its future tells as well.
-            continue;
-        }
-    }
+    CommitWaiters::tell(std::move(satisfied));
     return finished;
 }
 
-// A thread that waits is told thereby. Without memory others aren't told.
-void Outbox::noteRefusal(const Group& group, const std::exception_ptr& refused) {
-    bool isWaitedFor = false;
-    for (Waiter& each : waiters) {
-        if (each.upTo < group.number) continue;
-        if (!each.refused) each.refused = refused;
-        isWaitedFor = isWaitedFor || each.thread == group.writer;
-    }
-    if (isWaitedFor) return;
+// Without memory, those who don't wait aren't told.
+void Outbox::noteRefusal(const Group& group, const std::exception_ptr& refused) noexcept {
     try {
-        untold.try_emplace(group.writer, refused);
+        waiters.noteRefusal(group.writer, group.number, refused);
     } catch (...) {
         return;
     }

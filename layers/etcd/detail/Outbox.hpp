@@ -6,13 +6,13 @@
 #include <cstdint>
 #include <exception>
 #include <list>
-#include <map>
 #include <optional>
 #include <string>
 #include <thread>
 
 #include "framework/Future.hpp"
 #include "framework/common/Mutex.hpp"
+#include "layers/detail/CommitWaiters.hpp"
 #include "layers/etcd/detail/Requests.hpp"
 
 namespace velkor::layers::etcd {
@@ -86,17 +86,10 @@ public:
     void refuseAll(std::exception_ptr reason) noexcept VELKOR_EXCLUDES(mutex);
 
 private:
-    struct Waiter {
-        Promise<bool> promise{};
-        std::int64_t upTo = 0;
-        std::thread::id thread{};
-        std::exception_ptr refused{};
-    };
-    using Waiters = std::list<Waiter>;
-
     Group& openGroup() VELKOR_REQUIRES(mutex);
     bool isOpen(const Group& group) const VELKOR_REQUIRES(mutex);
-    void noteRefusal(const Group& group, const std::exception_ptr& refused) VELKOR_REQUIRES(mutex);
+    void noteRefusal(const Group& group, const std::exception_ptr& refused) noexcept
+        VELKOR_REQUIRES(mutex);
 
     mutable common::Mutex mutex;
     std::condition_variable wakeUp;
@@ -107,10 +100,8 @@ private:
     std::size_t openings VELKOR_GUARDED_BY(mutex) = 0;
     std::thread::id opener VELKOR_GUARDED_BY(mutex){};
     std::int64_t openNumber VELKOR_GUARDED_BY(mutex) = 0;  // 0: the group has no write yet
-    Waiters waiters VELKOR_GUARDED_BY(mutex);
+    layers::detail::CommitWaiters waiters VELKOR_GUARDED_BY(mutex);
     bool ended VELKOR_GUARDED_BY(mutex) = false;
-    // Threads some of whose writes were refused since they last asked, and why.
-    std::map<std::thread::id, std::exception_ptr> untold VELKOR_GUARDED_BY(mutex);
 };
 
 }  // namespace velkor::layers::etcd

@@ -96,7 +96,6 @@ JournalEntry Committer::find(std::optional<std::int64_t> change) {
 }
 
 void Committer::run(const ChangeTable& changeTable) {
-    runner = std::this_thread::get_id();
     for (;;) {
         switch (writes.awaitTask(clock)) {
             case WriteQueue::Task::commit:

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <atomic>
 #include <chrono>
 #include <cstdint>
 #include <exception>
@@ -8,7 +7,6 @@
 #include <functional>
 #include <optional>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "configuration/ConfigurationValue.hpp"
@@ -55,13 +53,6 @@ public:
     /// ended and empty.
     void run(const ChangeTable& changeTable);
 
-    /// Whether the calling thread is the one in `run`.
-    bool runsHere() const noexcept { return runner.load() == std::this_thread::get_id(); }
-
-    /// Nobody will wait for the thread, which is the calling one.
-    void goOnAlone() noexcept { alone = true; }
-    bool isAlone() const noexcept { return alone; }
-
     /// Takes what has expired out of `values` and gives its keys. Without memory or room it is left
     /// for later.
     Keys expire(configuration::ValueTable& values);
@@ -82,8 +73,6 @@ private:
     StateFile file;
     WriteQueue writes;
     DiskHealth disk;
-    std::atomic<std::thread::id> runner{};
-    bool alone = false;  // used by the thread in `run` alone
 };
 
 }  // namespace velkor::layers::detail

@@ -1,7 +1,9 @@
 #include "layers/sqlite/detail/WriteQueue.hpp"
 
 #include <algorithm>
+#include <map>
 #include <new>
+#include <thread>
 #include <unordered_set>
 #include <utility>
 
@@ -39,26 +41,12 @@ WriteQueue::Keys keysOf(const Writes& writes) {
     return keys;
 }
 
-/// Runs `resolve` on each waiter. A promise for which memory is short is broken, which its future
-/// tells as well.
-template <class Resolve>
-void tellAll(WriteQueue::Waiters& waiters, Resolve resolve) noexcept {
-    for (WriteQueue::Waiter& each : waiters) {
-        try {
-            resolve(each);
-        } catch (...) {
-            continue;
-        }
-    }
-}
-
 }  // namespace
 
 void WriteQueue::Refusal::tell() noexcept {
-    tellAll(waiters, [this](Waiter& each) {
-        const bool isLast = &each == &waiters.back();
-        each.promise.setException(isLast ? std::move(reason) : reason);
-    });
+    CommitWaiters::refuse(waiters, reason);
+    reason = nullptr;
+    CommitWaiters::tell(std::move(waiters));
 }
 
 WriteQueue::WriteQueue(std::int64_t newestChange, Deadlines::Map&& initialDeadlines)
@@ -82,27 +70,13 @@ std::int64_t WriteQueue::accept(PreparedWrite&& write) noexcept {
 }
 
 Future<bool> WriteQueue::committed() {
-    Waiters waiter(1);
-    auto future = waiter.front().promise.getFuture();
-    const auto thread = std::this_thread::get_id();
-    std::exception_ptr refused;
+    CommitWaiters::Question question;
     {
         const MutexLock lock(mutex);
-        const auto mine = untold.find(thread);
-        if (mine != untold.end()) {
-            refused = mine->second;
-            untold.erase(mine);
-        }
-        if (!waiting.empty() || !committing.empty()) {
-            waiter.front().refused = refused;
-            waiter.front().upTo = lastChange;
-            waiter.front().thread = thread;
-            waiters.splice(waiters.end(), waiter);
-            return future;
-        }
+        const bool isIdle = waiting.empty() && committing.empty();
+        waiters.ask(question, isIdle ? std::nullopt : std::optional(lastChange));
     }
-    if (refused) return makeFailedFuture<bool>(refused);
-    return makeReadyFuture(true);
+    return question.answer();
 }
 
 std::optional<JournalEntry> WriteQueue::find(std::optional<std::int64_t> change) const {
@@ -151,28 +125,23 @@ void WriteQueue::begin() noexcept {
 void WriteQueue::finish() {
     const std::size_t weight = totalWeight(committing);
     Writes done;
-    Waiters satisfied;
+    CommitWaiters::Waiters satisfied;
     {
         const MutexLock lock(mutex);
         const std::int64_t upTo = committing.back().entry.change;
         done.swap(committing);
         bytes -= weight;
         expiryPostponedUntil = {};
-        const auto end = std::find_if(waiters.begin(), waiters.end(),
-                                      [upTo](const Waiter& each) { return each.upTo > upTo; });
-        satisfied.splice(satisfied.end(), waiters, waiters.begin(), end);
+        satisfied = waiters.takeUpTo(upTo);
     }
-    tellAll(satisfied, [](Waiter& each) {
-        if (each.refused) return each.promise.setException(each.refused);
-        each.promise.setValue(true);
-    });
+    CommitWaiters::tell(std::move(satisfied));
 }
 
 WriteQueue::Keys WriteQueue::takeBack(ValueTable* values, Refusal& refusal) {
     const MutexLock lock(mutex);
     waiting.splice(waiting.begin(), committing);
     Keys keys = keysOf(waiting);
-    noteWhoIsToBeTold(refusal);
+    noteRefusal(refusal.reason);
     try {
         while (!waiting.empty()) {
             restore(values, waiting.back());
@@ -182,21 +151,16 @@ WriteQueue::Keys WriteQueue::takeBack(ValueTable* values, Refusal& refusal) {
     } catch (const std::bad_alloc&) {
         return keys;
     }
-    refusal.waiters.splice(refusal.waiters.end(), waiters);
+    refusal.waiters = waiters.takeAll();
     refusal.isDone = true;
     return keys;
 }
 
-// A thread that waits is told thereby of what it wrote before.
-void WriteQueue::noteWhoIsToBeTold(const Refusal& refusal) {
+void WriteQueue::noteRefusal(const std::exception_ptr& reason) {
     std::map<std::thread::id, std::int64_t> refusedUpTo;
     for (const Write& write : waiting) refusedUpTo[write.writer] = write.entry.change;
     refusedUpTo.erase(std::thread::id());
-    for (const Waiter& each : waiters) {
-        const auto found = refusedUpTo.find(each.thread);
-        if (found != refusedUpTo.end() && found->second <= each.upTo) refusedUpTo.erase(found);
-    }
-    for (const auto& each : refusedUpTo) untold[each.first] = refusal.reason;
+    for (const auto& [thread, last] : refusedUpTo) waiters.noteRefusal(thread, last, reason);
 }
 
 void WriteQueue::restore(ValueTable* values, const Write& write) {

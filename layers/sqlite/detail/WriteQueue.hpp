@@ -6,16 +6,14 @@
 #include <cstdint>
 #include <exception>
 #include <functional>
-#include <list>
-#include <map>
 #include <optional>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "configuration/sources/ValueTable.hpp"
 #include "framework/Future.hpp"
 #include "framework/common/Mutex.hpp"
+#include "layers/detail/CommitWaiters.hpp"
 #include "layers/sqlite/detail/Deadlines.hpp"
 #include "layers/sqlite/detail/Write.hpp"
 
@@ -37,20 +35,11 @@ public:
     /// What the thread of the source does next.
     enum class Task { commit, expire, end };
 
-    /// Somebody who waits until all changes up to one are on the disk.
-    struct Waiter {
-        Promise<bool> promise{};
-        std::int64_t upTo = 0;
-        std::thread::id thread{};
-        std::exception_ptr refused{};  ///< Why a write of its thread was before that, if one was.
-    };
-    using Waiters = std::list<Waiter>;
-
     /// Writes that are to be taken back, and those who are to be told.
     struct Refusal {
         std::exception_ptr reason;
         bool isDone = false;
-        Waiters waiters{};
+        CommitWaiters::Waiters waiters{};
 
         /// Fails what they wait for; the reason is theirs alone afterwards, if there are any.
         void tell() noexcept;
@@ -107,7 +96,7 @@ public:
 private:
     using Steady = std::chrono::steady_clock;
 
-    void noteWhoIsToBeTold(const Refusal& refusal) VELKOR_REQUIRES(mutex);
+    void noteRefusal(const std::exception_ptr& reason) VELKOR_REQUIRES(mutex);
     void restore(configuration::ValueTable* values, const Write& write) VELKOR_REQUIRES(mutex);
     std::chrono::nanoseconds untilExpiry(Time now) const VELKOR_REQUIRES(mutex);
 
@@ -118,12 +107,10 @@ private:
                         // changes it
     std::size_t bytes VELKOR_GUARDED_BY(mutex) = 0;
     std::int64_t lastChange VELKOR_GUARDED_BY(mutex);
-    Waiters waiters VELKOR_GUARDED_BY(mutex);
+    CommitWaiters waiters VELKOR_GUARDED_BY(mutex);
     Deadlines deadlines VELKOR_GUARDED_BY(mutex);
     Steady::time_point expiryPostponedUntil VELKOR_GUARDED_BY(mutex){};
     bool ended VELKOR_GUARDED_BY(mutex) = false;
-    // Threads some of whose writes were refused since they last asked, and why.
-    std::map<std::thread::id, std::exception_ptr> untold VELKOR_GUARDED_BY(mutex);
 };
 
 }  // namespace velkor::layers::detail

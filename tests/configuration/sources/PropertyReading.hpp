@@ -3,7 +3,7 @@
 #include <string>
 
 #include "configuration/sources/PropertyFileSource.hpp"
-#include "tests/configuration/sources/ReferencePropertyReader.hpp"
+#include "tests/support/ReferencePropertyReader.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
 namespace velkor::testing {

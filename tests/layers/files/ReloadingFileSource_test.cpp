@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "tests/layers/ProcessEnd.hpp"
 #include "tests/layers/files/FollowingStore.hpp"
 #include "tests/layers/files/SystemHooks.hpp"
 #include "tests/support/LogCapture.hpp"
@@ -448,6 +449,19 @@ TEST_P(UnreadableFile, IsLoggedOnce) {
 
 INSTANTIATE_TEST_SUITE_P(Losses, UnreadableFile, ::testing::ValuesIn(losses),
                          [](const auto& loss) { return loss.param.name; });
+
+[[noreturn]] void endWhileToldOfAFile() {
+    static FileFolder folder;
+    FileFolder::write(folder / "file", "a=1\n");
+    velkor::testing::endWhileTold(
+        std::make_shared<ReloadingFileSource>(folder / "file"),
+        [](ReloadingFileSource&) { FileFolder::replace(folder / "file", "a=2\n"); });
+}
+
+TEST_F(ReloadingFileSourceTest, IsWaitedForByTheEndOfTheProcessWhileItTells) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(endWhileToldOfAFile(), ::testing::ExitedWithCode(0), "waited for");
+}
 
 TEST_F(ReloadingFileSourceTest, NoticesWhetherItMayReadTheFile) {
     FileFolder::write(path, "key=1\n");

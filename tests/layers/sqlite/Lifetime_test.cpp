@@ -11,6 +11,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "framework/reactive_streams/CallbackSubscriber.hpp"
 #include "layers/sqlite/SqliteSource.hpp"
+#include "tests/layers/ProcessEnd.hpp"
 #include "tests/layers/sqlite/StateTesting.hpp"
 #include "tests/layers/sqlite/TestDisk.hpp"
 #include "tests/support/BoundedWait.hpp"
@@ -160,6 +161,17 @@ TEST_F(LastReferences, MayBeGivenUpByTheWriter) {
         }});
     store.get()->set("a", 2);
     expectTheirEnd();
+}
+
+[[noreturn]] void endWhileToldOfAnExpiry() {
+    static const StateFolder folder;
+    endWhileTold(SqliteSource::open(folder.file()),
+                 [](SqliteSource& source) { source.setFor("a", 1, 1ms); });
+}
+
+TEST(Lifetime, OfTheThreadIsWaitedForByTheEndOfTheProcess) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(endWhileToldOfAnExpiry(), ::testing::ExitedWithCode(0), "waited for");
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include <chrono>
 #include <filesystem>
@@ -129,6 +130,14 @@ TEST_F(EtcdUsers, MayChangeTheirPassword) {
 
 TEST_F(EtcdUsers, NeedAFileWithThePassword) {
     options.passwordFile = password.path().string() + ".none";
+    EXPECT_EQ(problemOf(cluster[0].url(), options),
+              ": can't read the password in " + options.passwordFile);
+}
+
+TEST_F(EtcdUsers, DoNotWaitForWhoeverWritesAPasswordIntoAPipe) {
+    const ServerFolder folder;
+    options.passwordFile = (folder.path() / "pipe").string();
+    ASSERT_EQ(::mkfifo(options.passwordFile.c_str(), 0600), 0);
     EXPECT_EQ(problemOf(cluster[0].url(), options),
               ": can't read the password in " + options.passwordFile);
 }

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <atomic>
 #include <chrono>
+#include <iostream>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -35,6 +36,11 @@ EtcdOptions patientWriter() {
 
 class EtcdThreeMembers : public ::testing::Test {
 protected:
+    ~EtcdThreeMembers() override {
+        if (!HasFailure()) return;
+        for (std::size_t i = 0; i < cluster.size(); ++i) std::cerr << cluster[i].report();
+    }
+
     EtcdCluster cluster{3};
 };
 
@@ -48,16 +54,18 @@ TEST_F(EtcdThreeMembers, GoOnWithoutTheirLeader) {
     ASSERT_EQ(writer.refusal(), "");
     cluster[leader].kill();
     // What is sent while there is no leader, or another one, may be of unknown outcome.
+    std::string refusal;
     const auto takes = [&](int value) {
         return comesAbout([&] {
             writer.store->set("a", value);
-            return writer.refusal().empty();
+            refusal = writer.refusal();
+            return refusal.empty();
         });
     };
-    ASSERT_TRUE(takes(2));
+    ASSERT_TRUE(takes(2)) << refusal;
     EXPECT_TRUE(reader.shows("a", "int 2"));
     cluster[leader].start();
-    ASSERT_TRUE(takes(3));
+    ASSERT_TRUE(takes(3)) << refusal;
     EXPECT_TRUE(reader.shows("a", "int 3"));
 }
 

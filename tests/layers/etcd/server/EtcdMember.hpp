@@ -6,14 +6,18 @@
 #include <signal.h>
 #include <sys/prctl.h>
 #include <sys/socket.h>
+#include <sys/un.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
 #include <chrono>
+#include <cstddef>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
+#include <iterator>
 #include <memory>
 #include <random>
 #include <stdexcept>
@@ -36,12 +40,28 @@ template <class Condition>
     return true;
 }
 
-/// A port of the loopback interface that nobody uses now, and that the system gives nobody who asks
-/// for any.
+/// Whether the calling program is the only one that has claimed this port, which is its own then
+/// until it ends: a server that was given a port has it a while later only.
+inline bool claims(int port) {
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    // A name without a file, which begins with a zero.
+    const std::string name = "velkor-test-port-" + std::to_string(port);
+    name.copy(address.sun_path + 1, sizeof address.sun_path - 1);
+    const int claim = ::socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    const auto size = static_cast<socklen_t>(offsetof(sockaddr_un, sun_path) + 1 + name.size());
+    if (::bind(claim, reinterpret_cast<sockaddr*>(&address), size) == 0) return true;
+    ::close(claim);
+    return false;
+}
+
+/// A port of the loopback interface that nobody uses now, that no other test is given, and that the
+/// system gives nobody who asks for any.
 inline int freePort() {
     static std::random_device random;
     for (;;) {
         const int port = std::uniform_int_distribution<>(20'000, 32'000)(random);
+        if (!claims(port)) continue;
         const int socket = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
         sockaddr_in address{};
         address.sin_family = AF_INET;
@@ -152,7 +172,7 @@ public:
         if (process <= 0) start();
         thaw();
         if (!comesAbout([this] { return answers(); })) {
-            throw std::runtime_error("etcd doesn't start");
+            throw std::runtime_error("etcd doesn't start: " + report());
         }
     }
 
@@ -172,6 +192,18 @@ public:
     std::string ctl(const std::string& command) const {
         return outputOf("ETCDCTL_API=3 etcdctl --command-timeout=20s --endpoints=" + url() + " " +
                         options + " " + command);
+    }
+
+    /// What the process has said, and what it says of itself now.
+    std::string report() const {
+        std::ifstream log(folder.path() / "log");
+        std::string text{std::istreambuf_iterator<char>(log), {}};
+        try {
+            text += ctl("--command-timeout=2s endpoint status -w fields");
+        } catch (const std::runtime_error& error) {
+            text += error.what();
+        }
+        return name + " at " + url() + ":\n" + text + '\n';
     }
 
     /// For each call of etcdctl from now on.

@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "layers/testing/detail/SampleValues.hpp"
+#include "tests/layers/ProcessEnd.hpp"
 #include "tests/layers/etcd/server/EtcdMember.hpp"
 #include "tests/layers/etcd/server/FaultProxy.hpp"
 #include "tests/layers/etcd/server/FleetProcess.hpp"
@@ -376,6 +377,13 @@ TEST_F(EtcdSourceTest, ServesReadersWhileTheServerIsSlow) {
     fleet.store->set("b", 2);
     EXPECT_EQ(fleet.at("b"), "int 2");
     EXPECT_EQ(fleet.refusal(), "");
+}
+
+TEST_F(EtcdSourceTest, IsWaitedForByTheEndOfTheProcessWhileItTells) {
+    GTEST_FLAG_SET(death_test_style, "threadsafe");
+    EXPECT_EXIT(endWhileTold(layers::EtcdSource::open(cluster->urls(), prefix),
+                             [this](layers::EtcdSource&) { put("a", "1"); }),
+                ::testing::ExitedWithCode(0), "waited for");
 }
 
 }  // namespace

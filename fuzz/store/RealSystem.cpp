@@ -1,0 +1,222 @@
+#include "fuzz/store/RealSystem.hpp"
+
+#include <utility>
+
+#include "configuration/sources/PropertyFileSource.hpp"
+#include "fuzz/Values.hpp"
+
+namespace velkor::fuzz::store {
+
+namespace {
+
+/// What a call is answered with. A future that fails is told from a call that throws.
+template <class Call, class Spell>
+std::string answerOf(Call call, Spell spell) {
+    auto future = call();
+    try {
+        return spell(future.get());
+    } catch (const std::exception& error) {
+        return std::string("fails ") + error.what();
+    }
+}
+
+std::string spelledHolders(const std::vector<configuration::Option>& holders) {
+    std::string all;
+    for (const auto& option : holders) all += spelledOption(option) + "; ";
+    return all;
+}
+
+std::string spelledSources(const std::vector<configuration::SourceDescription>& sources) {
+    std::string all;
+    for (const auto& source : sources) {
+        all += source.name + '|' + source.group + '|' + std::to_string(source.order) + '|' +
+               spelledBool(source.readOnly) + ' ';
+    }
+    return all;
+}
+
+std::string spelledOutcome(const std::vector<configuration::AppliedChange>& changes) {
+    std::string all;
+    for (const auto& change : changes) {
+        all += change.key + " in " + change.source + " was " +
+               (change.before ? exactly(*change.before) : "nothing") + "; ";
+    }
+    return all;
+}
+
+std::string fileOf(const configuration::ValueMap& values) {
+    std::string text;
+    for (const auto& [key, value] : values) {
+        text += key + '=' + boost::get<std::string>(value) + '\n';
+    }
+    return text;
+}
+
+// A page has two keys at most, and one unless there are no more.
+std::vector<std::string> pagesFrom(configuration::ConfigurationImpl& store, std::string first) {
+    constexpr std::size_t most = 2;
+    std::vector<std::string> all;
+    for (;;) {
+        const auto page = store.keysFrom(first, most).get();
+        if (page.empty()) return all;
+        if (page.size() > most) all.emplace_back("a page that is too large");
+        all.insert(all.end(), page.begin(), page.end());
+        first = all.back() + '\0';
+    }
+}
+
+// The class of the source, which ends the record, is not the model's.
+std::string recordOf(const std::string& message) {
+    const bool isAdding = message.rfind("addSource: ", 0) == 0;
+    return isAdding ? message.substr(0, message.rfind(", ")) : message;
+}
+
+}  // namespace
+
+RealSystem::RealSystem() : store(std::make_shared<configuration::ConfigurationImpl>()) {
+    for (std::size_t i = 0; i < ownSources; ++i) {
+        own.push_back(std::make_shared<OwnSource>(*this, i));
+    }
+}
+
+void RealSystem::end() {
+    store.reset();
+    for (std::size_t i = 0; i < watches.size(); ++i) watches[i].held.reset();
+}
+
+std::string RealSystem::carryOut(const Step& step) {
+    switch (step.operation) {
+        case 'b':
+        case 'q':
+        case 'x':
+        case 'v':
+            return onWatch(step);
+        case 't':
+            own[step.number]->temper = {step.mood, step.reaction};
+            return "";
+        case 'l':
+            startCapture(step);
+            return "";
+        case 'D':
+            store.reset();
+            return "";
+        default:
+            return hasStore() ? read(step) : "no store";
+    }
+}
+
+std::string RealSystem::read(const Step& step) {
+    switch (step.operation) {
+        case 'g':
+            return answerOf([&] { return store->get(step.key); }, exactly);
+        case 'o':
+            return answerOf([&] { return store->getOption(step.key); }, spelledOption);
+        case 'h':
+            return answerOf([&] { return store->has(step.key); }, spelledBool);
+        case 'e':
+            return answerOf([&] { return store->explain(step.key); }, spelledHolders);
+        case 'k':
+            return answerOf([&] { return store->keys(); }, spelledTexts<std::set<std::string>>);
+        case 'f':
+            return spelledTexts(pagesFrom(*store, step.key));
+        case 'd':
+            return answerOf([&] { return store->describeSources(); }, spelledSources);
+        default:
+            return write(step);
+    }
+}
+
+std::string RealSystem::write(const Step& step) {
+    switch (step.operation) {
+        case 's':
+            return answerOf([&] { return store->set(step.key, step.value); }, exactly);
+        case 'S':
+            return answerOf([&] { return store->set(step.key, step.value, step.name); }, exactly);
+        case 'u':
+            return answerOf([&] { return store->unset(step.key); }, spelledBool);
+        case 'U':
+            return answerOf([&] { return store->unset(step.key, step.name); }, spelledBool);
+        case 'a':
+            return answerOf([&] { return store->apply(step.changes, step.flag); }, spelledOutcome);
+        default:
+            return changeSources(step);
+    }
+}
+
+std::string RealSystem::changeSources(const Step& step) {
+    const auto add = [&](std::shared_ptr<configuration::ConfigurationSource> source) {
+        return answerOf(
+            [&] {
+                return store->addSource(step.name, step.group, step.order, step.flag,
+                                        std::move(source));
+            },
+            spelledBool);
+    };
+    switch (step.operation) {
+        case 'm':
+            return answerOf(
+                [&] {
+                    return store->addInMemorySource(step.name, step.group, step.order, step.flag,
+                                                    configuration::ValueMap(step.values));
+                },
+                spelledBool);
+        case 'p':
+            return add(std::make_shared<configuration::PropertyFileSource>(
+                configuration::PropertyText{fileOf(step.values)}));
+        case 'c':
+            return add(own[step.number]);
+        case 'r':
+            return answerOf([&] { return store->removeSource(step.name); }, spelledBool);
+        case 'i':
+            return exactly(own[step.number]->set(step.key, step.value));
+        default:
+            return watch(step);
+    }
+}
+
+std::string RealSystem::watch(const Step& step) {
+    const std::size_t number = watches.size();
+    watches.emplace_back();
+    const auto publisher = store->watchOption(step.key);
+    if (step.flag) watches[number].held = publisher;
+    subscribe(*publisher, number, step);
+    return "";
+}
+
+void RealSystem::subscribe(Publisher& publisher, std::size_t number, const Step& step) {
+    publisher.subscribe(std::make_shared<Watcher>(*this, number, step, [this, number](auto opened) {
+        watches[number].subscription = std::move(opened);
+    }));
+}
+
+std::string RealSystem::onWatch(const Step& step) {
+    if (watches.empty()) return "no watch";
+    const std::size_t number = step.number % watches.size();
+    if (step.operation == 'v') {
+        const auto givenUp = std::move(watches[number].held);
+        return "";
+    }
+    if (step.operation == 'b') {
+        const auto publisher = watches[number].held;
+        if (publisher) subscribe(*publisher, number, step);
+        return "";
+    }
+    const auto subscription = watches[number].subscription.lock();
+    if (subscription == nullptr) return "";
+    if (step.operation == 'q') {
+        subscription->request(step.demand);
+    } else {
+        subscription->cancel();
+    }
+    return "";
+}
+
+void RealSystem::startCapture(const Step& step) {
+    startRecording(step);
+    if (capture) return;
+    capture.emplace("velkor::configuration", common::debug);
+    capture->whenRecorded(
+        [this](const velkor::testing::LogRecord& written) { record(recordOf(written.message)); });
+}
+
+}  // namespace velkor::fuzz::store
