@@ -215,13 +215,14 @@ Future<ConfigurationValue> ConfigurationImpl::write(const detail::RegisteredSour
     storeLogger.write(common::debug, "set: ", key, "@", target.name);
     detail::KeyBuffer buffer(sources.keyBuffers());
     const std::string& relativeKey = buffer.within(target.group, key);
+    Answer<ConfigurationValue> answer;
     if (target.reportsChanges) {
-        return makeReadyFuture(target.source->set(relativeKey, std::move(value)));
+        return answer.with(target.source->set(relativeKey, std::move(value)));
     }
     const detail::AwaitedReport report(awaited, key);
-    ConfigurationValue answer = target.source->set(relativeKey, std::move(value));
+    ConfigurationValue replaced = target.source->set(relativeKey, std::move(value));
     if (!report.hasCome()) reportChange("", key);
-    return makeReadyFuture(std::move(answer));
+    return answer.with(std::move(replaced));
 }
 
 // Called for each change of a source: by the listener in it, or by the store where there is none.

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <exception>
 #include <iterator>
+#include <new>
 #include <stdexcept>
 #include <string_view>
 #include <unordered_set>
@@ -15,6 +16,7 @@
 #include "configuration/detail/ChangeList.hpp"
 #include "configuration/detail/Lookup.hpp"
 #include "configuration/detail/StoreOperation.hpp"
+#include "configuration/detail/SubscriberErrors.hpp"
 #include "configuration/detail/Transaction.hpp"
 #include "configuration/detail/WatchList.hpp"
 
@@ -45,13 +47,28 @@ void serve(detail::StoreLock::Level& level, ChangeList::Due& due) {
     if (!due.empty()) level.releasedWhile([&] { due.serve(); });
 }
 
-// `keys` without those that stood before, in their order.
-std::vector<std::string> unique(const std::vector<std::string>& keys) {
-    std::unordered_set<std::string_view> seen;
-    std::vector<std::string> first;
-    std::copy_if(keys.begin(), keys.end(), std::back_inserter(first),
-                 [&](const std::string& key) { return seen.insert(key).second; });
-    return first;
+// `keys` without those that stood before, in their order. All of them without the memory for that:
+// who is told of a key twice misses nothing.
+std::vector<std::string> unique(std::vector<std::string>&& keys) noexcept {
+    try {
+        std::unordered_set<std::string_view> seen;
+        std::vector<std::string> first;
+        std::copy_if(keys.begin(), keys.end(), std::back_inserter(first),
+                     [&](const std::string& key) { return seen.insert(key).second; });
+        return first;
+    } catch (const std::bad_alloc&) {
+        return std::move(keys);
+    }
+}
+
+// The keys that `changes` change, whether or not their sources report it.
+std::vector<std::string> changedKeys(const std::vector<Change>& changes,
+                                     const std::vector<AppliedChange>& outcome) {
+    std::vector<std::string> keys;
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        if (changes[i].value || outcome[i].before) keys.push_back(changes[i].key);
+    }
+    return keys;
 }
 
 }  // namespace
@@ -111,11 +128,12 @@ Future<bool> ConfigurationImpl::forget(const Change& change,
     if (!refusal.empty()) return failed<bool>(refusal);
     storeLogger.write(common::debug, "unset: ", change.key, "@", target->name);
     detail::KeyBuffer buffer(sources.keyBuffers());
+    const std::string& relativeKey = buffer.within(target->group, change.key);
+    Answer<bool> answer;
     const detail::AwaitedReport report(awaited, change.key);
-    const bool known =
-        target->forgetting->unset(buffer.within(target->group, change.key)).has_value();
+    const bool known = target->forgetting->unset(relativeKey).has_value();
     if (known && !target->reportsChanges && !report.hasCome()) reportChange("", change.key);
-    return makeReadyFuture(known);
+    return answer.with(known);
 }
 
 Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Change>& changes,
@@ -127,19 +145,17 @@ Future<std::vector<AppliedChange>> ConfigurationImpl::apply(const std::vector<Ch
         return failed<std::vector<AppliedChange>>(store_errors::changesRefused + refusals);
     }
     const auto& outcome = transaction.outcome();
-    if (dryRun) return makeReadyFuture(outcome);
-    std::vector<std::string> changed;
+    auto answer = makeReadyFuture(outcome);
+    if (dryRun) return answer;
+    // Sources that report nothing to the store, or not yet, change all the same.
+    std::vector<std::string> changed = changedKeys(changes, outcome);
     {
         const Deferral deferral(deferred, changed);
         transaction.write(sources);
     }
-    // Sources that report nothing to the store, or not yet, have changed all the same.
-    for (std::size_t i = 0; i < changes.size(); ++i) {
-        if (changes[i].value || outcome[i].before) changed.push_back(changes[i].key);
-    }
     if (!changed.empty()) version.fetch_add(1, std::memory_order_release);
-    tellAll(operation.mutexLevel(), unique(changed));
-    return makeReadyFuture(outcome);
+    tellAll(operation.mutexLevel(), unique(std::move(changed)));
+    return answer;
 }
 
 class ConfigurationImpl::Host final : public SourceHost {
@@ -180,14 +196,22 @@ void ConfigurationImpl::changeTogether(const std::function<void()>& change) {
             failure = std::current_exception();
         }
     }
-    tellAll(operation.mutexLevel(), unique(changed));
+    tellAll(operation.mutexLevel(), unique(std::move(changed)));
     if (failure) std::rethrow_exception(failure);
 }
 
 void ConfigurationImpl::onSourceChanged(const std::string& group, const std::string& key) {
     Operation operation(*this);
     detail::KeyBuffer buffer(sources.keyBuffers());
-    const std::string& fullKey = buffer.joined(group, key);
+    const std::string* joined = nullptr;
+    try {
+        joined = &buffer.joined(group, key);
+    } catch (const std::bad_alloc&) {
+        if (deferred != nullptr) throw;
+        changeStreams->failAll(std::current_exception());
+        return detail::reportSubscriberError("value", key);
+    }
+    const std::string& fullKey = *joined;
     detail::AwaitedReport::note(awaited, fullKey);
     if (deferred != nullptr) return deferred->push_back(fullKey);
     if (!changeStreams->empty()) {

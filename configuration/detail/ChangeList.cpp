@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <list>
+#include <new>
 #include <string_view>
 #include <utility>
 
@@ -49,22 +50,28 @@ void ChangeList::Due::serve() {
     streams.clear();
 }
 
-ChangeList::Due::Stream& ChangeList::Due::of(const std::shared_ptr<ChangePublisher>& publisher,
-                                             const std::string& prefix) {
+void ChangeList::Due::note(const Entry& entry) noexcept {
     const auto noted = std::find_if(streams.begin(), streams.end(), [&](const Stream& stream) {
-        return stream.publisher == publisher;
+        return stream.publisher == entry.publisher;
     });
-    if (noted != streams.end()) return *noted;
-    return streams.emplace_back(Stream{publisher, prefix, nullptr});
+    if (noted != streams.end()) {
+        noted->failure = entry.failure;
+        return;
+    }
+    try {
+        streams.emplace_back(Stream{entry.publisher, entry.prefix, entry.failure});
+    } catch (const std::bad_alloc&) {
+        return;  // what is kept, or missing, shows with the next change
+    }
 }
 
 void ChangeList::add(std::shared_ptr<ChangePublisher> publisher, const std::string& prefix,
                      std::uint64_t streamId) {
-    entries.push_back({std::move(publisher), prefix, streamId});
+    entries.push_back({std::move(publisher), prefix, streamId, nullptr});
 }
 
 void ChangeList::keep(SourceRegistry& sources, const std::string& key, std::uint64_t version,
-                      Due& due) const {
+                      Due& due) {
     const auto isTold = [&](const Entry& entry) { return begins(entry.prefix, key); };
     if (std::none_of(entries.begin(), entries.end(), isTold)) return;
     std::list<OptionChange> change;
@@ -79,11 +86,18 @@ void ChangeList::keep(SourceRegistry& sources, const std::string& key, std::uint
     }
     // A source may have added or cancelled streams meanwhile. From here on no foreign code runs.
     const auto last = std::find_if(entries.rbegin(), entries.rend(), isTold);
-    for (const Entry& entry : entries) {
+    for (Entry& entry : entries) {
         if (!isTold(entry)) continue;
-        Due::Stream& stream = due.of(entry.publisher, entry.prefix);
-        if (stream.failure) continue;
-        stream.failure = failure ? failure : keepIn(*entry.publisher, change, &entry == &*last);
+        if (!entry.failure) {
+            entry.failure = failure ? failure : keepIn(*entry.publisher, change, &entry == &*last);
+        }
+        due.note(entry);
+    }
+}
+
+void ChangeList::failAll(const std::exception_ptr& reason) noexcept {
+    for (Entry& entry : entries) {
+        if (!entry.failure) entry.failure = reason;
     }
 }
 

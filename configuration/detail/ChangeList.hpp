@@ -26,6 +26,8 @@ using ChangePublisher =
 /// The store's streams of changes. Not thread-safe: guarded by the store's mutex. Owns a reference
 /// to each publisher.
 class ChangeList {
+    struct Entry;
+
 public:
     /// Streams that have something to deliver, or have failed. To be served without the mutex.
     class Due {
@@ -45,7 +47,7 @@ public:
             std::exception_ptr failure;  ///< What kept a change from being kept.
         };
 
-        Stream& of(const std::shared_ptr<ChangePublisher>& publisher, const std::string& prefix);
+        void note(const Entry& entry) noexcept;
 
         boost::container::small_vector<Stream, 2> streams;
     };
@@ -58,10 +60,12 @@ public:
 
     /// Keeps what `sources` hold for `key` now in each stream that is to be told of it, as of
     /// `version`, and notes these streams in `due`. A stream that can't keep it, since a source
-    /// throws or memory is short, fails when it is served: none goes on with a change missing.
-    /// Throws `std::bad_alloc` when that can't be noted.
-    void keep(SourceRegistry& sources, const std::string& key, std::uint64_t version,
-              Due& due) const;
+    /// throws or memory is short, fails when it is served: none goes on with a change missing. One
+    /// that can't be noted for want of memory is served with its next change.
+    void keep(SourceRegistry& sources, const std::string& key, std::uint64_t version, Due& due);
+
+    /// A change is missing in every stream: each fails with its next change, for `reason`.
+    void failAll(const std::exception_ptr& reason) noexcept;
 
     /// Removes a stream and gives the list's reference back; null when there is none.
     std::shared_ptr<ChangePublisher> remove(std::uint64_t streamId);
@@ -74,6 +78,7 @@ private:
         std::shared_ptr<ChangePublisher> publisher;
         std::string prefix;
         std::uint64_t streamId;
+        std::exception_ptr failure;  // what keeps it from going on, once there is something
     };
 
     std::shared_ptr<ChangePublisher> take(std::vector<Entry>::iterator entry);

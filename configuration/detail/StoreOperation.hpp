@@ -4,9 +4,11 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <utility>
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "configuration/Loggers.hpp"
+#include "framework/detail/SharedFutureState.hpp"
 
 namespace velkor::configuration {
 
@@ -15,6 +17,30 @@ template <class T, class Error = std::runtime_error>
 Future<T> failed(const std::string& text) {
     return makeFailedFuture<T>(std::make_exception_ptr(Error(text)));
 }
+
+/// The answer of an operation that changes the store: a resolved future whose memory is taken
+/// before anything is changed, so that nothing fails for want of it afterwards.
+template <class T>
+class Answer {
+public:
+    Answer()
+        : box(std::make_unique<T>()), value(*box), state(std::make_shared<State>(std::move(box))) {}
+
+    /// The future of `result`. To be called once.
+    template <class Result>
+    Future<T> with(Result&& result) {
+        value = std::forward<Result>(result);
+        return Future<T>(std::move(state));
+    }
+
+private:
+    using State = velkor::detail::SharedFutureState<T>;
+
+    // Nobody else has the state before `with` gives it away.
+    std::unique_ptr<T> box;
+    T& value;
+    std::shared_ptr<State> state;
+};
 
 /// One operation: a level of the store's mutex. The outermost one holds a reference to the store
 /// where foreign code, which may give up all others, can run meanwhile.

@@ -88,7 +88,7 @@ void Transaction::write(SourceRegistry& sources) {
     const Groups groups(targets);
     for (std::size_t i = 0; i < changes.size(); ++i) {
         try {
-            writeOne(sources, i, changes[i].value);
+            writeOne(sources, i, std::optional(changes[i].value));
         } catch (...) {
             takeBack(sources, i + 1);
             throw;
@@ -97,14 +97,14 @@ void Transaction::write(SourceRegistry& sources) {
 }
 
 void Transaction::writeOne(SourceRegistry& sources, std::size_t index,
-                           const std::optional<ConfigurationValue>& value) {
+                           std::optional<ConfigurationValue>&& value) {
     const std::string& key = changes[index].key;
     const RegisteredSource& target = *targets[index];
     storeLogger.write(common::debug, value ? "set: " : "unset: ", key, "@", target.name);
     KeyBuffer buffer(sources.keyBuffers());
     const std::string& relativeKey = buffer.within(target.group, key);
     if (value) {
-        target.source->set(relativeKey, *value);
+        target.source->set(relativeKey, *std::move(value));
     } else if (target.forgetting != nullptr) {
         target.forgetting->unset(relativeKey);
     }
@@ -113,7 +113,8 @@ void Transaction::writeOne(SourceRegistry& sources, std::size_t index,
 void Transaction::takeBack(SourceRegistry& sources, std::size_t count) noexcept {
     while (count-- > 0) {
         try {
-            writeOne(sources, count, applied[count].before);
+            // Moved, since memory may be what is short. Nobody asks for the outcome any more.
+            writeOne(sources, count, std::move(applied[count].before));
         } catch (...) {
             // The source refuses: the others are restored all the same.
             continue;

@@ -34,7 +34,7 @@ public:
 
 private:
     void writeOne(SourceRegistry& sources, std::size_t index,
-                  const std::optional<ConfigurationValue>& value);
+                  std::optional<ConfigurationValue>&& value);
     void takeBack(SourceRegistry& sources, std::size_t count) noexcept;
 
     const std::vector<Change>& changes;

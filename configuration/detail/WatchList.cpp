@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <new>
 #include <utility>
 
 #include "configuration/Loggers.hpp"
@@ -47,6 +48,16 @@ WatchList::Publishers WatchList::watching(const std::string& key) const {
 
 void WatchList::update(StoreLock::Level& level, SourceRegistry& sources,
                        const std::string& key) const {
+    try {
+        readAndTell(level, sources, key);
+    } catch (const std::bad_alloc&) {
+        // The change has been made: whoever makes it must not take it for one that has failed.
+        reportSubscriberError("value", key);
+    }
+}
+
+void WatchList::readAndTell(StoreLock::Level& level, SourceRegistry& sources,
+                            const std::string& key) const {
     storeLogger.write(common::debug, "updatePublishers: ", key);
     // Reading a value for nobody is left out where neither the log nor a source would show it.
     const bool noticed = sources.hasAskedSources() || storeLogger.isEnabled(common::debug);

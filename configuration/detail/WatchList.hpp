@@ -40,8 +40,9 @@ public:
 
     /// Publishes the value of `key` in `sources`, if there is one, to the watchers of exactly that
     /// key, with `level` released. What escapes from one is reported on standard error as "Error in
-    /// configuration value subscriber: " and the key. What a source or a log sink throws passes on,
-    /// and so does `std::system_error` of `level`.
+    /// configuration value subscriber: " and the key, and so is, once, that there is no memory to
+    /// read the value. What else a source or a log sink throws passes on, and so does
+    /// `std::system_error` of `level`.
     void update(StoreLock::Level& level, SourceRegistry& sources, const std::string& key) const;
 
     /// Removes a watch and gives the list's reference back; null when there is none.
@@ -72,6 +73,8 @@ private:
                 boost::multi_index::member<PublisherEntry, std::string, &PublisherEntry::key>,
                 std::hash<std::string>>>>;
 
+    void readAndTell(StoreLock::Level& level, SourceRegistry& sources,
+                     const std::string& key) const;
     std::shared_ptr<WatchPublisher> take(Entries::iterator entry);
 
     Entries entries;

@@ -9,8 +9,9 @@
 #include <boost/smart_ptr/make_shared.hpp>
 #include <locale>
 #include <map>
-#include <mutex>
 #include <utility>
+
+#include "framework/common/Mutex.hpp"
 
 namespace velkor::common {
 
@@ -42,16 +43,16 @@ public:
     Channels(const Channels&) = delete;
     Channels& operator=(const Channels&) = delete;
 
-    std::atomic<unsigned>& enabled(const std::string& channel) {
-        const std::lock_guard<std::mutex> lock(mutex);
+    std::atomic<unsigned>& enabled(const std::string& channel) VELKOR_EXCLUDES(mutex) {
+        const MutexLock lock(mutex);
         return severities.try_emplace(channel, enabledByDefault).first->second;
     }
 
 private:
     boost::shared_ptr<logging::core> core;
     boost::shared_ptr<SilentSink> silence;
-    std::mutex mutex;
-    std::map<std::string, std::atomic<unsigned>> severities;  // guarded by mutex
+    Mutex mutex;
+    std::map<std::string, std::atomic<unsigned>> severities VELKOR_GUARDED_BY(mutex);
 };
 
 // Made on first use, since loggers are made while other libraries are still being initialised.

@@ -32,8 +32,10 @@ std::string formatTable(const std::vector<Row>& rows) {
     for (const Row& row : rows) {
         std::size_t missingBlanks = 0;
         for (std::size_t column = 0; column < row.size(); ++column) {
-            if (!row[column].empty()) text.append(missingBlanks, ' ') += row[column];
-            if (!row[column].empty()) missingBlanks = 0;
+            if (!row[column].empty()) {
+                text.append(missingBlanks, ' ') += row[column];
+                missingBlanks = 0;
+            }
             missingBlanks += widths[column] - characterCount(row[column]) + gap;
         }
         text += '\n';

@@ -321,6 +321,18 @@ TEST_F(SourceRegistry, RemovalUncoversTheNextSource) {
     EXPECT_EQ(valueOf("a"), "int 2");
 }
 
+TEST_F(SourceRegistry, FindsASourceByItsName) {
+    const auto source = addHooked("extra", "group", 5);
+    EXPECT_EQ(store->findSource("extra").get(), source);
+    EXPECT_EQ(store->findSource("group").get(), nullptr);
+}
+
+TEST_F(SourceRegistry, FindsNoSourceThatWasRemoved) {
+    addHooked("extra", "", 5);
+    store->removeSource("extra");
+    EXPECT_EQ(store->findSource("extra").get(), nullptr);
+}
+
 TEST_F(SourceRegistry, RemovedSourceIsAskedForItsKeysOnly) {
     const auto source = addHooked("extra", "", 5, {{"a", 1}});
     store->removeSource("extra");

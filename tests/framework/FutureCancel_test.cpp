@@ -20,6 +20,7 @@ using velkor::Promise;
 using velkor::testing::brokenPromise;
 using velkor::testing::completes;
 using velkor::testing::Latch;
+using velkor::testing::raceRounds;
 using velkor::testing::thrownText;
 
 constexpr auto cancelled = "Future has been cancelled.";
@@ -198,7 +199,7 @@ TEST_F(FutureCancel, ReleasesAContinuationThatOwnsThePromise) {
 // Races
 
 TEST(FutureCancelRace, EitherTheValueOrTheCancellationWins) {
-    for (int round = 0; round < 500; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         Promise<int> promise;
         Future<int> future = promise.getFuture();
         Latch start(2);
@@ -218,7 +219,7 @@ TEST(FutureCancelRace, EitherTheValueOrTheCancellationWins) {
 }
 
 TEST(FutureCancelRace, ContinuationRunsOrIsDroppedButEndsInAnyCase) {
-    for (int round = 0; round < 500; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         Promise<int> promise;
         Future<int> future = promise.getFuture();
         const auto witness = std::make_shared<int>(round);

@@ -27,6 +27,7 @@ using velkor::testing::completes;
 using velkor::testing::CountedValue;
 using velkor::testing::invalidArgument;
 using velkor::testing::ObservedMove;
+using velkor::testing::raceRounds;
 using velkor::testing::ResultSample;
 using velkor::testing::thrownText;
 
@@ -242,7 +243,7 @@ TEST(FutureGet, WakesWithTheBrokenPromiseText) {
 // The object may go away as soon as the result is in: what the producer still does must not touch
 // the promise, nor a state that the consumer has let go of.
 TEST(FutureGet, ConsumerMayDestroyPromiseAndFutureAsSoonAsItReturns) {
-    for (int round = 0; round < 500; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         auto promise = std::make_unique<Promise<int>>();
         Future<int> future = promise->getFuture();
         std::thread producer([shared = promise.get(), round] { shared->setValue(round); });
@@ -254,7 +255,7 @@ TEST(FutureGet, ConsumerMayDestroyPromiseAndFutureAsSoonAsItReturns) {
 }
 
 TEST(FutureGet, ConsumerMayDestroyPromiseAndFutureAsSoonAsItThrows) {
-    for (int round = 0; round < 500; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         auto promise = std::make_unique<Promise<int>>();
         Future<int> future = promise->getFuture();
         std::thread producer([shared = promise.get(), error = std::make_exception_ptr(round)] {

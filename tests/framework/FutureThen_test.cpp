@@ -27,6 +27,7 @@ using velkor::testing::brokenPromise;
 using velkor::testing::completes;
 using velkor::testing::CountedValue;
 using velkor::testing::Latch;
+using velkor::testing::raceRounds;
 using velkor::testing::thrownText;
 
 class FutureThen : public ::testing::Test {
@@ -440,7 +441,7 @@ TEST_F(FutureThen, WaiterDownstreamWakes) {
 // Races
 
 TEST(FutureThenRace, AttachingWhileTheValueArrivesRunsTheCallableOnce) {
-    for (int round = 0; round < 500; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         Promise<int> promise;
         Future<int> future = promise.getFuture();
         Latch start(2);
@@ -461,7 +462,7 @@ TEST(FutureThenRace, AttachingWhileTheValueArrivesRunsTheCallableOnce) {
 }
 
 TEST(FutureThenRace, AttachingWhileThePromiseDiesRunsTheCallableOnce) {
-    for (int round = 0; round < 500; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         auto promise = std::make_unique<Promise<int>>();
         Future<int> future = promise->getFuture();
         Latch start(2);

@@ -18,12 +18,11 @@ using velkor::Future;
 using velkor::Promise;
 using velkor::testing::alreadyResolved;
 using velkor::testing::Latch;
+using velkor::testing::raceRounds;
 using velkor::testing::thrownText;
 
-constexpr int rounds = 500;
-
 TEST(PromiseRaces, OneOfTwoThreadsResolvesAndTheOtherOneIsRefused) {
-    for (int round = 0; round < rounds; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         Promise<int> promise;
         Future<int> future = promise.getFuture();
         Latch start(2);
@@ -48,7 +47,7 @@ TEST(PromiseRaces, OneOfTwoThreadsResolvesAndTheOtherOneIsRefused) {
 }
 
 TEST(PromiseRaces, OneOfTwoThreadsGetsTheFuture) {
-    for (int round = 0; round < rounds; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         Promise<int> promise;
         Latch start(2);
         std::atomic<int> futures{0};
@@ -67,7 +66,7 @@ TEST(PromiseRaces, OneOfTwoThreadsGetsTheFuture) {
 }
 
 TEST(PromiseRaces, ConsumerDestroysThePromiseAsSoonAsItHasTheResult) {
-    for (int round = 0; round < rounds; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         auto promise = std::make_unique<Promise<int>>();
         Future<int> future = promise->getFuture();
         Latch start(2);

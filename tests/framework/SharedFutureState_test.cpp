@@ -29,6 +29,7 @@ using velkor::testing::brokenPromise;
 using velkor::testing::completes;
 using velkor::testing::invalidArgument;
 using velkor::testing::Latch;
+using velkor::testing::raceRounds;
 using velkor::testing::thrownText;
 
 using State = velkor::detail::SharedFutureState<int>;
@@ -429,7 +430,7 @@ TEST(SharedFutureState, BornWithAValueRefusesAnother) {
 
 TEST(SharedFutureState, ManyThreadsSettleItOnce) {
     constexpr int producers = 4;
-    for (int round = 0; round < 100; ++round) {
+    for (int round = 0; round < raceRounds(); ++round) {
         const auto state = std::make_shared<State>();
         Latch start(producers);
         std::atomic<int> settled{0};

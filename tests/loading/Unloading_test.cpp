@@ -1,6 +1,5 @@
 #include <gtest/gtest.h>
 
-#include <fstream>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -9,6 +8,7 @@
 #include <vector>
 
 #include "tests/loading/LoadedLibrary.hpp"
+#include "tests/loading/MappedLibraries.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
@@ -18,23 +18,12 @@ namespace {
 
 using velkor::testing::Latch;
 using velkor::testing::LoadedLibrary;
+using velkor::testing::mappedLibraries;
 using velkor::testing::TemporaryFile;
 
 using UseConfiguration = void(const char*, std::string&);
 
 constexpr int rounds = 100;
-
-// The lines of the process's memory map that belong to this project's libraries.
-std::vector<std::string> mappedLibraries() {
-    std::ifstream maps("/proc/self/maps");
-    std::vector<std::string> found;
-    for (std::string line; std::getline(maps, line);) {
-        const bool ours = line.find("/libvelkor-") != std::string::npos ||
-                          line.find("/libloading-plugin") != std::string::npos;
-        if (ours) found.push_back(line);
-    }
-    return found;
-}
 
 class Unloading : public ::testing::Test {
 protected:
@@ -53,17 +42,12 @@ TEST_F(Unloading, LibrariesAreMappedWhileLoaded) {
     EXPECT_FALSE(mappedLibraries().empty());
 }
 
-TEST_F(Unloading, NothingStaysMappedOfTheFramework) {
-    for (int round = 0; round < rounds; ++round) {
-        { const LoadedLibrary framework(FRAMEWORK_LIBRARY); }
-        ASSERT_EQ(mappedLibraries(), std::vector<std::string>{});
-    }
-}
-
-TEST_F(Unloading, NothingStaysMappedOfTheConfiguration) {
-    for (int round = 0; round < rounds; ++round) {
-        { const LoadedLibrary configuration(CONFIGURATION_LIBRARY); }
-        ASSERT_EQ(mappedLibraries(), std::vector<std::string>{});
+TEST_F(Unloading, NothingStaysMappedOfAnyLibrary) {
+    for (const char* const path : {ALL_LIBRARIES}) {
+        for (int round = 0; round < rounds; ++round) {
+            { const LoadedLibrary library(path); }
+            ASSERT_EQ(mappedLibraries(), std::vector<std::string>{}) << path;
+        }
     }
 }
 

@@ -9,10 +9,10 @@
 
 namespace velkor::testing {
 
-/// How often each race is run: VELKOR_STRESS_ROUNDS, or 100000 when that is not set.
-inline int stressRounds() {
+/// How often each race is run: VELKOR_STRESS_ROUNDS, or `otherwise` when that is not set.
+inline int stressRounds(int otherwise = 100'000) {
     const char* rounds = std::getenv("VELKOR_STRESS_ROUNDS");
-    return rounds == nullptr ? 100'000 : std::stoi(rounds);
+    return rounds == nullptr ? otherwise : std::stoi(rounds);
 }
 
 /// Holds two threads until both have come, again and again. They spin, so that they leave as close
