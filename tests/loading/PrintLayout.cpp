@@ -27,9 +27,9 @@
 #include "http/Server.hpp"
 #include "http/ServerOptions.hpp"
 #include "layers/environment/EnvironmentSource.hpp"
-#include "layers/etcd/EtcdSource.hpp"
+#include "layers/etcd/EtcdOptions.hpp"
 #include "layers/files/ReloadingFileSource.hpp"
-#include "layers/sqlite/SqliteSource.hpp"
+#include "layers/sqlite/SqliteOptions.hpp"
 #include "messages/MessageService.hpp"
 #include "settings/Setting.hpp"
 #include "settings/SettingError.hpp"
@@ -160,7 +160,7 @@ void printService() {
     print<ConfigurationCommandProvider>("ConfigurationCommandProvider");
 }
 
-// What is not public of them is in the libraries.
+// Without the sources that only their own library makes.
 void printOptionalLibraries() {
     print<messages::JsonMessage>("JsonMessage");
     print<messages::JsonSerializerImpl>("JsonSerializerImpl");
@@ -176,9 +176,7 @@ void printOptionalLibraries() {
     print<layers::ReloadingFileOptions>("ReloadingFileOptions");
     print<layers::ReloadingFileSource>("ReloadingFileSource");
     print<layers::SqliteOptions>("SqliteOptions");
-    print<layers::SqliteSource>("SqliteSource");
     print<layers::EtcdOptions>("EtcdOptions");
-    print<layers::EtcdSource>("EtcdSource");
     print<http::ServerOptions>("ServerOptions");
     print<http::Server>("Server");
 }

@@ -100,7 +100,7 @@ public:
 
 private:
     Signal spelled(const configuration::ConfigurationValue& value) const {
-        return {Signal::Kind::value, key, StoreSubject::textOf(value)};
+        return {Signal::Kind::value, watchedKey, StoreSubject::textOf(value)};
     }
 
     Signal spelled(const configuration::OptionChange& change) const {
@@ -110,7 +110,7 @@ private:
                 change.version};
     }
 
-    const std::string key = log.watched;
+    const std::string watchedKey = log.watched;
     const std::uint64_t first;
     const Then then;
 };
