@@ -16,9 +16,12 @@ namespace {
 // Whether there is memory for what a subscriber does when its stream fails: opens another one.
 bool isMemoryLeft() noexcept {
     constexpr std::size_t plenty = std::size_t{16} * 1024;
-    void* const block = ::operator new(plenty, std::nothrow);
-    ::operator delete(block);
-    return block != nullptr;
+    try {
+        ::operator delete(::operator new(plenty));
+        return true;
+    } catch (const std::bad_alloc&) {
+        return false;
+    }
 }
 
 bool begins(const std::string& prefix, const std::string& key) {

@@ -115,11 +115,19 @@ bool AllocationFailureElsewhere::hasHappened() const noexcept {
 
 }  // namespace velkor::testing
 
-// The array and nothrow forms of the standard library call these.
+// The array and nothrow forms of the standard library call these; a sanitizer has its own ones.
 
 void* operator new(std::size_t size) {
     velkor::testing::countAllocation();
     return velkor::testing::require(std::malloc(size == 0 ? 1 : size));
+}
+
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    try {
+        return ::operator new(size);
+    } catch (const std::bad_alloc&) {
+        return nullptr;
+    }
 }
 
 void* operator new(std::size_t size, std::align_val_t alignment) {
