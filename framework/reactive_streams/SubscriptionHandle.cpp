@@ -22,10 +22,8 @@ void SubscriptionLink::request(std::uint64_t n) {
 }
 
 void SubscriptionLink::cancel() {
-    {
-        const common::MutexLock lock(mutex);
-        if (cancelled.exchange(true)) return;
-    }
+    // Whoever opens the link meanwhile either sees this or is found.
+    if (cancelled.exchange(true)) return;
     if (const auto opened = find()) opened->cancel();
 }
 

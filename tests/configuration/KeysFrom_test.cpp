@@ -47,6 +47,11 @@ TEST_F(KeysFrom, AreNoneInAnEmptyStore) {
     EXPECT_THAT(keysFrom("", 10), IsEmpty());
 }
 
+TEST_F(KeysFrom, AreNoneOfAnEmptyFile) {
+    addFile("file", "", "# nothing\n");
+    EXPECT_THAT(keysFrom("", 10), IsEmpty());
+}
+
 TEST_F(KeysFrom, AreTheSmallestThatAreNotLess) {
     add("one", "", 5, {{"d", 1}, {"b", 1}, {"c", 1}, {"a", 1}});
     EXPECT_THAT(keysFrom("", 2), ElementsAre("a", "b"));

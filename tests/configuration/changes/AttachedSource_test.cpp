@@ -5,12 +5,14 @@
 
 #include <functional>
 #include <memory>
+#include <mutex>
 #include <stdexcept>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "tests/configuration/changes/ChangeTesting.hpp"
+#include "tests/support/FreeMutex.hpp"
 #include "tests/support/Thrown.hpp"
 
 namespace velkor::configuration {
@@ -67,6 +69,16 @@ TEST_F(AttachedSources, AreToldWhenTheStoreGoes) {
     open.reset();
     EXPECT_THAT(source->told, ElementsAre("attach", "detach"));
     EXPECT_TRUE(source->host.expired());
+}
+
+TEST_F(AttachedSources, LoseTheirListenerWithTheMutexOfTheStoreHeldWhenItGoes) {
+    const auto source = addHosted("hosted");
+    std::recursive_mutex& mutex = open->mutex;
+    bool wasFree = true;
+    source->whenDetached = [&] { wasFree = testing::isFreeForOthers(mutex); };
+    store.reset();
+    open.reset();
+    EXPECT_FALSE(wasFree);
 }
 
 TEST_F(AttachedSources, OfOneStoreHaveTheSameHost) {

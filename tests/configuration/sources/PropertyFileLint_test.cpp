@@ -85,6 +85,15 @@ TEST(PropertyFileLint, RemarksOnEveryTextThatIsNotReadLineByLine) {
     EXPECT_GT(clean, 1000);
 }
 
+TEST(PropertyFileLint, KnowsASectionByWhatStandsBehindIt) {
+    for (const auto* const line : {"[a]", "[a] ", "[a]# b", "[a] ! b", "[a] ; b", "[a]\t;"}) {
+        EXPECT_EQ(flawsOf(line).count(PropertyFlaw::section), 1U) << line;
+    }
+    for (const auto* const line : {"[a", "[a];b", "[a]b", "[a] b", "a]"}) {
+        EXPECT_EQ(flawsOf(line).count(PropertyFlaw::section), 0U) << line;
+    }
+}
+
 TEST(PropertyFileLint, SaysWhenTheEndOfATextIsLeftOut) {
     RandomTexts texts;
     for (int round = 0; round < 20000; ++round) {
