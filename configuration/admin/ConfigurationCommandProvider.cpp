@@ -2,7 +2,9 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <ios>
 #include <locale>
+#include <new>
 #include <sstream>
 #include <string>
 #include <utility>
@@ -17,8 +19,10 @@ namespace {
 
 using Arguments = std::vector<std::string>;
 
+// Throws what keeps a text from being complete, which a stream would only note otherwise.
 std::ostringstream textStream() {
     std::ostringstream out;
+    out.exceptions(std::ios_base::badbit);
     out.imbue(std::locale::classic());
     return out;
 }
@@ -37,6 +41,8 @@ std::string setValue(Configuration& configuration, const Arguments& arguments) {
     }
     try {
         configuration.set(key, std::move(value));
+    } catch (const std::bad_alloc&) {
+        throw;
     } catch (...) {
         configuration.set(key, text);
     }
@@ -62,14 +68,15 @@ std::string listValues(Configuration& configuration, const Arguments&) {
 }
 
 struct Command {
-    const char* name;
+    std::string name;
     const char* description;
     std::string (*run)(Configuration&, const Arguments&);
     std::uint8_t minimumArguments;
     std::uint8_t maximumArguments;
 };
 
-constexpr Command commands[] = {
+// With names that take no memory any more: commands are withdrawn where there may be none left.
+const Command commands[] = {
     {"velkor.configuration.set", "Set a configuration value.", setValue, 2, 2},
     {"velkor.configuration.get", "Get a specific configuration value.", getValue, 1, 1},
     {"velkor.configuration.list", "List all configuration options.", listValues, 0, 255},

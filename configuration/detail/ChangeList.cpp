@@ -1,6 +1,7 @@
 #include "configuration/detail/ChangeList.hpp"
 
 #include <algorithm>
+#include <cstddef>
 #include <list>
 #include <new>
 #include <string_view>
@@ -11,6 +12,14 @@
 namespace velkor::configuration::detail {
 
 namespace {
+
+// Whether there is memory for what a subscriber does when its stream fails: opens another one.
+bool isMemoryLeft() noexcept {
+    constexpr std::size_t plenty = std::size_t{16} * 1024;
+    void* const block = ::operator new(plenty, std::nothrow);
+    ::operator delete(block);
+    return block != nullptr;
+}
 
 bool begins(const std::string& prefix, const std::string& key) {
     return std::string_view(key).substr(0, prefix.size()) == prefix;
@@ -91,7 +100,8 @@ void ChangeList::keep(SourceRegistry& sources, const std::string& key, std::uint
         if (!entry.failure) {
             entry.failure = failure ? failure : keepIn(*entry.publisher, change, &entry == &*last);
         }
-        due.note(entry);
+        // A stream that failed while nobody can open another one would be the last.
+        if (!entry.failure || isMemoryLeft()) due.note(entry);
     }
 }
 

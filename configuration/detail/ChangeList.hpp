@@ -61,7 +61,8 @@ public:
     /// Keeps what `sources` hold for `key` now in each stream that is to be told of it, as of
     /// `version`, and notes these streams in `due`. A stream that can't keep it, since a source
     /// throws or memory is short, fails when it is served: none goes on with a change missing. One
-    /// that can't be noted for want of memory is served with its next change.
+    /// that can't be noted for want of memory is served with its next change, and so is one that
+    /// has failed while there is none at all.
     void keep(SourceRegistry& sources, const std::string& key, std::uint64_t version, Due& due);
 
     /// A change is missing in every stream: each fails with its next change, for `reason`.

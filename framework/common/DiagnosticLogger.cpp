@@ -9,6 +9,7 @@
 #include <boost/smart_ptr/make_shared.hpp>
 #include <locale>
 #include <map>
+#include <new>
 #include <utility>
 
 #include "framework/common/Mutex.hpp"
@@ -86,6 +87,8 @@ void DiagnosticLogger::push(Severity severity,
     message.stream().unsetf(std::ios_base::boolalpha);
     compose(message.stream());
     message.flush();
+    // A stream only notes lack of memory; half of a message is no record.
+    if (message.stream().bad()) throw std::bad_alloc();
     core->push_record(boost::move(record));
 }
 

@@ -35,7 +35,7 @@ public:
     /// Writes one record whose message is `parts`, each inserted into a stream of the C locale in
     /// turn, truth values as 0 and 1. Composes nothing when the severity is disabled or no sink
     /// wants the record. What a sink throws passes on to the caller unless the host gave Boost.Log
-    /// an exception handler.
+    /// an exception handler. Lack of memory throws `std::bad_alloc`: no record is half of one.
     template <class... Parts>
     void write(Severity severity, const Parts&... parts) const {
         if (!isEnabled(severity)) return;

@@ -31,6 +31,10 @@ using Bits = std::conditional_t<
 template <class T>
 class AtomicCell {
 public:
+    /// What `store` takes.
+    using Prepared = T;
+    static const T& prepare(const T& next) noexcept { return next; }
+
     void store(const T& next) noexcept {
         Bits<sizeof(T)> copied = 0;
         std::memcpy(&copied, static_cast<const void*>(&next), sizeof(T));
@@ -57,8 +61,11 @@ class SnapshotCell {
 public:
     using Snapshot = std::shared_ptr<const T>;
 
-    void store(T next) VELKOR_EXCLUDES(mutex) {
-        auto snapshot = std::make_shared<const T>(std::move(next));
+    /// What `store` takes: a snapshot, which is made beforehand, so that storing can't fail.
+    using Prepared = Snapshot;
+    static Prepared prepare(T&& next) { return std::make_shared<const T>(std::move(next)); }
+
+    void store(Prepared snapshot) VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);  // given back before the old value is destroyed
         current.swap(snapshot);
         version.store(version.load(std::memory_order_relaxed) + 1, std::memory_order_release);

@@ -91,9 +91,10 @@ void SettingState::deliver(std::uint64_t newVersion,
                            const std::optional<configuration::Option>* options) {
     const Passage passage(gate);
     if (closed || newVersion < version) return;
-    version = newVersion;
     const bool first = !hasValue;
     Verdict verdict = judge(options, first);
+    // What was thrown until here leaves the version to the next try.
+    version = newVersion;
     if (verdict.holds) {
         hasValue = true;
         publish(stand(verdict));
@@ -108,21 +109,29 @@ void SettingState::deliver(std::uint64_t newVersion,
 
 // Gives those who are to be told that the values are other ones than before.
 SettingState::Listeners SettingState::stand(Verdict& verdict) {
-    bool changes = false;
+    // What takes memory comes first, so that nothing stands as new that is not published.
+    std::optional<std::string> said;
+    if (!verdict.complaints.empty()) said = verdict.complaints;
+    Listeners told;
     const common::MutexLock lock(mutex);
     const bool isFirst = standing.empty();
+    if (!isFirst && isNews(verdict)) told = listeners;
     standing.resize(verdict.standings.size());
     for (std::size_t i = 0; i < standing.size(); ++i) {
         Standing& next = verdict.standings[i];
         const bool differs = isFirst || next.value != standing[i].value;
         if (!differs && next.source == standing[i].source) continue;
-        changes = changes || differs;
         standing[i] = std::move(next);
         standing[i].since = std::chrono::system_clock::now();
     }
-    complaint.reset();
-    if (!verdict.complaints.empty()) complaint = verdict.complaints;
-    return changes && !isFirst ? listeners : Listeners();
+    complaint.swap(said);
+    return told;
+}
+
+// Whether a value has become another one.
+bool SettingState::isNews(const Verdict& verdict) const {
+    return !std::equal(standing.begin(), standing.end(), verdict.standings.begin(),
+                       [](const auto& now, const auto& next) { return now.value == next.value; });
 }
 
 void SettingState::note(const std::string& text) {

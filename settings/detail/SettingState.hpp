@@ -91,6 +91,7 @@ private:
         VELKOR_EXCLUDES(gate, mutex);
     bool isKnown(std::uint64_t changeVersion) VELKOR_EXCLUDES(gate);
     Listeners stand(Verdict& verdict) VELKOR_EXCLUDES(mutex);
+    bool isNews(const Verdict& verdict) const VELKOR_REQUIRES(mutex);
     void note(const std::string& text) VELKOR_EXCLUDES(mutex);
     std::shared_ptr<configuration::ConfigurationImpl> storeIfAlive() const VELKOR_EXCLUDES(mutex);
 

@@ -9,14 +9,28 @@
 
 namespace velkor::settings::detail {
 
+namespace {
+
+void passOn(const configuration::OptionChange& change, SettingState& state) {
+    try {
+        state.onChange(change);
+    } catch (const std::exception& error) {
+        state.fail(error.what());
+    }
+}
+
+}  // namespace
+
 void StateIndex::pass(const configuration::OptionChange& change) const {
+    std::exception_ptr unsaid;
     for (const auto& state : statesOf(change.key)) {
         try {
-            state->onChange(change);
-        } catch (const std::exception& error) {
-            state->fail(error.what());
+            passOn(change, *state);
+        } catch (...) {
+            unsaid = std::current_exception();  // the others are to be told all the same
         }
     }
+    if (unsaid) std::rethrow_exception(unsaid);
 }
 
 StateIndex::States StateIndex::statesOf(const std::string& key) const {

@@ -29,7 +29,8 @@ public:
     /// The settings of `key` that are alive.
     States statesOf(const std::string& key) const VELKOR_EXCLUDES(mutex);
 
-    /// Passes `change` on to the settings of its key.
+    /// Passes `change` on to the settings of its key. Throws, once all have got it, when one
+    /// neither takes it nor has the memory to say so.
     void pass(const configuration::OptionChange& change) const VELKOR_EXCLUDES(mutex);
 
 private:

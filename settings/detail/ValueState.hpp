@@ -6,6 +6,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -23,6 +24,7 @@ VELKOR_EXPORT void reportCallback(const std::string& name, const char* text);
 template <class T, class Cell>
 class ValueState : public SettingState {
 public:
+    using CellType = std::remove_reference_t<Cell>;
     using Callback = std::function<void(const T& before, const T& now)>;
 
     /// A state that publishes in what `published`, if anything, makes.
@@ -39,7 +41,10 @@ public:
 
 protected:
     /// Keeps what `judge` has found.
-    void propose(std::optional<T> value) VELKOR_REQUIRES(gate) { candidate = std::move(value); }
+    void propose(std::optional<T> value) VELKOR_REQUIRES(gate) {
+        candidate.reset();
+        if (value) candidate = CellType::prepare(std::move(*value));
+    }
 
 private:
     void publish(const Listeners& told) override VELKOR_REQUIRES(gate) {
@@ -69,7 +74,7 @@ private:
         }
     }
 
-    std::optional<T> candidate VELKOR_GUARDED_BY(gate);
+    std::optional<typename CellType::Prepared> candidate VELKOR_GUARDED_BY(gate);
 };
 
 }  // namespace velkor::settings::detail

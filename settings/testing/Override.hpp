@@ -27,6 +27,8 @@ public:
              const T& value)
         : Override(store, std::move(key), valueOf(value), Made()) {}
 
+    /// What sources of others throw meanwhile is logged, and so is that there is no memory: then
+    /// the override stays.
     ~Override();
 
     Override(const Override&) = delete;
@@ -37,6 +39,8 @@ private:
 
     Override(const std::shared_ptr<configuration::ConfigurationImpl>& store, std::string key,
              configuration::ConfigurationValue value, Made);
+
+    void end() noexcept;
 
     template <class T>
     static configuration::ConfigurationValue valueOf(const T& value) {

@@ -133,7 +133,9 @@ void tryWriting(Trial& trial, StoreScene& scene, const std::string& key, const s
         }
     }
     const bool isTold = scene.changes.subscriber->values > changesBefore;
-    if (passed && !isTold) {
+    // A stream that has a gap fails at once, or with its next change while there is no memory at
+    // all.
+    if (passed && !isTold && !(trial.isOfMemory() && trial.isLasting())) {
         EXPECT_TRUE(scene.standardError.lines > 0 || scene.changes.subscriber->errors == 1);
     }
     scene.expectAlive();
@@ -231,8 +233,10 @@ void applyChanges(Trial& trial) {
         }
         s.expectTold(s.nearWatch);
         s.expectTold(s.farWatch);
-        EXPECT_TRUE(s.changes.subscriber->values == told + 4 || !trial.isOfMemory() ||
-                    s.changes.subscriber->errors == 1);
+        if (trial.isOfMemory() && !trial.isLasting()) {
+            EXPECT_TRUE(s.changes.subscriber->values == told + 4 ||
+                        s.changes.subscriber->errors == 1);
+        }
     } else {
         expectAllOrNothing(trial, s, before, changes);
     }

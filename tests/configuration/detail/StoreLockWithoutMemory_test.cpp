@@ -16,11 +16,13 @@ TEST(StoreLockWithoutMemory, GivesUpAtOnceWhatItCannotKeep) {
         StoreLock lock(mutex);
         bool destroyed = false;
         std::shared_ptr<const void> object(&destroyed, [&](const void*) { destroyed = true; });
-        {
+        bool wasDropped = false;
+        EXPECT_TRUE(memory.allows([&] {
             const StoreLock::Level level(lock);
-            EXPECT_TRUE(memory.allows([&] { lock.retireOrDrop(std::move(object)); }));
-            EXPECT_EQ(destroyed, memory.hasRunOut());
-        }
+            lock.retireOrDrop(std::move(object));
+            wasDropped = destroyed;
+        }));
+        EXPECT_EQ(wasDropped, memory.hasRunOut());
         EXPECT_TRUE(destroyed);
     });
 }

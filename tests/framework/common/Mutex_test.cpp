@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <condition_variable>
 #include <thread>
 
@@ -76,6 +77,16 @@ TEST(MutexLock, WaitReleasesTheMutexAndTakesItAgain) {
         while (!ready) lock.wait(changed);
     }));
     waker.join();
+    EXPECT_TRUE(isFree(mutex));
+}
+
+TEST(MutexLock, WaitWithALimitEndsThoughNobodyWakesIt) {
+    Mutex mutex;
+    std::condition_variable never;
+    EXPECT_TRUE(completes([&] {
+        MutexLock lock(mutex);
+        lock.waitFor(never, std::chrono::nanoseconds(1));
+    }));
     EXPECT_TRUE(isFree(mutex));
 }
 

@@ -3,11 +3,13 @@
 #include <gmock/gmock.h>
 
 #include <algorithm>
+#include <exception>
 #include <memory>
 #include <optional>
 #include <stdexcept>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "tests/framework/reactive_streams/PublisherFixture.hpp"
@@ -154,6 +156,17 @@ TEST_F(CallbackSubscriberTest, CallbackMayTakeTheValueOver) {
     EXPECT_EQ(taken, "a value that is too long to be stored inside the string");
 }
 
+TEST_F(CallbackSubscriberTest, ValueThatThePublisherKeepsIsCopied) {
+    std::string received;
+    CallbackSubscriber<std::string> subscriber(
+        {[&](std::string&& value) { received = std::move(value); }}, Demand::unbounded,
+        std::make_shared<SubscriptionLink>());
+    const std::string kept = "kept";
+    subscriber.onNext(kept);
+    EXPECT_EQ(received, "kept");
+    EXPECT_EQ(kept, "kept");
+}
+
 TEST_F(CallbackSubscriberTest, ExceptionReachesThePublishersCaller) {
     const auto watch = reactive_streams::subscribe(*publisher, failOnFirstValue());
     EXPECT_THROW(publisher->publish(1), std::runtime_error);
@@ -282,6 +295,18 @@ TEST_F(CallbackSubscriberTest, CompletionIsNotPassedOnAfterACancel) {
     watch.cancel();
     publisher.reset();
     EXPECT_EQ(completions, 0);
+}
+
+TEST_F(CallbackSubscriberTest, EndThatComesAfterACancelAllTheSameIsNotPassedOn) {
+    int endings = 0;
+    const auto link = std::make_shared<SubscriptionLink>();
+    CallbackSubscriber<int> subscriber(
+        {[](int) {}, [&] { ++endings; }, [&](const std::exception_ptr&) { ++endings; }},
+        Demand::unbounded, link);
+    link->cancel();
+    subscriber.onComplete();
+    subscriber.onError(std::make_exception_ptr(0));
+    EXPECT_EQ(endings, 0);
 }
 
 TEST_F(CallbackSubscriberTest, CancelDoesNotWaitForACallbackOnAnotherThread) {

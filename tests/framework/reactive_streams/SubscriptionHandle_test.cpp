@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdint>
 #include <memory>
 #include <stdexcept>
 #include <type_traits>
@@ -103,6 +104,26 @@ TEST_F(SubscriptionHandleTest, LinkThatWasCancelledRefusesALaterSubscription) {
     publisher->subscribe(std::make_shared<CallbackSubscriber<int>>(Callbacks<int>{[](int) {}},
                                                                    Demand::unbounded, link));
     EXPECT_FALSE(publisher->getCompletionFuture().get());
+}
+
+TEST_F(SubscriptionHandleTest, LinkThatWasCancelledIgnoresASubscriptionThatHasGone) {
+    SubscriptionLink link;
+    link.cancel();
+    EXPECT_FALSE(link.open(std::weak_ptr<Subscription>()));
+}
+
+TEST_F(SubscriptionHandleTest, LinkPassesOneCancelOn) {
+    struct CountingSubscription : Subscription {
+        void request(std::uint64_t) override {}
+        void cancel() override { ++cancels; }
+        int cancels = 0;
+    };
+    const auto subscription = std::make_shared<CountingSubscription>();
+    SubscriptionLink link;
+    link.open(subscription);
+    link.cancel();
+    link.cancel();
+    EXPECT_EQ(subscription->cancels, 1);
 }
 
 TEST_F(SubscriptionHandleTest, RequestThroughALinkWithoutSubscriptionDoesNothing) {
