@@ -4,7 +4,6 @@
 #include <cstdint>
 #include <ios>
 #include <locale>
-#include <new>
 #include <sstream>
 #include <string>
 #include <utility>
@@ -41,8 +40,6 @@ std::string setValue(Configuration& configuration, const Arguments& arguments) {
     }
     try {
         configuration.set(key, std::move(value));
-    } catch (const std::bad_alloc&) {
-        throw;
     } catch (...) {
         configuration.set(key, text);
     }

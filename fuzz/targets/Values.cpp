@@ -2,7 +2,6 @@
 // read again, in both forms, and nothing of it is lost. The form in state files is compared with
 // what is documented of it, since files are to be readable for good.
 
-#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
@@ -107,12 +106,10 @@ void checkForms(const ConfigurationValue& value) {
 }
 
 // What is one of our objects to the letter is one of the more lenient messages as well. Those read
-// a lone half of a surrogate pair, and the sign of a whole zero, in another way, and refuse what is
-// no UTF-8, which stands in a text of etcd as it is.
+// a lone half of a surrogate pair, and the sign of a whole zero, in another way.
 void compareWithMessage(std::string_view input, const ConfigurationValue& value) {
     const bool isPlainText = exactly(value) == exactly(std::string(input));
-    const bool isAscii = std::all_of(input.begin(), input.end(), [](char c) { return c >= 0; });
-    if (isPlainText || !isAscii || input.find('\\') != std::string_view::npos) return;
+    if (isPlainText || input.find('\\') != std::string_view::npos) return;
     const auto object = messages::parseJsonObject(std::string(input));
     if (object->has("exact")) return;
     ConfigurationValue lenient;

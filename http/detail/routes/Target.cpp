@@ -3,7 +3,6 @@
 #include <algorithm>
 #include <charconv>
 
-#include "framework/common/TextConversion.hpp"
 #include "http/detail/routes/Problem.hpp"
 
 namespace velkor::http::detail {
@@ -64,12 +63,6 @@ std::string percentEncoded(std::string_view bytes) {
         }
     }
     return text;
-}
-
-bool isUtf8(std::string_view bytes) {
-    if (std::all_of(bytes.begin(), bytes.end(), [](char byte) { return byte >= 0; })) return true;
-    const common::TextConversion utf8("UTF-8");
-    return utf8.fromUtf16(utf8.toUtf16(std::string(bytes))) == bytes;
 }
 
 Parameters parsedQuery(std::string_view query) {

@@ -7,6 +7,8 @@
 #include <utility>
 #include <vector>
 
+#include "layers/detail/Utf8.hpp"
+
 namespace velkor::http::detail {
 
 /// The bytes that `text` stands for: "%41" for "A"; a plus is a plus. Nothing if a "%" is not
@@ -17,8 +19,7 @@ std::optional<std::string> percentDecoded(std::string_view text);
 /// "~" as "%41".
 std::string percentEncoded(std::string_view bytes);
 
-/// Whether JSON can hold `bytes` as they are.
-bool isUtf8(std::string_view bytes);
+using layers::detail::isUtf8;
 
 /// The parameters of a request, names and values decoded, in the order in which they were sent.
 using Parameters = std::vector<std::pair<std::string, std::string>>;

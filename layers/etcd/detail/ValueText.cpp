@@ -15,6 +15,7 @@
 #include "configuration/service/ConfigurationMessages.hpp"
 #include "framework/common/TextConversion.hpp"
 #include "framework/json/JsonSerializer.hpp"
+#include "layers/detail/Utf8.hpp"
 #include "layers/detail/ValueCodec.hpp"
 #include "layers/etcd/detail/Base64.hpp"
 #include "layers/etcd/detail/JsonReader.hpp"
@@ -160,8 +161,8 @@ std::string toValueText(const ConfigurationValue& value) {
 }
 
 ConfigurationValue fromValueText(std::string_view text) {
-    // An exception for every text would make those slow that tools write.
-    if (text.substr(0, 1) != "{") return std::string(text);
+    // An exception for every text would make those slow that tools write. JSON is UTF-8.
+    if (text.substr(0, 1) != "{" || !layers::detail::isUtf8(text)) return std::string(text);
     try {
         return readObject(text);
     } catch (const BadJson&) {

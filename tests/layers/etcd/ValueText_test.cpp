@@ -141,6 +141,7 @@ TEST(EtcdValueText, IsPlainTextWhenItIsNoValue) {
         R"({"type":"string","value":"\x"})",
         R"({"type":"string","value":"a)",
         "{\"type\":\"string\",\"value\":\"a\nb\"}",
+        "{\"type\":\"string\",\"value\":\"no UTF-8: \xDA\"}",
         R"({"type":"intArray","value":[1,]})",
         R"({"type":"intArray","value":[1,"2"]})",
         R"({"type":"long","value":1})",
