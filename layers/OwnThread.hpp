@@ -3,6 +3,7 @@
 #include <signal.h>
 
 #include <memory>
+#include <optional>
 #include <thread>
 #include <utility>
 
@@ -70,17 +71,16 @@ private:
         sigset_t before{};
     };
 
+    // The function is destroyed where it is: to move it might take memory, which may be short by
+    // then.
     template <class F>
     OwnThread(const SignalsBlocked&, const std::shared_ptr<bool>& alone, F&& function)
-        : isAlone(alone), thread([alone, function = std::forward<F>(function)]() mutable {
-              run(std::move(function));
+        : isAlone(alone),
+          thread([alone, own = std::optional<F>(std::forward<F>(function))]() mutable {
+              (*own)();
+              own.reset();
               if (*alone) detail::Endings::ofLibrary().remove();
           }) {}
-
-    template <class F>
-    static void run(F function) {
-        function();
-    }
 
     const std::shared_ptr<bool> isAlone;  // used by the thread itself alone
     std::thread thread;
