@@ -26,8 +26,8 @@ public:
     /// up.
     class Borrowing {
     public:
-        Borrowing() { detail::Endings::ofLibrary().add(); }
-        ~Borrowing() { detail::Endings::ofLibrary().remove(); }
+        Borrowing() { detail::Endings::ofLibrary().borrow(); }
+        ~Borrowing() { detail::Endings::ofLibrary().giveBack(); }
 
         Borrowing(const Borrowing&) = delete;
         Borrowing& operator=(const Borrowing&) = delete;
@@ -40,13 +40,12 @@ public:
         : OwnThread(SignalsBlocked(), std::make_shared<bool>(false), std::move(function)) {}
 
     ~OwnThread() {
-        if (thread.get_id() != std::this_thread::get_id()) {
-            thread.join();
+        if (thread.front().get_id() != std::this_thread::get_id()) {
+            thread.front().join();
             return;
         }
-        detail::Endings::ofLibrary().add();
         *isAlone = true;
-        thread.detach();
+        detail::Endings::ofLibrary().adopt(thread);
     }
 
     OwnThread(const OwnThread&) = delete;
@@ -75,15 +74,17 @@ private:
     // then.
     template <class F>
     OwnThread(const SignalsBlocked&, const std::shared_ptr<bool>& alone, F&& function)
-        : isAlone(alone),
-          thread([alone, own = std::optional<F>(std::forward<F>(function))]() mutable {
-              (*own)();
-              own.reset();
-              if (*alone) detail::Endings::ofLibrary().remove();
-          }) {}
+        : isAlone(alone), thread(1) {
+        thread.front() =
+            std::thread([alone, own = std::optional<F>(std::forward<F>(function))]() mutable {
+                (*own)();
+                own.reset();
+                if (*alone) detail::Endings::ofLibrary().noteEnd();
+            });
+    }
 
     const std::shared_ptr<bool> isAlone;  // used by the thread itself alone
-    std::thread thread;
+    detail::Endings::Threads thread;      // the one
 };
 
 }  // namespace velkor::layers

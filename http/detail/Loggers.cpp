@@ -1,5 +1,7 @@
 #include "http/detail/Loggers.hpp"
 
+#include <openssl/crypto.h>
+
 #include "layers/detail/Endings.hpp"
 
 namespace velkor::http::detail {
@@ -8,9 +10,13 @@ const common::DiagnosticLogger logger("velkor::http");
 
 namespace {
 
-// Made after the logger, so that it is destroyed before it: the threads that are waited for still
-// write records.
-[[maybe_unused]] const auto& endings = layers::detail::Endings::ofLibrary();
+// Made after what the threads that are waited for use to their end, so that it is destroyed before
+// that: the logger, and OpenSSL, which cleans up at the end of the process.
+[[maybe_unused]] const bool isReady = [] {
+    ::OPENSSL_init_crypto(0, nullptr);
+    layers::detail::Endings::ofLibrary();
+    return true;
+}();
 
 }  // namespace
 

@@ -1,7 +1,10 @@
 #pragma once
 
+#include <algorithm>
 #include <condition_variable>
 #include <cstddef>
+#include <list>
+#include <thread>
 
 #include "framework/common/Mutex.hpp"
 
@@ -12,6 +15,8 @@ namespace velkor::layers::detail {
 /// Thread-safe.
 class Endings {
 public:
+    using Threads = std::list<std::thread>;
+
     /// Those of the library that this is compiled into, where hidden names keep it apart from
     /// others. Made at the first call: what a thread uses to its end is made before that.
     static Endings& ofLibrary() {
@@ -23,30 +28,64 @@ public:
 
     /// Waits for all of them.
     ~Endings() {
-        common::MutexLock lock(mutex);
-        while (count > 0) lock.wait(changed);
+        for (Threads last = awaitedLast(); !last.empty(); last = awaitedLast()) join(last);
     }
 
     Endings(const Endings&) = delete;
     Endings& operator=(const Endings&) = delete;
 
-    /// One more is to be waited for.
-    void add() VELKOR_EXCLUDES(mutex) {
+    /// A thread of somebody else is to be waited for, until `giveBack`.
+    void borrow() VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        ++count;
+        ++borrowed;
     }
 
-    /// One less is: it has ended but for this call, or somebody else waits for it.
-    void remove() VELKOR_EXCLUDES(mutex) {
+    void giveBack() VELKOR_EXCLUDES(mutex) {
         const common::MutexLock lock(mutex);
-        --count;
+        --borrowed;
         changed.notify_all();
     }
 
+    /// Takes over the calling thread, the only one of `own`. Takes no memory.
+    void adopt(Threads& own) VELKOR_EXCLUDES(mutex) {
+        Threads gone;
+        {
+            const common::MutexLock lock(mutex);
+            adopted.splice(adopted.end(), own);
+            gone.swap(ended);
+        }
+        join(gone);
+    }
+
+    /// The calling thread, which was adopted, ends now: the next one that is adopted waits for it.
+    void noteEnd() VELKOR_EXCLUDES(mutex) {
+        const common::MutexLock lock(mutex);
+        const auto mine =
+            std::find_if(adopted.begin(), adopted.end(), [](const std::thread& thread) {
+                return thread.get_id() == std::this_thread::get_id();
+            });
+        if (mine != adopted.end()) ended.splice(ended.end(), adopted, mine);
+    }
+
 private:
+    static void join(Threads& threads) {
+        for (std::thread& each : threads) each.join();
+    }
+
+    Threads awaitedLast() VELKOR_EXCLUDES(mutex) {
+        Threads last;
+        common::MutexLock lock(mutex);
+        while (borrowed > 0) lock.wait(changed);
+        last.splice(last.end(), adopted);
+        last.splice(last.end(), ended);
+        return last;
+    }
+
     common::Mutex mutex;
     std::condition_variable changed;
-    std::size_t count VELKOR_GUARDED_BY(mutex) = 0;
+    std::size_t borrowed VELKOR_GUARDED_BY(mutex) = 0;
+    Threads adopted VELKOR_GUARDED_BY(mutex);
+    Threads ended VELKOR_GUARDED_BY(mutex);
 };
 
 }  // namespace velkor::layers::detail
