@@ -386,6 +386,21 @@ TEST_F(PublisherSchedules, AHandleDestroyedByItsCallbackEndsTheStreamOnce) {
     });
 }
 
+TEST_F(PublisherSchedules, ALinkCancelledBesideItsSubscriptionEndsTheStream) {
+    expectAlways([](const Together& together) {
+        int endings = 0;
+        int values = 0;
+        auto publisher = std::make_shared<Watch::Stream>(1, [&] { ++endings; });
+        const auto link = std::make_shared<reactive_streams::SubscriptionLink>();
+        const auto subscriber = std::make_shared<reactive_streams::CallbackSubscriber<int>>(
+            Callbacks<int>{[&](int) { ++values; }}, Demand::unbounded, link);
+        together({[&] { publisher->subscribe(subscriber); }, [&] { link->cancel(); }});
+        publisher->publish(1);
+        requireEqual(values, 0, "values");
+        requireEqual(endings, 1, "ends");
+    });
+}
+
 TEST_F(PublisherSchedules, WhoAsksForOneAtATimeIsToldTheNewest) {
     expectAlways([](const Together& together) {
         int last = 0;
