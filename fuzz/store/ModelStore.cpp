@@ -123,12 +123,16 @@ std::string ModelStore::get(const std::string& key) {
     return exactly(valueFrom(*layer, key));
 }
 
+std::string ModelStore::optionFrom(const Layer& layer, const std::string& key) {
+    record("get option: " + key + " from " + layer.name);
+    return spelledOption({key, layer.name, layer.source->get(within(layer, key))});
+}
+
 std::string ModelStore::option(const std::string& key) {
     const auto keepAlive = shared_from_this();
     const LayerPtr layer = holder(key);
     if (!layer) return "fails No option with the specified key was found: " + key;
-    record("get option: " + key + " from " + layer->name);
-    return spelledOption({key, layer->name, layer->source->get(within(*layer, key))});
+    return optionFrom(*layer, key);
 }
 
 std::string ModelStore::has(const std::string& key) {
@@ -162,6 +166,16 @@ std::string ModelStore::describe() {
     return all;
 }
 
+std::string ModelStore::read(const std::vector<std::string>& keys) {
+    const auto keepAlive = shared_from_this();
+    std::string all;
+    for (const auto& key : keys) {
+        const LayerPtr layer = holder(key);
+        all += (layer == nullptr ? "nothing" : optionFrom(*layer, key)) + "; ";
+    }
+    return all;
+}
+
 // ---- Writing
 
 std::string ModelStore::refusal(const Change& change, const LayerPtr& target) {
@@ -177,15 +191,13 @@ void ModelStore::awaitReport(const Layer& layer, const std::string& key,
                              const std::function<bool()>& write) {
     const bool reports = layer.reports;
     awaited.emplace_back(key, false);
-    bool isChanged = false;
     try {
-        isChanged = write();
+        // The store looks after what a source without a listener is not there to say.
+        if (write() && !reports && !awaited.back().second) report(key);
     } catch (...) {
         awaited.pop_back();
         throw;
     }
-    // The store looks after what a source without a listener is not there to say.
-    if (isChanged && !reports && !awaited.back().second) report(key);
     awaited.pop_back();
 }
 
@@ -261,7 +273,11 @@ void ModelStore::writeOne(const Change& change, const Layer& target,
 
 void ModelStore::writeAll(const std::vector<Change>& changes, const std::vector<LayerPtr>& targets,
                           const std::vector<std::optional<Value>>& before) {
+    // Its own keys come before what else changes meanwhile.
     std::vector<std::string> changed;
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        if (changes[i].value || before[i]) changed.push_back(changes[i].key);
+    }
     auto* const outer = std::exchange(deferred, &changed);
     for (std::size_t i = 0; i < changes.size(); ++i) {
         try {
@@ -279,9 +295,6 @@ void ModelStore::writeAll(const std::vector<Change>& changes, const std::vector<
         }
     }
     deferred = outer;
-    for (std::size_t i = 0; i < changes.size(); ++i) {
-        if (changes[i].value || before[i]) changed.push_back(changes[i].key);
-    }
     tell(changed);
 }
 

@@ -40,6 +40,7 @@ public:
     std::string keys();
     std::string keysFrom(const std::string& first);
     std::string describe();
+    std::string read(const std::vector<std::string>& keys);
     std::string set(const Step& step, const std::string* sourceName);
     std::string unset(const Step& step, const std::string* sourceName);
     std::string apply(const std::vector<Change>& changes, bool dryRun);
@@ -73,6 +74,7 @@ private:
     LayerPtr holder(const std::string& key) const;
     LayerPtr writable(const std::string& key, const std::string* sourceName) const;
     std::set<std::string> allKeys() const;
+    std::string optionFrom(const Layer& layer, const std::string& key);
     Value valueFrom(const Layer& layer, const std::string& key);
     void update(const std::string& key);
     void forget(std::uint64_t number);

@@ -71,6 +71,10 @@ void readArguments(Choices& choices, int depth, Step& step) {
             step.flag = choices.isOdd();
             for (Change& change : step.changes) change = readChange(choices);
             return;
+        case 'n':
+            step.keys.resize(choices.below(4));
+            for (std::string& key : step.keys) key = choices.oneOf(keys);
+            return;
         case 'm':
         case 'p':
             readSource(choices, step);
@@ -126,7 +130,7 @@ void readArguments(Choices& choices, int depth, Step& step) {
 }  // namespace
 
 Step readStep(Choices& choices, int depth) {
-    constexpr std::string_view operations = "gohekdfsSuUampcrtiwbqxvlD";
+    constexpr std::string_view operations = "gohekdfnsSuUampcrtiwbqxvlD";
     Step step;
     step.operation = choices.oneOf(operations);
     readArguments(choices, depth, step);

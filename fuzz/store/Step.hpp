@@ -24,6 +24,7 @@ struct Step {
     configuration::ConfigurationValue value{};
     configuration::ValueMap values{};
     std::vector<configuration::Change> changes{};
+    std::vector<std::string> keys{};
     int order = 0;
     std::size_t number = 0;
     std::uint64_t demand = 0;
@@ -40,6 +41,7 @@ constexpr std::size_t ownSources = 3;
 ///
 ///     g KEY, o KEY, h KEY, e KEY   get, getOption, has, explain
 ///     k, d, f KEY                  keys, describeSources, the keys from KEY on
+///     n COUNT KEY...               read: several keys at one moment
 ///     s KEY VALUE                  set          S KEY VALUE NAME   set in the source NAME
 ///     u KEY                        unset        U KEY NAME         unset in the source NAME
 ///     a COUNT DRY CHANGE...        apply; a CHANGE is KEY KIND, and VALUE or NAME as it says
