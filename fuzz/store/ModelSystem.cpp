@@ -18,15 +18,13 @@ ModelSystem::ModelSystem()
 void ModelSystem::end() {
     store.reset();
     watches.end();
+    changeWatches.end();
 }
 
 std::string ModelSystem::carryOut(const Step& step) {
+    if (watches.isMeant(step)) return watches.carryOut(step);
+    if (changeWatches.isMeant(step)) return changeWatches.carryOut(step);
     switch (step.operation) {
-        case 'b':
-        case 'q':
-        case 'x':
-        case 'v':
-            return watches.carryOut(step);
         case 't':
             own[step.number]->temper = {step.mood, step.reaction};
             return "";
@@ -79,9 +77,10 @@ std::string ModelSystem::onStore(const Step& step) {
             return store->remove(step.name);
         case 'i':
             return exactly(own[step.number]->set(step.key, step.value));
+        case 'W':
+            return changeWatches.begin(step, [&] { return store->watchChanges(step.key); });
         default:
-            watches.begin(step, [&] { return store->watch(step.key); });
-            return "";
+            return watches.begin(step, [&] { return store->watch(step.key); });
     }
 }
 

@@ -23,7 +23,8 @@ private:
     std::string onStore(const Step& step);
 
     std::vector<std::shared_ptr<ModelSource>> own{};
-    Watches<ModelPublisher> watches{*this};
+    Watches<ModelPublisher, configuration::ConfigurationValue> watches{*this, ofValues};
+    Watches<ModelChanges, configuration::OptionChange> changeWatches{*this, ofChanges};
     std::shared_ptr<ModelStore> store;
 };
 

@@ -91,15 +91,13 @@ RealSystem::RealSystem() : store(std::make_shared<configuration::ConfigurationIm
 void RealSystem::end() {
     store.reset();
     watches.end();
+    changeWatches.end();
 }
 
 std::string RealSystem::carryOut(const Step& step) {
+    if (watches.isMeant(step)) return watches.carryOut(step);
+    if (changeWatches.isMeant(step)) return changeWatches.carryOut(step);
     switch (step.operation) {
-        case 'b':
-        case 'q':
-        case 'x':
-        case 'v':
-            return watches.carryOut(step);
         case 't':
             own[step.number]->temper = {step.mood, step.reaction};
             return "";
@@ -190,9 +188,10 @@ std::string RealSystem::changeSources(const Step& step) {
             return answerOf([&] { return store->removeSource(step.name); }, spelledBool);
         case 'i':
             return exactly(own[step.number]->set(step.key, step.value));
+        case 'W':
+            return changeWatches.begin(step, [&] { return store->watchChanges(step.key); });
         default:
-            watches.begin(step, [&] { return store->watchOption(step.key); });
-            return "";
+            return watches.begin(step, [&] { return store->watchOption(step.key); });
     }
 }
 

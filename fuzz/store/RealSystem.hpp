@@ -24,7 +24,8 @@ public:
 
 private:
     using Value = configuration::ConfigurationValue;
-    using Publisher = reactive_streams::PublisherAPI<Value>;
+    template <class T>
+    using Publisher = reactive_streams::PublisherAPI<T>;
 
     std::string carryOut(const Step& step) override;
     std::string read(const Step& step);
@@ -35,7 +36,9 @@ private:
 
     std::vector<std::shared_ptr<OwnSource>> own{};
     std::uint64_t lastVersion = 0;
-    Watches<Publisher> watches{*this};
+    Watches<Publisher<Value>, configuration::ConfigurationValue> watches{*this, ofValues};
+    Watches<Publisher<configuration::OptionChange>, configuration::OptionChange> changeWatches{
+        *this, ofChanges};
     std::shared_ptr<configuration::ConfigurationImpl> store;
     std::optional<velkor::testing::LogCapture> capture{};
 };

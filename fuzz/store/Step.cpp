@@ -98,6 +98,7 @@ void readArguments(Choices& choices, int depth, Step& step) {
             step.value = readValue(choices);
             return;
         case 'w':
+        case 'W':
             step.key = choices.oneOf(keys);
             step.demand = choices.oneOf(demands);
             step.throws = choices.isOdd();
@@ -107,9 +108,13 @@ void readArguments(Choices& choices, int depth, Step& step) {
         case 'b':
         case 'x':
         case 'v':
+        case 'B':
+        case 'X':
+        case 'V':
             step.number = choices.below(10);
             return;
         case 'q':
+        case 'Q':
             step.number = choices.below(10);
             step.demand = choices.oneOf(demands);
             return;
@@ -130,7 +135,7 @@ void readArguments(Choices& choices, int depth, Step& step) {
 }  // namespace
 
 Step readStep(Choices& choices, int depth) {
-    constexpr std::string_view operations = "gohekdfnsSuUampcrtiwbqxvlD";
+    constexpr std::string_view operations = "gohekdfnsSuUampcrtiwbqxvWBQXVlD";
     Step step;
     step.operation = choices.oneOf(operations);
     readArguments(choices, depth, step);

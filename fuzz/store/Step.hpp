@@ -52,9 +52,11 @@ constexpr std::size_t ownSources = 3;
 ///     t SOURCE MOOD REACTION       how an own source answers, and what it does while it is set
 ///     i SOURCE KEY VALUE           an own source changes by itself
 ///     w KEY DEMAND THROWS HELD REACTION   watches; what the subscriber does for each value
+///     W KEY DEMAND THROWS HELD REACTION   watches all changes of keys that KEY begins
 ///     b WATCH                      subscribes once more
 ///     q WATCH DEMAND, x WATCH      requests, cancels
 ///     v WATCH                      gives the publisher up
+///     B, Q, X, V                   the same for a watch of changes
 ///     l MODE NUMBER REACTION       logs from now on: the sink throws (1) or acts (2) at a record
 ///     D                            gives the store up
 ///
