@@ -152,7 +152,12 @@ bool matchesLiterally(std::string_view pattern, std::string_view key) {
                (!key.empty() && matchesLiterally(pattern, key.substr(1)));
     }
     if (key.empty() || (pattern.front() != '?' && pattern.front() != key.front())) return false;
-    return matchesLiterally(pattern.substr(1), key.substr(1));
+    const bool isCharacter = pattern.front() == '?';
+    pattern.remove_prefix(1);
+    do {
+        key.remove_prefix(1);
+    } while (isCharacter && !key.empty() && (key.front() & 0xC0) == 0x80);
+    return matchesLiterally(pattern, key);
 }
 
 bool isMeant(std::string_view pattern, std::string_view key) {
