@@ -2,7 +2,11 @@
 
 #include <gtest/gtest.h>
 
+#include <random>
+#include <thread>
 #include <utility>
+
+#include "tests/support/BoundedWait.hpp"
 
 namespace velkor::testing {
 
@@ -22,6 +26,18 @@ std::vector<std::string> keysOf(const RoundPlan& plan) {
 
 }  // namespace
 
+void runAtOnce(const std::vector<std::function<void()>>& bodies) {
+    Latch start(bodies.size());
+    std::vector<std::thread> threads;
+    for (const auto& body : bodies) {
+        threads.emplace_back([&] {
+            EXPECT_TRUE(start.arriveAndWait());
+            body();
+        });
+    }
+    for (auto& thread : threads) thread.join();
+}
+
 StoreHistory StoreRound::run(StoreSubject& subject, const RoundPlan& plan) {
     StoreRound round(subject, plan);
     round.run();
@@ -37,12 +53,13 @@ std::string StoreRound::complaintOf(StoreSubject& subject, const RoundPlan& plan
 
 void StoreRound::run() {
     StoreRecorder::beThread(0);
-    watchFromTheStart();
-    std::vector<std::thread> threads;
+    if (plan.watched) watchFromTheStart();
+    for (const StoreCall& call : plan.first) recorder.perform(call);
+    std::vector<std::function<void()>> bodies;
     for (std::size_t thread = 1; thread <= plan.threads; ++thread) {
-        threads.emplace_back([this, thread] { work(thread); });
+        bodies.emplace_back([this, thread] { work(thread); });
     }
-    for (auto& thread : threads) thread.join();
+    plan.together(bodies);
     lookAtAll();
     subject.end();
 }
@@ -60,9 +77,13 @@ void StoreRound::watchFromTheStart() {
 
 void StoreRound::work(std::size_t thread) {
     StoreRecorder::beThread(thread);
+    if (plan.scripts.empty()) return callAtRandom(thread);
+    for (const StoreCall& call : plan.scripts[thread - 1]) recorder.perform(call);
+}
+
+void StoreRound::callAtRandom(std::size_t thread) {
     std::mt19937 random(plan.seed * 1000 + static_cast<unsigned>(thread));
     int lastValue = static_cast<int>(thread) * valuesOfAThread;
-    EXPECT_TRUE(start.arriveAndWait());
     for (std::size_t i = 0; i < plan.calls; ++i) {
         if (plan.everything && random() % 8 == 0) takePart(random, watchesOf[thread]);
         recorder.perform(randomCall(random, plan.everything, lastValue));

@@ -1,16 +1,18 @@
 #pragma once
 
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <random>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "tests/stress/histories/RecordedWatch.hpp"
-#include "tests/support/BoundedWait.hpp"
 
 namespace velkor::testing {
+
+/// Runs a thread for each function, as close together as the machine allows, until all have ended.
+void runAtOnce(const std::vector<std::function<void()>>& bodies);
 
 /// How one history comes about.
 struct RoundPlan {
@@ -21,6 +23,15 @@ struct RoundPlan {
     /// All that a store can do; otherwise what single keys can, without registrations, with
     /// watchers that must be told of everything.
     bool everything = true;
+
+    /// Whether there are watchers from the start.
+    bool watched = true;
+
+    /// What is called before there are threads, and by each of them, in the place of random calls.
+    std::vector<StoreCall> first{};
+    std::vector<std::vector<StoreCall>> scripts{};
+
+    std::function<void(const std::vector<std::function<void()>>&)> together = runAtOnce;
 };
 
 /// Threads that make random calls of a store and watch it, and what they saw.
@@ -39,12 +50,12 @@ private:
         : subject(called),
           plan(roundPlan),
           recorder(called, roundPlan.threads + 1),
-          watchesOf(roundPlan.threads + 1),
-          start(roundPlan.threads) {}
+          watchesOf(roundPlan.threads + 1) {}
 
     void run();
     void watchFromTheStart();
     void work(std::size_t thread);
+    void callAtRandom(std::size_t thread);
     void takePart(std::mt19937& random, Watches& own);
     void lookAtAll();
     std::shared_ptr<RecordedWatch> watchKey(const std::string& key, std::uint64_t demand, bool asks,
@@ -57,7 +68,6 @@ private:
     const RoundPlan plan;
     StoreRecorder recorder;
     std::vector<Watches> watchesOf;  // one for each thread, used by it alone
-    Latch start;
 };
 
 /// A call that `random` chooses, with values that no other call has.
