@@ -19,7 +19,7 @@ using Scenario = std::function<void(const Together& together)>;
 /// Which schedules a scenario is run with.
 struct Extent {
     std::size_t preemptions = 2;  ///< All in which so many threads at most are held up,
-    std::size_t random = 300;     ///< and so many by chance.
+    std::size_t random = 100;     ///< and so many by chance.
     unsigned seed = 1;            ///< Of the first of these; those that follow count on.
 
     /// This one, or as VELKOR_SCHEDULE_PREEMPTIONS, VELKOR_SCHEDULES and VELKOR_SCHEDULE_SEED say.
