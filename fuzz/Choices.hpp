@@ -11,7 +11,10 @@ namespace velkor::fuzz {
 /// written as text: a letter chooses what is done, a digit what it is done with.
 class Choices {
 public:
-    explicit Choices(std::string_view input) : rest(input) {}
+    explicit Choices(std::string_view input) : all(input), rest(input) {}
+
+    /// What was read and what is left.
+    std::string_view input() const noexcept { return all; }
 
     bool empty() const noexcept { return rest.empty(); }
 
@@ -28,8 +31,8 @@ public:
     }
 
     template <class T>
-    const T& oneOf(const std::vector<T>& all) {
-        return all[below(all.size())];
+    const T& oneOf(const std::vector<T>& values) {
+        return values[below(values.size())];
     }
 
     bool isOdd() { return below(2) == 1; }
@@ -44,6 +47,7 @@ private:
         return byte;
     }
 
+    std::string_view all;
     std::string_view rest;
 };
 

@@ -8,6 +8,7 @@ namespace velkor::fuzz {
 std::string spelled(std::string_view bytes) {
     constexpr std::string_view digits = "0123456789ABCDEF";
     std::string text = "\"";
+    text.reserve(bytes.size() + 2);
     for (const char byte : bytes) {
         const auto code = static_cast<unsigned char>(byte);
         if (code >= 0x20 && code < 0x7F && byte != '"' && byte != '\\') {

@@ -16,6 +16,12 @@ inline void expectSame(std::string_view what, std::string_view expected, std::st
     if (expected != actual) report(what, expected, actual);
 }
 
+/// As above, for any bytes, which are spelled when they differ.
+inline void expectSameBytes(std::string_view what, std::string_view expected,
+                            std::string_view actual) {
+    if (expected != actual) report(what, spelled(expected), spelled(actual));
+}
+
 /// As above, for what has to be true: `what` says it as a sentence, `about` what it was asked of.
 inline void expectThat(bool holds, std::string_view what, std::string_view about = "") {
     if (!holds) report(what, "true", about);

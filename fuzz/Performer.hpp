@@ -4,6 +4,9 @@
 #include <string>
 #include <utility>
 
+#include "fuzz/Choices.hpp"
+#include "fuzz/Finding.hpp"
+
 namespace velkor::fuzz {
 
 /// What steps are carried out on: a part of the system, or the model of it, with all that it calls.
@@ -46,5 +49,25 @@ private:
     std::string lines;
     int stepsLeft = 60;
 };
+
+/// Has `model` and `real` perform the steps that `read` makes of `choices`, at most so many, and
+/// end. Their traces have to be the same after each step, and after the end.
+template <class Model, class Real, class Read>
+void expectSameTraces(Choices choices, int mostSteps, Model& model, Real& real, Read read) {
+    const auto compare = [&] {
+        const std::string expected = model.takeTrace();
+        const std::string actual = real.takeTrace();
+        if (expected != actual) report("Trace of " + spelled(choices.input()), expected, actual);
+    };
+    for (int i = 0; i < mostSteps && !choices.empty(); ++i) {
+        const auto step = read(choices);
+        model.perform(step);
+        real.perform(step);
+        compare();
+    }
+    model.end();
+    real.end();
+    compare();
+}
 
 }  // namespace velkor::fuzz

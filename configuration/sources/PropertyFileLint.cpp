@@ -40,6 +40,11 @@ std::string_view lineAt(std::string_view text, std::size_t begin) {
     return text.substr(begin, text.find_first_of("\r\n", begin) - begin);
 }
 
+std::size_t sizeWithoutTrailingBlanks(std::string_view text) {
+    while (!text.empty() && isBlank(text.back())) text.remove_suffix(1);
+    return text.size();
+}
+
 /// A name in brackets, with nothing or a comment behind it.
 bool isSection(std::string_view line) {
     if (line.empty() || line.front() != '[') return false;
@@ -205,8 +210,8 @@ private:
         if (isStored) places.push_back(key);
         const std::string_view piece =
             text.substr(step.begin, step.end - step.begin - (isStored ? 1 : 0));
-        if (piece.empty() || !isBlank(piece.back())) return;
-        add(step.begin + piece.find_last_not_of(" \t") + 1, PropertyFlaw::trailingBlanks);
+        const std::size_t size = sizeWithoutTrailingBlanks(piece);
+        if (size < piece.size()) add(step.begin + size, PropertyFlaw::trailingBlanks);
     }
 
     void atEnd() {

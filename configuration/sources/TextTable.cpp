@@ -19,6 +19,12 @@ Word drawOddWord() {
     return Word{device()} << half | device() | 1U;
 }
 
+// One for the process: drawing it takes the processor longer than filling a small table.
+Word oddWord() {
+    static const Word drawn = drawOddWord();
+    return drawn;
+}
+
 // Their product, its upper half folded into the lower one, so that each bit depends on all bits.
 Word scatter(Word word, Word factor) noexcept {
     __extension__ using Product = unsigned __int128;
@@ -53,7 +59,7 @@ TextTable::TextTable(std::string content, std::vector<Property> places)
     : text(std::move(content)),
       properties(std::move(places)),
       slots(slotsFor(properties.size()), emptySlot),
-      hashFactor(drawOddWord()) {
+      hashFactor(oddWord()) {
     text.shrink_to_fit();
     properties.shrink_to_fit();
     for (Slot number = 1; number < properties.size(); ++number) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <deque>
 #include <exception>
@@ -67,6 +68,20 @@ public:
     void publishFirst(const T& value) {
         if (!hasEnded() && queue.empty()) queue.push_back(value);
     }
+
+    /// Keeps `value` in the place of the one that `isReplaced` is true of, or behind all others.
+    template <class Predicate>
+    void keep(const T& value, Predicate isReplaced) {
+        if (hasEnded()) return;
+        const auto replaced = std::find_if(queue.begin(), queue.end(), isReplaced);
+        if (replaced != queue.end()) {
+            *replaced = value;
+        } else {
+            queue.push_back(value);
+        }
+    }
+
+    void deliver() { drain(); }
 
     void complete() {
         const auto keepAlive = this->weak_from_this().lock();

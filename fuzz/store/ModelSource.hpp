@@ -24,7 +24,8 @@ public:
         : values(content.begin(), content.end()), fromFile(isFromFile) {}
 
     /// The own source `itsNumber` of `itsSystem`, which reacts as `temper` says.
-    ModelSource(System& itsSystem, std::size_t itsNumber) : system(&itsSystem), number(itsNumber) {}
+    ModelSource(System& itsSystem, std::size_t itsNumber)
+        : fromFile(false), system(&itsSystem), number(itsNumber) {}
 
     bool has(const std::string& key) const {
         temper.require(Mood::refusesHas);
@@ -61,7 +62,7 @@ private:
     void changed(const std::string& key);
 
     std::map<std::string, Value> values{};
-    const bool fromFile = false;
+    const bool fromFile;
     System* const system = nullptr;  // null: not an own source
     const std::size_t number = 0;
     ModelStore* told = nullptr;

@@ -68,6 +68,10 @@ ModelStore::~ModelStore() {
         const auto ended = watches.front().publisher;
         watches.erase(watches.begin());
     }
+    while (!changeWatches.empty()) {
+        const auto ended = changeWatches.front().publisher;
+        changeWatches.erase(changeWatches.begin());
+    }
 }
 
 bool ModelStore::applies(const Layer& layer, const std::string& key) {
@@ -123,12 +127,16 @@ std::string ModelStore::get(const std::string& key) {
     return exactly(valueFrom(*layer, key));
 }
 
+std::string ModelStore::optionFrom(const Layer& layer, const std::string& key) {
+    record("get option: " + key + " from " + layer.name);
+    return spelledOption({key, layer.name, layer.source->get(within(layer, key))});
+}
+
 std::string ModelStore::option(const std::string& key) {
     const auto keepAlive = shared_from_this();
     const LayerPtr layer = holder(key);
     if (!layer) return "fails No option with the specified key was found: " + key;
-    record("get option: " + key + " from " + layer->name);
-    return spelledOption({key, layer->name, layer->source->get(within(*layer, key))});
+    return optionFrom(*layer, key);
 }
 
 std::string ModelStore::has(const std::string& key) {
@@ -162,6 +170,16 @@ std::string ModelStore::describe() {
     return all;
 }
 
+std::string ModelStore::read(const std::vector<std::string>& keys) {
+    const auto keepAlive = shared_from_this();
+    std::string all;
+    for (const auto& key : keys) {
+        const LayerPtr layer = holder(key);
+        all += (layer == nullptr ? "nothing" : optionFrom(*layer, key)) + "; ";
+    }
+    return all;
+}
+
 // ---- Writing
 
 std::string ModelStore::refusal(const Change& change, const LayerPtr& target) {
@@ -177,15 +195,13 @@ void ModelStore::awaitReport(const Layer& layer, const std::string& key,
                              const std::function<bool()>& write) {
     const bool reports = layer.reports;
     awaited.emplace_back(key, false);
-    bool isChanged = false;
     try {
-        isChanged = write();
+        // The store looks after what a source without a listener is not there to say.
+        if (write() && !reports && !awaited.back().second) report(key);
     } catch (...) {
         awaited.pop_back();
         throw;
     }
-    // The store looks after what a source without a listener is not there to say.
-    if (isChanged && !reports && !awaited.back().second) report(key);
     awaited.pop_back();
 }
 
@@ -261,7 +277,11 @@ void ModelStore::writeOne(const Change& change, const Layer& target,
 
 void ModelStore::writeAll(const std::vector<Change>& changes, const std::vector<LayerPtr>& targets,
                           const std::vector<std::optional<Value>>& before) {
+    // Its own keys come before what else changes meanwhile.
     std::vector<std::string> changed;
+    for (std::size_t i = 0; i < changes.size(); ++i) {
+        if (changes[i].value || before[i]) changed.push_back(changes[i].key);
+    }
     auto* const outer = std::exchange(deferred, &changed);
     for (std::size_t i = 0; i < changes.size(); ++i) {
         try {
@@ -279,9 +299,6 @@ void ModelStore::writeAll(const std::vector<Change>& changes, const std::vector<
         }
     }
     deferred = outer;
-    for (std::size_t i = 0; i < changes.size(); ++i) {
-        if (changes[i].value || before[i]) changed.push_back(changes[i].key);
-    }
     tell(changed);
 }
 
@@ -296,6 +313,9 @@ void ModelStore::tell(const std::vector<std::string>& keys) {
         deferred->insert(deferred->end(), told.begin(), told.end());
         return;
     }
+    std::vector<ChangeWatch> due;
+    for (const std::string& key : told) keepChange(key, due);
+    serve(due);
     for (const std::string& key : told) update(key);
 }
 
@@ -305,7 +325,63 @@ void ModelStore::report(const std::string& key) {
         if (awaitedKey == key) hasCome = true;
     }
     if (deferred != nullptr) return deferred->push_back(key);
+    std::vector<ChangeWatch> due;
+    keepChange(key, due);
+    serve(due);
     update(key);
+}
+
+// Streams of changes keep the change first, all of them, and are then served.
+void ModelStore::keepChange(const std::string& key, std::vector<ChangeWatch>& due) {
+    const auto isTold = [&](const ChangeWatch& watch) {
+        return key.substr(0, watch.prefix.size()) == watch.prefix;
+    };
+    if (std::none_of(changeWatches.begin(), changeWatches.end(), isTold)) return;
+    configuration::OptionChange change;
+    change.key = key;
+    std::exception_ptr failure;
+    try {
+        const LayerPtr layer = holder(key);
+        if (layer != nullptr) {
+            const Value value = layer->source->get(within(*layer, key));
+            change.option = configuration::Option{key, layer->name, value};
+        }
+    } catch (...) {
+        failure = std::current_exception();
+    }
+    const auto isSameKey = [&](const auto& kept) { return kept.key == key; };
+    for (ChangeWatch& watch : changeWatches) {
+        if (!isTold(watch)) continue;
+        if (watch.failure == nullptr) watch.failure = failure;
+        if (watch.failure == nullptr) watch.publisher->keep(change, isSameKey);
+        const auto isNoted = [&](const ChangeWatch& noted) { return noted.number == watch.number; };
+        const auto noted = std::find_if(due.begin(), due.end(), isNoted);
+        if (noted == due.end()) {
+            due.push_back(watch);
+        } else {
+            noted->failure = watch.failure;
+        }
+    }
+}
+
+void ModelStore::serve(const std::vector<ChangeWatch>& due) {
+    for (const ChangeWatch& watch : due) {
+        try {
+            if (watch.failure) {
+                watch.publisher->fail(watch.failure);
+            } else {
+                watch.publisher->deliver();
+            }
+        } catch (...) {
+            error("Error in configuration change subscriber: " + watch.prefix);
+        }
+    }
+}
+
+void ModelStore::tellOfChanges(const std::set<std::string>& keys, const std::string& group) {
+    std::vector<ChangeWatch> due;
+    for (const auto& key : keys) keepChange(group + key, due);
+    serve(due);
 }
 
 void ModelStore::update(const std::string& key) {
@@ -334,9 +410,7 @@ std::shared_ptr<ModelPublisher> ModelStore::watch(const std::string& key) {
         const auto keepAlive = shared_from_this();
         record("watchOption: " + key);
         const std::uint64_t number = nextWatch++;
-        publisher = std::make_shared<ModelPublisher>(1, [weak = weak_from_this(), number] {
-            if (const auto store = weak.lock()) store->forget(number);
-        });
+        publisher = std::make_shared<ModelPublisher>(1, forgetting(number));
         watches.push_back({publisher, key, number});
         const LayerPtr layer = holder(key);
         if (layer == nullptr) return publisher;
@@ -346,10 +420,28 @@ std::shared_ptr<ModelPublisher> ModelStore::watch(const std::string& key) {
     return publisher;
 }
 
+std::shared_ptr<ModelChanges> ModelStore::watchChanges(const std::string& prefix) {
+    const auto keepAlive = shared_from_this();
+    record("watchChanges: " + prefix);
+    const std::uint64_t number = nextWatch++;
+    auto publisher = std::make_shared<ModelChanges>(std::numeric_limits<std::uint64_t>::max(),
+                                                    forgetting(number));
+    changeWatches.push_back({publisher, prefix, number});
+    return publisher;
+}
+
+std::function<void()> ModelStore::forgetting(std::uint64_t number) {
+    return [weak = weak_from_this(), number] {
+        if (const auto store = weak.lock()) store->forget(number);
+    };
+}
+
 void ModelStore::forget(std::uint64_t number) {
-    const auto found = std::find_if(watches.begin(), watches.end(),
-                                    [&](const Watch& watch) { return watch.number == number; });
+    const auto isIt = [&](const auto& watch) { return watch.number == number; };
+    const auto found = std::find_if(watches.begin(), watches.end(), isIt);
     if (found != watches.end()) watches.erase(found);
+    const auto change = std::find_if(changeWatches.begin(), changeWatches.end(), isIt);
+    if (change != changeWatches.end()) changeWatches.erase(change);
 }
 
 // ---- The list of layers
@@ -369,7 +461,9 @@ std::string ModelStore::add(const Step& step, std::shared_ptr<ModelSource> sourc
     const auto added =
         std::make_shared<Layer>(Layer{step.name, group, step.order, step.flag, source});
     layers.insert(position, added);
-    for (const auto& key : source->keys()) update(group + key);
+    const auto keys = source->keys();
+    tellOfChanges(keys, group);
+    for (const auto& key : keys) update(group + key);
     source->listen(this, group);
     added->reports = true;
     return "true";
@@ -381,7 +475,9 @@ std::string ModelStore::remove(const std::string& name) {
     const LayerPtr removed = find(name);
     if (removed == nullptr) return "false";
     const auto keys = removed->source->keys();
+    const std::string group = removed->group;
     layers.erase(std::find(layers.begin(), layers.end(), removed));
+    tellOfChanges(keys, group);
     for (const auto& key : keys) update(key);
     return "true";
 }

@@ -17,16 +17,14 @@ ModelSystem::ModelSystem()
 
 void ModelSystem::end() {
     store.reset();
-    for (std::size_t i = 0; i < watches.size(); ++i) watches[i].held.reset();
+    watches.end();
+    changeWatches.end();
 }
 
 std::string ModelSystem::carryOut(const Step& step) {
+    if (watches.isMeant(step)) return watches.carryOut(step);
+    if (changeWatches.isMeant(step)) return changeWatches.carryOut(step);
     switch (step.operation) {
-        case 'b':
-        case 'q':
-        case 'x':
-        case 'v':
-            return onWatch(step);
         case 't':
             own[step.number]->temper = {step.mood, step.reaction};
             return "";
@@ -57,6 +55,8 @@ std::string ModelSystem::onStore(const Step& step) {
             return store->keysFrom(step.key);
         case 'd':
             return store->describe();
+        case 'n':
+            return store->read(step.keys);
         case 's':
             return store->set(step, nullptr);
         case 'S':
@@ -77,46 +77,11 @@ std::string ModelSystem::onStore(const Step& step) {
             return store->remove(step.name);
         case 'i':
             return exactly(own[step.number]->set(step.key, step.value));
+        case 'W':
+            return changeWatches.begin(step, [&] { return store->watchChanges(step.key); });
         default:
-            return watch(step);
+            return watches.begin(step, [&] { return store->watch(step.key); });
     }
-}
-
-std::string ModelSystem::watch(const Step& step) {
-    const std::size_t number = watches.size();
-    watches.emplace_back();
-    const auto publisher = store->watch(step.key);
-    if (step.flag) watches[number].held = publisher;
-    subscribe(*publisher, number, step);
-    return "";
-}
-
-void ModelSystem::subscribe(ModelPublisher& publisher, std::size_t number, const Step& step) {
-    publisher.subscribe(std::make_shared<Watcher>(*this, number, step, [this, number](auto opened) {
-        watches[number].subscription = std::move(opened);
-    }));
-}
-
-std::string ModelSystem::onWatch(const Step& step) {
-    if (watches.empty()) return "no watch";
-    const std::size_t number = step.number % watches.size();
-    if (step.operation == 'v') {
-        const auto givenUp = std::move(watches[number].held);
-        return "";
-    }
-    if (step.operation == 'b') {
-        const auto publisher = watches[number].held;
-        if (publisher) subscribe(*publisher, number, step);
-        return "";
-    }
-    const auto subscription = watches[number].subscription.lock();
-    if (subscription == nullptr) return "";
-    if (step.operation == 'q') {
-        subscription->request(step.demand);
-    } else {
-        subscription->cancel();
-    }
-    return "";
 }
 
 }  // namespace velkor::fuzz::store

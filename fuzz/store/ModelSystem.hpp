@@ -6,6 +6,7 @@
 
 #include "fuzz/store/ModelStore.hpp"
 #include "fuzz/store/System.hpp"
+#include "fuzz/store/Watches.hpp"
 
 namespace velkor::fuzz::store {
 
@@ -18,19 +19,12 @@ public:
     void end() override;
 
 private:
-    struct Watch {
-        std::shared_ptr<ModelPublisher> held;
-        std::weak_ptr<reactive_streams::Subscription> subscription;
-    };
-
     std::string carryOut(const Step& step) override;
     std::string onStore(const Step& step);
-    std::string watch(const Step& step);
-    void subscribe(ModelPublisher& publisher, std::size_t number, const Step& step);
-    std::string onWatch(const Step& step);
 
     std::vector<std::shared_ptr<ModelSource>> own{};
-    std::vector<Watch> watches{};
+    Watches<ModelPublisher, configuration::ConfigurationValue> watches{*this, ofValues};
+    Watches<ModelChanges, configuration::OptionChange> changeWatches{*this, ofChanges};
     std::shared_ptr<ModelStore> store;
 };
 

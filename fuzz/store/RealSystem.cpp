@@ -1,8 +1,10 @@
 #include "fuzz/store/RealSystem.hpp"
 
+#include <algorithm>
 #include <utility>
 
 #include "configuration/sources/PropertyFileSource.hpp"
+#include "fuzz/Finding.hpp"
 #include "fuzz/Values.hpp"
 
 namespace velkor::fuzz::store {
@@ -23,6 +25,14 @@ std::string answerOf(Call call, Spell spell) {
 std::string spelledHolders(const std::vector<configuration::Option>& holders) {
     std::string all;
     for (const auto& option : holders) all += spelledOption(option) + "; ";
+    return all;
+}
+
+std::string spelledOptions(const std::vector<std::optional<configuration::Option>>& options) {
+    std::string all;
+    for (const auto& option : options) {
+        all += (option ? spelledOption(*option) : "nothing") + "; ";
+    }
     return all;
 }
 
@@ -81,16 +91,14 @@ RealSystem::RealSystem() : store(std::make_shared<configuration::ConfigurationIm
 
 void RealSystem::end() {
     store.reset();
-    for (std::size_t i = 0; i < watches.size(); ++i) watches[i].held.reset();
+    watches.end();
+    changeWatches.end();
 }
 
 std::string RealSystem::carryOut(const Step& step) {
+    if (watches.isMeant(step)) return watches.carryOut(step);
+    if (changeWatches.isMeant(step)) return changeWatches.carryOut(step);
     switch (step.operation) {
-        case 'b':
-        case 'q':
-        case 'x':
-        case 'v':
-            return onWatch(step);
         case 't':
             own[step.number]->temper = {step.mood, step.reaction};
             return "";
@@ -121,9 +129,22 @@ std::string RealSystem::read(const Step& step) {
             return spelledTexts(pagesFrom(*store, step.key));
         case 'd':
             return answerOf([&] { return store->describeSources(); }, spelledSources);
+        case 'n':
+            return readAtOnce(step);
         default:
             return write(step);
     }
+}
+
+std::string RealSystem::readAtOnce(const Step& step) {
+    const std::uint64_t before = lastVersion;  // what the store calls may change and read it
+    return answerOf([&] { return store->read(step.keys); },
+                    [&](const configuration::Reading& reading) {
+                        expectThat(reading.version >= before, "A version is never lower",
+                                   std::to_string(reading.version));
+                        lastVersion = std::max(lastVersion, reading.version);
+                        return spelledOptions(reading.options);
+                    });
 }
 
 std::string RealSystem::write(const Step& step) {
@@ -169,46 +190,11 @@ std::string RealSystem::changeSources(const Step& step) {
             return answerOf([&] { return store->removeSource(step.name); }, spelledBool);
         case 'i':
             return exactly(own[step.number]->set(step.key, step.value));
+        case 'W':
+            return changeWatches.begin(step, [&] { return store->watchChanges(step.key); });
         default:
-            return watch(step);
+            return watches.begin(step, [&] { return store->watchOption(step.key); });
     }
-}
-
-std::string RealSystem::watch(const Step& step) {
-    const std::size_t number = watches.size();
-    watches.emplace_back();
-    const auto publisher = store->watchOption(step.key);
-    if (step.flag) watches[number].held = publisher;
-    subscribe(*publisher, number, step);
-    return "";
-}
-
-void RealSystem::subscribe(Publisher& publisher, std::size_t number, const Step& step) {
-    publisher.subscribe(std::make_shared<Watcher>(*this, number, step, [this, number](auto opened) {
-        watches[number].subscription = std::move(opened);
-    }));
-}
-
-std::string RealSystem::onWatch(const Step& step) {
-    if (watches.empty()) return "no watch";
-    const std::size_t number = step.number % watches.size();
-    if (step.operation == 'v') {
-        const auto givenUp = std::move(watches[number].held);
-        return "";
-    }
-    if (step.operation == 'b') {
-        const auto publisher = watches[number].held;
-        if (publisher) subscribe(*publisher, number, step);
-        return "";
-    }
-    const auto subscription = watches[number].subscription.lock();
-    if (subscription == nullptr) return "";
-    if (step.operation == 'q') {
-        subscription->request(step.demand);
-    } else {
-        subscription->cancel();
-    }
-    return "";
 }
 
 void RealSystem::startCapture(const Step& step) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <memory>
 #include <optional>
 #include <string>
@@ -8,6 +9,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "fuzz/store/OwnSource.hpp"
 #include "fuzz/store/System.hpp"
+#include "fuzz/store/Watches.hpp"
 #include "tests/support/LogCapture.hpp"
 
 namespace velkor::fuzz::store {
@@ -22,24 +24,21 @@ public:
 
 private:
     using Value = configuration::ConfigurationValue;
-    using Publisher = reactive_streams::PublisherAPI<Value>;
-
-    struct Watch {
-        std::shared_ptr<Publisher> held;
-        std::weak_ptr<reactive_streams::Subscription> subscription;
-    };
+    template <class T>
+    using Publisher = reactive_streams::PublisherAPI<T>;
 
     std::string carryOut(const Step& step) override;
     std::string read(const Step& step);
+    std::string readAtOnce(const Step& step);
     std::string write(const Step& step);
     std::string changeSources(const Step& step);
-    std::string watch(const Step& step);
-    void subscribe(Publisher& publisher, std::size_t number, const Step& step);
-    std::string onWatch(const Step& step);
     void startCapture(const Step& step);
 
     std::vector<std::shared_ptr<OwnSource>> own{};
-    std::vector<Watch> watches{};
+    std::uint64_t lastVersion = 0;
+    Watches<Publisher<Value>, configuration::ConfigurationValue> watches{*this, ofValues};
+    Watches<Publisher<configuration::OptionChange>, configuration::OptionChange> changeWatches{
+        *this, ofChanges};
     std::shared_ptr<configuration::ConfigurationImpl> store;
     std::optional<velkor::testing::LogCapture> capture{};
 };

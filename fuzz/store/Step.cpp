@@ -71,6 +71,10 @@ void readArguments(Choices& choices, int depth, Step& step) {
             step.flag = choices.isOdd();
             for (Change& change : step.changes) change = readChange(choices);
             return;
+        case 'n':
+            step.keys.resize(choices.below(4));
+            for (std::string& key : step.keys) key = choices.oneOf(keys);
+            return;
         case 'm':
         case 'p':
             readSource(choices, step);
@@ -94,6 +98,7 @@ void readArguments(Choices& choices, int depth, Step& step) {
             step.value = readValue(choices);
             return;
         case 'w':
+        case 'W':
             step.key = choices.oneOf(keys);
             step.demand = choices.oneOf(demands);
             step.throws = choices.isOdd();
@@ -103,9 +108,13 @@ void readArguments(Choices& choices, int depth, Step& step) {
         case 'b':
         case 'x':
         case 'v':
+        case 'B':
+        case 'X':
+        case 'V':
             step.number = choices.below(10);
             return;
         case 'q':
+        case 'Q':
             step.number = choices.below(10);
             step.demand = choices.oneOf(demands);
             return;
@@ -126,7 +135,7 @@ void readArguments(Choices& choices, int depth, Step& step) {
 }  // namespace
 
 Step readStep(Choices& choices, int depth) {
-    constexpr std::string_view operations = "gohekdfsSuUampcrtiwbqxvlD";
+    constexpr std::string_view operations = "gohekdfnsSuUampcrtiwbqxvWBQXVlD";
     Step step;
     step.operation = choices.oneOf(operations);
     readArguments(choices, depth, step);

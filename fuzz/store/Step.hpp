@@ -24,6 +24,7 @@ struct Step {
     configuration::ConfigurationValue value{};
     configuration::ValueMap values{};
     std::vector<configuration::Change> changes{};
+    std::vector<std::string> keys{};
     int order = 0;
     std::size_t number = 0;
     std::uint64_t demand = 0;
@@ -40,6 +41,7 @@ constexpr std::size_t ownSources = 3;
 ///
 ///     g KEY, o KEY, h KEY, e KEY   get, getOption, has, explain
 ///     k, d, f KEY                  keys, describeSources, the keys from KEY on
+///     n COUNT KEY...               read: several keys at one moment
 ///     s KEY VALUE                  set          S KEY VALUE NAME   set in the source NAME
 ///     u KEY                        unset        U KEY NAME         unset in the source NAME
 ///     a COUNT DRY CHANGE...        apply; a CHANGE is KEY KIND, and VALUE or NAME as it says
@@ -50,9 +52,11 @@ constexpr std::size_t ownSources = 3;
 ///     t SOURCE MOOD REACTION       how an own source answers, and what it does while it is set
 ///     i SOURCE KEY VALUE           an own source changes by itself
 ///     w KEY DEMAND THROWS HELD REACTION   watches; what the subscriber does for each value
+///     W KEY DEMAND THROWS HELD REACTION   watches all changes of keys that KEY begins
 ///     b WATCH                      subscribes once more
 ///     q WATCH DEMAND, x WATCH      requests, cancels
 ///     v WATCH                      gives the publisher up
+///     B, Q, X, V                   the same for a watch of changes
 ///     l MODE NUMBER REACTION       logs from now on: the sink throws (1) or acts (2) at a record
 ///     D                            gives the store up
 ///

@@ -1,6 +1,5 @@
 #include "fuzz/store/System.hpp"
 
-#include <exception>
 #include <stdexcept>
 #include <utility>
 
@@ -16,36 +15,6 @@ void System::record(const std::string& message) {
     if (throws) throw std::runtime_error("a log sink");
 }
 
-void Watcher::onSubscribe(std::weak_ptr<reactive_streams::Subscription> subscription) {
-    onOpened(std::move(subscription));
-    note("subscribed");
-    Step request;
-    request.operation = 'q';
-    request.number = number;
-    request.demand = step.demand;
-    system.perform(request);
-}
-
-void Watcher::onComplete() {
-    note("completed");
-}
-
-void Watcher::onError(const std::exception_ptr& /*error*/) {
-    note("failed");
-}
-
-void Watcher::onNext(Value&& value) {
-    note("gets " + exactly(value));
-    const bool throws = step.throws;
-    if (step.reaction != nullptr && reactionsLeft > 0) {
-        --reactionsLeft;
-        // Which may be the end of this.
-        const auto reaction = step.reaction;
-        system.perform(*reaction);
-    }
-    if (throws) throw std::runtime_error("a subscriber");
-}
-
 void Temper::require(Mood refusing) const {
     if (mood == refusing) throw std::runtime_error("an own source");
 }
@@ -59,6 +28,14 @@ void Temper::react(System& system) {
 
 std::string spelledOption(const configuration::Option& option) {
     return option.key + " from " + option.source + ": " + exactly(option.value);
+}
+
+std::string spelledWatched(const configuration::ConfigurationValue& value) {
+    return exactly(value);
+}
+
+std::string spelledWatched(const configuration::OptionChange& change) {
+    return change.key + ": " + (change.option ? spelledOption(*change.option) : "nothing");
 }
 
 std::string spelledBool(bool answer) {

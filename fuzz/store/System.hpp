@@ -1,14 +1,12 @@
 #pragma once
 
-#include <exception>
-#include <functional>
 #include <memory>
 #include <string>
 #include <utility>
 
+#include "configuration/Changes.hpp"
 #include "configuration/ConfigurationValue.hpp"
 #include "configuration/Option.hpp"
-#include "framework/reactive_streams/Subscriber.hpp"
 #include "fuzz/Performer.hpp"
 #include "fuzz/store/Step.hpp"
 
@@ -39,37 +37,6 @@ private:
     bool sinkIsOn = false;
 };
 
-/// What subscribes to watches, of a store and of a model.
-class Watcher final : public reactive_streams::Subscriber<configuration::ConfigurationValue> {
-public:
-    using Value = configuration::ConfigurationValue;
-    using Opened = std::function<void(std::weak_ptr<reactive_streams::Subscription>)>;
-
-    /// The subscriber of the watch `itsNumber`, which does what `watch` says; `keep` takes its
-    /// subscription.
-    Watcher(System& itsSystem, std::size_t itsNumber, const Step& watch, Opened keep)
-        : system(itsSystem), number(itsNumber), step(watch), onOpened(std::move(keep)) {}
-
-    void onSubscribe(std::weak_ptr<reactive_streams::Subscription> subscription) override;
-    void onComplete() override;
-    void onError(const std::exception_ptr& error) override;
-
-    /// Notes the value, reacts, and throws if it is to.
-    using reactive_streams::Subscriber<Value>::onNext;
-    void onNext(Value&& value) override;
-
-private:
-    void note(const std::string& event) {
-        system.note("watcher " + std::to_string(number) + ' ' + event);
-    }
-
-    System& system;
-    const std::size_t number;
-    const Step step;
-    const Opened onOpened;
-    int reactionsLeft = 3;
-};
-
 /// What an own source does beside holding a table, whoever calls it.
 struct Temper {
     Mood mood = Mood::willing;
@@ -85,6 +52,8 @@ struct Temper {
 // How answers are noted.
 std::string spelledOption(const configuration::Option& option);
 std::string spelledBool(bool answer);
+std::string spelledWatched(const configuration::ConfigurationValue& value);
+std::string spelledWatched(const configuration::OptionChange& change);
 
 template <class Texts>
 std::string spelledTexts(const Texts& texts) {

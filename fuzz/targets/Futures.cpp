@@ -198,21 +198,10 @@ private:
 
 const Target target("futures", [](std::string_view input) {
     constexpr int mostSteps = 30;
-    Choices choices(input);
     Model model;
     Real real(model.waiting);
-    const auto compare = [&] {
-        expectSame("Trace of " + spelled(input), model.takeTrace(), real.takeTrace());
-    };
-    for (int i = 0; i < mostSteps && !choices.empty(); ++i) {
-        const Step step = readStep(choices);
-        model.perform(step);
-        real.perform(step);
-        compare();
-    }
-    model.end();
-    real.end();
-    compare();
+    expectSameTraces(Choices(input), mostSteps, model, real,
+                     [](Choices& choices) { return readStep(choices); });
 });
 
 }  // namespace

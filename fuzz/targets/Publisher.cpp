@@ -176,18 +176,7 @@ const Target target("publisher", [](std::string_view input) {
     const std::uint64_t capacity = 1 + choices.below(3);
     System<Model> model(capacity);
     System<RealStream> real(capacity);
-    const auto compare = [&] {
-        expectSame("Trace of " + spelled(input), model.takeTrace(), real.takeTrace());
-    };
-    for (int i = 0; i < mostSteps && !choices.empty(); ++i) {
-        const Step step = readStep(choices);
-        model.perform(step);
-        real.perform(step);
-        compare();
-    }
-    model.end();
-    real.end();
-    compare();
+    expectSameTraces(choices, mostSteps, model, real, [](Choices& next) { return readStep(next); });
 });
 
 }  // namespace

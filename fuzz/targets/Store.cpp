@@ -39,25 +39,13 @@ private:
     std::string line;
 };
 
-void expectSameTrace(std::string_view input, System& model, System& real) {
-    expectSame("Trace of " + spelled(input), model.takeTrace(), real.takeTrace());
-}
-
 const Target target("store", [](std::string_view input) {
     constexpr int mostSteps = 24;
-    Choices choices(input);
     store::ModelSystem model;
     store::RealSystem real;
     const ErrorLines errors(real);
-    for (int i = 0; i < mostSteps && !choices.empty(); ++i) {
-        const store::Step step = store::readStep(choices);
-        model.perform(step);
-        real.perform(step);
-        expectSameTrace(input, model, real);
-    }
-    model.end();
-    real.end();
-    expectSameTrace(input, model, real);
+    expectSameTraces(Choices(input), mostSteps, model, real,
+                     [](Choices& choices) { return store::readStep(choices); });
 });
 
 }  // namespace

@@ -22,7 +22,8 @@ bool isOneOf(std::string_view name, std::initializer_list<std::string_view> name
 }
 
 Words filesAt(const std::string& typed) {
-    const std::size_t nameStart = typed.rfind('/') + 1;
+    const std::size_t slash = typed.rfind('/');
+    const std::size_t nameStart = slash == std::string::npos ? 0 : slash + 1;
     const std::string folder = typed.substr(0, nameStart);
     const bool showsHidden = typed.size() > nameStart && typed[nameStart] == '.';
     Words files;

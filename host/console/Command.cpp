@@ -29,7 +29,8 @@ public:
 
 std::string_view Command::shortName() const noexcept {
     const std::string_view full = name();
-    return full.substr(full.rfind('.') + 1);
+    const std::size_t dot = full.rfind('.');
+    return dot == std::string_view::npos ? full : full.substr(dot + 1);
 }
 
 std::string Command::argumentText() const {

@@ -27,8 +27,8 @@ std::string_view CommandLine::takeRest() {
     skipBlanks();
     start = position;
     position = text.size();
-    const std::size_t end = text.find_last_not_of(blanks) + 1;
-    return end > start ? text.substr(start, end - start) : std::string_view();
+    const std::string_view rest = text.substr(start);
+    return rest.empty() ? rest : rest.substr(0, rest.find_last_not_of(blanks) + 1);
 }
 
 bool CommandLine::wordIsQuoted() const noexcept {

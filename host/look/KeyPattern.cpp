@@ -25,7 +25,8 @@ std::string_view behindCharacter(std::string_view text) {
     return text.substr(size);
 }
 
-// On a mismatch the last * takes one more character: what stood before it fits already.
+// On a mismatch the last * takes one more byte: what stood before it fits already. A part of a
+// character that it takes, the others of which a ? takes, fits as well as none of it.
 bool matchesGlob(std::string_view glob, std::string_view text) {
     bool hasStar = false;
     std::string_view globBehindStar;
@@ -43,7 +44,7 @@ bool matchesGlob(std::string_view glob, std::string_view text) {
             glob.remove_prefix(1);
             text.remove_prefix(1);
         } else if (hasStar && !textBehindStar.empty()) {
-            textBehindStar = behindCharacter(textBehindStar);
+            textBehindStar.remove_prefix(1);
             text = textBehindStar;
             glob = globBehindStar;
         } else {

@@ -51,6 +51,10 @@ Hubs& hubs() {
     return instance;
 }
 
+// At the latest when the library is loaded, so that it goes behind settings that are made in main()
+// and owned by a static object.
+const Hubs& madeAtLoad = hubs();
+
 }  // namespace
 
 std::shared_ptr<Hub> Hub::find(const std::shared_ptr<ConfigurationImpl>& store) {

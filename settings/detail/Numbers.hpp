@@ -21,6 +21,11 @@ inline constexpr bool isWholeNumber =
     std::is_integral_v<T> && sizeof(T) <= sizeof(std::uint64_t) &&
     !isOneOf<std::remove_cv_t<T>, bool, char, wchar_t, char16_t, char32_t>;
 
+/// What has to be added to `number` for the sum to be 0, in 64 bits.
+constexpr std::uint64_t complement(std::uint64_t number) noexcept {
+    return number == 0 ? 0 : ~number + 1;
+}
+
 /// An integer of any type.
 struct Whole {
     bool negative = false;
@@ -29,13 +34,13 @@ struct Whole {
     template <class T>
     static constexpr Whole of(T value) noexcept {
         const auto bits = static_cast<std::uint64_t>(value);
-        return value < T{0} ? Whole{true, 0 - bits} : Whole{false, bits};
+        return value < T{0} ? Whole{true, complement(bits)} : Whole{false, bits};
     }
 
     /// The integer as a `T`, whose range it is in.
     template <class T>
     constexpr T as() const noexcept {
-        return static_cast<T>(negative ? 0 - magnitude : magnitude);
+        return static_cast<T>(negative ? complement(magnitude) : magnitude);
     }
 };
 

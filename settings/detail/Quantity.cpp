@@ -69,8 +69,8 @@ std::optional<Wide> mantissaOf(std::string_view whole, std::string_view fraction
 }
 
 Ticks ticksOf(const QuantityPart& part, Ratio tick) {
-    const std::string_view fraction =
-        part.fraction.substr(0, part.fraction.find_last_not_of('0') + 1);
+    std::string_view fraction = part.fraction;
+    while (!fraction.empty() && fraction.back() == '0') fraction.remove_suffix(1);
     std::optional<Wide> mantissa = mantissaOf(part.whole, fraction);
     if (!mantissa) return fraction.empty() ? Misfit::tooLarge : Misfit::notWhole;
 

@@ -5,6 +5,7 @@
 
 #include <chrono>
 #include <cstdint>
+#include <cstdlib>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -368,6 +369,19 @@ TEST_F(SettingTest, MayBeMadeInACallbackOfAnother) {
     store->set("server.port", 1);
     ASSERT_TRUE(other.has_value());
     EXPECT_EQ(*other, 1);
+}
+
+// What `main` makes and a static object owns ends behind all that is made on first use.
+[[noreturn]] void endWithASettingOfAStaticObject() {
+    static std::optional<Setting<int>> port;
+    const auto store = std::make_shared<ConfigurationImpl>();
+    port.emplace(store, "server.port", 1);
+    std::exit(*port == 1 ? 0 : 1);
+}
+
+TEST(SettingDeathTest, MayBeOwnedByAStaticObject) {
+    ::testing::FLAGS_gtest_death_test_style = "threadsafe";  // where no setting was made before
+    EXPECT_EXIT(endWithASettingOfAStaticObject(), ::testing::ExitedWithCode(0), "");
 }
 
 TEST_F(SettingTest, StillFollowsWhenASourceHasThrown) {

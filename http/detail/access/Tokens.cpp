@@ -52,7 +52,7 @@ std::string_view trimmed(std::string_view text) {
     constexpr std::string_view blanks = " \t\r";
     const auto begin = std::min(text.find_first_not_of(blanks), text.size());
     text.remove_prefix(begin);
-    return text.substr(0, text.find_last_not_of(blanks) + 1);
+    return text.empty() ? text : text.substr(0, text.find_last_not_of(blanks) + 1);
 }
 
 bool isVisible(char character) {

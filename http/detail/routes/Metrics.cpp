@@ -12,7 +12,7 @@ constexpr std::string_view requestSeconds = "velkor_http_request_seconds";
 // Without a trip over doubles: what is counted is whole.
 std::string seconds(std::uint64_t count, std::uint64_t perSecond) {
     std::string fraction = std::to_string(count % perSecond + perSecond).substr(1);
-    fraction.erase(fraction.find_last_not_of('0') + 1);
+    while (!fraction.empty() && fraction.back() == '0') fraction.pop_back();
     const std::string whole = std::to_string(count / perSecond);
     return fraction.empty() ? whole : whole + "." + fraction;
 }

@@ -29,7 +29,8 @@ bool PendingChanges::add(const SharedChange& change) {
         if (isEnded) return false;
         queue.push(added, dropped);
         conflated += dropped.size();
-        count += 1 - dropped.size();
+        count += 1;
+        count -= dropped.size();
         if (count > mostKeys) {
             isEnded = true;
             isOpen = false;

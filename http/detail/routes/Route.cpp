@@ -17,11 +17,21 @@ Response page(const Context&, const Call&) {
     return {200, "text/html; charset=utf-8", std::string(pageHtml()), pageHeaders()};
 }
 
+// A stream of which only the head is asked for is not opened.
+bool answeredAsHead(Call& call) {
+    if (call.request.method != "HEAD") return false;
+    call.answer(Response{200, "text/event-stream", {}, {}});
+    return true;
+}
+
 void watchKey(const Context& context, Call& call) {
-    call.answer(watchFeed(context.store, required(call, "key"), context.metrics));
+    const std::string& key = required(call, "key");
+    if (answeredAsHead(call)) return;
+    call.answer(watchFeed(context.store, key, context.metrics));
 }
 
 void watchPrefix(const Context& context, Call& call) {
+    if (answeredAsHead(call)) return;
     const std::string* const prefix = find(call.parameters, "prefix");
     call.answer(changeFeed(context.store, prefix == nullptr ? std::string() : *prefix,
                            context.changes, context.metrics));
@@ -41,8 +51,8 @@ std::vector<Route> allRoutes() {
         {post, "/velkor/configuration/ConfigurationKeys", read, worker, answerKeys},
         {post, "/velkor/configuration/AddPropertyFileSource", write, worker, answerAddFile},
         {post, "/velkor/configuration/", read, caller, answerUnknownType},
-        {get, "/watch", read, caller, watchKey, {"key"}, true},
-        {get, "/changes", read, caller, watchPrefix, {"prefix"}, true},
+        {get, "/watch", read, caller, watchKey, {"key"}},
+        {get, "/changes", read, caller, watchPrefix, {"prefix"}},
         {get, "/config", read, worker, responding<optionPage>, {"prefix", "cursor", "limit"}},
         {"PATCH", "/config", write, worker, patchOptions, {"dry-run"}},
         {get, "/config/", read, caller, responding<optionLayers>},
@@ -52,7 +62,7 @@ std::vector<Route> allRoutes() {
         {get, "/healthz", none, caller, responding<alive>},
         {get, "/readyz", none, caller, responding<ready>},
         {get, "/metrics", read, worker, responding<metricsText>},
-        {get, "/", none, caller, responding<page>, {}, false, true},
+        {get, "/", none, caller, responding<page>, {}, true},
     };
 }
 

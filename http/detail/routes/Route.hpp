@@ -63,7 +63,6 @@ struct Route {
     Place place;
     Handling handle;
     std::array<std::string_view, 3> parameters{};  ///< That a query may have.
-    bool isStream = false;                         ///< The answer is a stream of events.
     bool isForAnyone = false;  ///< Pages of other sites may lead here, with any query.
 
     /// Whether `requested` is a path of this route.

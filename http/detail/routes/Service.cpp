@@ -5,6 +5,7 @@
 #include <chrono>
 #include <cstdint>
 #include <exception>
+#include <memory>
 #include <new>
 #include <optional>
 #include <stdexcept>
@@ -15,6 +16,7 @@
 #include "http/Refused.hpp"
 #include "http/detail/ClientStore.hpp"
 #include "http/detail/PropertyRoot.hpp"
+#include "http/detail/routes/Jobs.hpp"
 #include "http/detail/routes/Problem.hpp"
 #include "http/detail/routes/Route.hpp"
 #include "http/detail/routes/Worker.hpp"
@@ -140,11 +142,11 @@ private:
 };
 
 /// Leads requests through access and routing to what answers them. Safe for concurrent use: what
-/// is no constant here (keys, changes, counts, strangers, worker) is so by itself.
+/// is no constant here (keys, changes, counts, strangers, jobs) is so by itself.
 class Service final : public Handler {
 public:
     Service(std::shared_ptr<ConfigurationImpl> store, const ServerOptions& serverOptions,
-            std::shared_ptr<const TransportCounts> counts)
+            std::shared_ptr<const TransportCounts> counts, std::unique_ptr<Jobs> whoWorks)
         : options(serverOptions),
           access(options),
           messageService(std::make_shared<ClientStore>(store, propertyRootOf(options)),
@@ -157,7 +159,8 @@ public:
                   metricsOfRoutes(),
                   std::move(counts),
                   messageService.dispatcherFor(messages::allRequestTypes()),
-                  limitsOf(options)} {}
+                  limitsOf(options)},
+          jobs(std::move(whoWorks)) {}
 
     void handle(Request&& request, std::function<void(Answer&&)> answer) override {
         Call call{std::move(request),
@@ -179,7 +182,7 @@ public:
         return problemResponse(kind, textOf(kind));
     }
 
-    void stop() noexcept override { worker.stop(); }
+    void stop() noexcept override { jobs->stop(); }
 
 private:
     // Runs `work`, and answers with what it throws. Without memory the answer is that of a request
@@ -232,9 +235,6 @@ private:
             requireKnown(route, call.parameters);
         }
         call.argument = argumentOf(route, target.path);
-        if (route.isStream && request.method == "HEAD") {
-            return call.answer(Response{200, "text/event-stream", {}, {}});
-        }
         const bool isLight = route.place == Place::caller && request.body.size() <= smallBody;
         if (isLight) return route.handle(context, call);
         enqueue(call);
@@ -243,8 +243,8 @@ private:
     void enqueue(Call& call) {
         const auto kept = std::make_shared<Call>(std::move(call));
         const bool isWrite = kept->route->right == Right::write;
-        worker.post(
-            isWrite ? Worker::Kind::write : Worker::Kind::read, machineOf(kept->request.client),
+        jobs->post(
+            isWrite ? Jobs::Kind::write : Jobs::Kind::read, machineOf(kept->request.client),
             [this, kept] { answering(*kept, [&] { kept->route->handle(context, *kept); }); });
     }
 
@@ -272,7 +272,7 @@ private:
     KeyList keys;
     Strangers strangers;
     const Context context;
-    Worker worker{mostWaiting};  // the last member: it uses the others
+    const std::unique_ptr<Jobs> jobs;  // the last member: they use the others
 };
 
 }  // namespace
@@ -280,7 +280,15 @@ private:
 std::shared_ptr<Handler> makeService(std::shared_ptr<ConfigurationImpl> store,
                                      const ServerOptions& options,
                                      std::shared_ptr<const TransportCounts> counts) {
-    return std::make_shared<Service>(std::move(store), options, std::move(counts));
+    return makeService(std::move(store), options, std::move(counts),
+                       std::make_unique<Worker>(mostWaiting));
+}
+
+std::shared_ptr<Handler> makeService(std::shared_ptr<ConfigurationImpl> store,
+                                     const ServerOptions& options,
+                                     std::shared_ptr<const TransportCounts> counts,
+                                     std::unique_ptr<Jobs> jobs) {
+    return std::make_shared<Service>(std::move(store), options, std::move(counts), std::move(jobs));
 }
 
 }  // namespace velkor::http::detail

@@ -7,34 +7,30 @@
 
 #include "framework/common/Mutex.hpp"
 #include "http/detail/routes/FairQueue.hpp"
+#include "http/detail/routes/Jobs.hpp"
 #include "layers/OwnThread.hpp"
 
 namespace velkor::http::detail {
 
 /// A thread that does one job after the other: those that write before those that read, and among
 /// them in turn those of each owner. Thread-safe; jobs run, and are destroyed, under no lock.
-class Worker {
+class Worker final : public Jobs {
 public:
-    /// What is to be done; it throws nothing.
-    using Job = FairQueue::Job;
-
-    enum class Kind { write, read };
-
     /// Starts the thread; at most `most` jobs of each kind wait. Throws `std::system_error` when
     /// the system refuses.
     explicit Worker(std::size_t most);
-    ~Worker() { stop(); }
+    ~Worker() override { stop(); }
 
     Worker(const Worker&) = delete;
     Worker& operator=(const Worker&) = delete;
 
     /// Lets `job` of `owner` be done. Where too many wait, the newest job of whoever has the most
     /// waiting is destroyed instead, which may be this one, as all are once the thread has ended.
-    void post(Kind kind, const std::string& owner, Job job) VELKOR_EXCLUDES(mutex);
+    void post(Kind kind, const std::string& owner, Job job) override VELKOR_EXCLUDES(mutex);
 
     /// Ends the thread once it has done the job it is at, for which it waits; those that wait are
     /// destroyed before. May be called several times, by one thread at a time, and not by a job.
-    void stop() noexcept VELKOR_EXCLUDES(mutex);
+    void stop() noexcept override VELKOR_EXCLUDES(mutex);
 
 private:
     void run() VELKOR_EXCLUDES(mutex);

@@ -61,7 +61,8 @@ std::vector<Endpoint> toEndpoints(const std::vector<std::string>& texts) {
     for (const auto& text : texts) {
         auto endpoint = toEndpoint(text);
         // What stands in front of "@" may be a password.
-        const auto shown = text.substr(text.rfind('@') + 1);
+        const std::size_t at = text.rfind('@');
+        const auto shown = at == std::string::npos ? text : text.substr(at + 1);
         if (!endpoint) throw std::invalid_argument(etcd_errors::badEndpoint + shown);
         endpoints.push_back(std::move(*endpoint));
     }

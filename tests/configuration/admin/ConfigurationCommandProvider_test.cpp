@@ -6,6 +6,7 @@
 #include <cstddef>
 #include <functional>
 #include <memory>
+#include <new>
 #include <set>
 #include <stdexcept>
 #include <string>
@@ -418,6 +419,15 @@ TEST_F(FailingStore, ThrowForANumberStoresTheTextInstead) {
 TEST_F(FailingStore, ForeignThrowForANumberStoresTheTextInstead) {
     scripted->whenSet = [](const ConfigurationValue& value) {
         if (value.which() != 5) throw 7;
+        return makeReadyFuture(value);
+    };
+    EXPECT_EQ(run("set", {"a", "5"}), "");
+    EXPECT_THAT(scripted->calls, ElementsAre("set a int 5", "set a string 5"));
+}
+
+TEST_F(FailingStore, LackOfMemoryForANumberStoresTheTextInstead) {
+    scripted->whenSet = [](const ConfigurationValue& value) {
+        if (value.which() != 5) throw std::bad_alloc();
         return makeReadyFuture(value);
     };
     EXPECT_EQ(run("set", {"a", "5"}), "");

@@ -1,3 +1,4 @@
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
 #include <ostream>
@@ -41,6 +42,14 @@ TEST_P(Show, Answers) {
 
 std::string nameOf(const ::testing::TestParamInfo<ShowCase>& info) {
     return info.param.name;
+}
+
+TEST(ShowInLatin1, AStarEndsBeforeAByteThatIsNoCharacterByItself) {
+    const TemporaryFile file("a\x98z=1\nb=2\n", "latin1.properties");
+    const auto result = runProgram({file.path().string(), "-c", "show *\x98z"});
+    EXPECT_THAT(result.out, ::testing::HasSubstr("= '1'\n"));
+    EXPECT_THAT(result.out, ::testing::Not(::testing::HasSubstr("'2'")));
+    EXPECT_EQ(result.exitCode, 0);
 }
 
 INSTANTIATE_TEST_SUITE_P(

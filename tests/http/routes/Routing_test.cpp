@@ -56,6 +56,10 @@ TEST_F(RoutingTest, AnswersHeadAsGet) {
     EXPECT_EQ(send("HEAD", "/config").status, 200);
 }
 
+TEST_F(RoutingTest, RefusesTheHeadOfAStreamAsTheStream) {
+    EXPECT_EQ(problemIn(send("HEAD", "/watch")), problemIn(get("/watch")));
+}
+
 TEST_F(RoutingTest, OpensNoStreamForHead) {
     const Response head = send("HEAD", "/watch?key=k");
     EXPECT_EQ(head.status, 200);

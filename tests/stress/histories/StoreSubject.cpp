@@ -2,6 +2,7 @@
 
 #include <chrono>
 #include <exception>
+#include <random>
 #include <set>
 #include <thread>
 #include <utility>
@@ -88,11 +89,8 @@ void letOthersIn() {
 }
 
 void stumble() {
-    thread_local unsigned state = 2463534242U;
-    state ^= state << 13U;
-    state ^= state >> 17U;
-    state ^= state << 5U;
-    if (state % 8 == 0) letOthersIn();
+    thread_local std::minstd_rand random;
+    if (random() % 8 == 0) letOthersIn();
 }
 
 std::string StoreSubject::textOf(const ConfigurationValue& value) {
