@@ -1,7 +1,8 @@
 #!/bin/sh
 # run_long.sh BUILD [WRAPPER...]: the races and histories of the configured folder BUILD, for long:
-# 16 threads for five minutes, and 100000 rounds of each race. WRAPPER runs the programs (`setarch
-# -R` for those with the thread sanitizer, whose address layout is fixed).
+# 16 threads for five minutes, 100000 rounds of each race, and 10000 schedules by chance of each
+# scenario beside all of few preemptions. WRAPPER runs the programs (`setarch -R` for those with the
+# thread sanitizer, whose address layout is fixed).
 set -eu
 build=$1
 shift
@@ -14,3 +15,8 @@ export VELKOR_STRESS_ROUNDS=100000
 # The cases of futures that race, each round with a thread of its own.
 "$@" "$build/tests/framework/future-tests" --gtest_brief=1 \
     --gtest_filter='PromiseRaces.*:*Race.*:FutureGet.ConsumerMayDestroy*:SharedFutureState.ManyThreads*'
+# Which the thread sanitizer has none of.
+for program in schedule-tests store-schedule-tests; do
+    [ ! -x "$build/tests/stress/$program" ] || VELKOR_SCHEDULES=10000 \
+        "$@" "$build/tests/stress/$program" --gtest_brief=1 --gtest_filter='-Scheduler*'
+done
