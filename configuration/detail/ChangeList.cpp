@@ -109,9 +109,7 @@ void ChangeList::keep(SourceRegistry& sources, const std::string& key, std::uint
 }
 
 void ChangeList::failAll(const std::exception_ptr& reason) noexcept {
-    for (Entry& entry : entries) {
-        if (!entry.failure) entry.failure = reason;
-    }
+    for (Entry& entry : entries) entry.failure = reason;
 }
 
 std::shared_ptr<ChangePublisher> ChangeList::remove(std::uint64_t streamId) {

@@ -233,7 +233,7 @@ private:
     void atEndInKey() {
         if (lineBegin < text.size()) {
             if (!inSection) add(text.size(), PropertyFlaw::droppedLine);
-        } else if (!found.empty() && found.back().flaw == PropertyFlaw::noSeparator) {
+        } else if (found.back().flaw == PropertyFlaw::noSeparator) {  // or a section
             found.back().flaw = PropertyFlaw::droppedLine;
         }
     }

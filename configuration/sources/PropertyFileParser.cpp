@@ -90,9 +90,9 @@ PropertyFileParser::State PropertyFileParser::step(State state) {
         case State::valueEscape:
             return onValueEscape();
         case State::continuationIndent:
-            return onContinuationIndent();
+            break;
     }
-    return state;
+    return onContinuationIndent();
 }
 
 PropertyFileParser::State PropertyFileParser::onLineStart() {

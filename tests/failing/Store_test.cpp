@@ -151,6 +151,17 @@ void overwriteNear(Trial& trial) {
                [&] { EXPECT_TRUE(s.store->set(s.near, s.newValue).get() == s.oldValue); });
 }
 
+void overwriteBelowALongPrefix(Trial& trial) {
+    StoreScene s;
+    Watched<configuration::OptionChange> changes;
+    changes.open(s.store->watchChanges(s.near));
+    trial.passes([&] { s.store->set(s.near, s.newValue).get(); });
+    // What the stream has kept and not been told of comes with the next change.
+    const int before = changes.subscriber->values;
+    s.expectAlive();
+    EXPECT_TRUE(changes.subscriber->values > before || changes.subscriber->errors == 1);
+}
+
 void setNewNear(Trial& trial) {
     StoreScene s;
     tryWriting(trial, s, s.missing, "", textOf(s.newValue), nullptr,
@@ -563,6 +574,7 @@ VELKOR_FAILING_ROWS(FailingReads, reading);
 
 constexpr Row writing[] = {
     {"Overwrite", overwriteNear},
+    {"OverwriteBelowALongPrefix", overwriteBelowALongPrefix},
     {"SetNew", setNewNear},
     {"OverwriteForeign", overwriteFar},
     {"SetNewForeign", setNewFar},

@@ -23,7 +23,7 @@ _OTHER_STATEMENTS = re.compile(
     r"|explicit|virtual|extern|inline|operator)\b")
 # What takes, gives back or waits for a lock, and what wakes or tells others.
 _LOCKS = re.compile(r"\b(?:MutexLock|Level|Operation|lock_guard|unique_lock)\b|(?:\.|->)(?:un)?lock\(\)"
-                    r"|\bnotify(?:_all|_one)?\(|\bgiveBack\(|\btakeBack\(")
+                    r"|(?:\.|->)wait\(|\bnotify(?:_all|_one)?\(|\bgiveBack\(|\btakeBack\(")
 _TAKEN = re.compile(r"\b(?:MutexLock|Level|Operation|lock_guard|unique_lock)\b")
 _COMPARISONS = {"<": "<=", "<=": "<", ">": ">=", ">=": ">", "==": "!=", "!=": "=="}
 

@@ -4,6 +4,7 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <utility>
 
 #include "configuration/sources/InMemorySource.hpp"
 #include "tests/configuration/changes/ChangeTesting.hpp"
@@ -115,6 +116,18 @@ TEST_F(Unset, DuringARegistrationIsTold) {
     };
     add("new", "", -1, {{"a", 1}});
     EXPECT_THAT(watched.values(), ElementsAre("int 7", "int 1", "int 7"));
+}
+
+TEST_F(Unset, DuringTheSecondRegistrationOfASourceIsToldOnce) {
+    store->set("a", 7, "default").get();
+    const auto source = std::make_shared<InMemorySource>(ValueMap{{"a", 1}});
+    store->addSource("first", "", -1, false, source).get();
+    const Watch watched = watch("a");
+    watched.subscriber->whenNext = [this, done = false](const ConfigurationValue&) mutable {
+        if (!std::exchange(done, true)) store->unset("a", "second");
+    };
+    store->addSource("second", "", -2, false, source).get();
+    EXPECT_THAT(watched.values(), ElementsAre("int 1", "int 1", "int 7"));
 }
 
 }  // namespace

@@ -14,6 +14,7 @@
 #include "tests/configuration/changes/ChangeTesting.hpp"
 #include "tests/support/BoundedWait.hpp"
 #include "tests/support/StandardErrorCapture.hpp"
+#include "tests/support/Thrown.hpp"
 
 namespace velkor::configuration {
 namespace {
@@ -39,6 +40,15 @@ TEST_F(WatchChanges, TellsTheKeysThatThePrefixBegins) {
     set("network", 2);
     set("net", 3);
     EXPECT_THAT(followed.texts(), ElementsAre("net.port=int 1@override"));
+}
+
+TEST_F(WatchChanges, TellsEachStreamItsOwnKeys) {
+    const ChangeWatch first = follow("net.");
+    const ChangeWatch second = follow("disk.");
+    set("net.a", 1);
+    set("disk.b", 2);
+    EXPECT_THAT(first.texts(), ElementsAre("net.a=int 1@override"));
+    EXPECT_THAT(second.texts(), ElementsAre("disk.b=int 2@override"));
 }
 
 TEST_F(WatchChanges, TellsWhatIsEffectiveNotWhatWasWritten) {
@@ -171,6 +181,19 @@ TEST_F(WatchChanges, StreamFailsWhenAChangeCannotBeRead) {
     EXPECT_THROW(source->listener("a"), std::logic_error);
     ASSERT_EQ(followed.subscriber->errors.size(), 1U);
     EXPECT_THROW(std::rethrow_exception(followed.subscriber->errors[0]), std::logic_error);
+}
+
+TEST_F(WatchChanges, StreamFailsOnceWithTheFirstOfSeveralErrors) {
+    const auto source = std::make_shared<HookedSource>(HookedSource::Table{{"a", 1}, {"b", 2}});
+    source->whenGet = [count = 0]() mutable {
+        throw std::logic_error("get " + std::to_string(++count));
+    };
+    const ChangeWatch followed = follow("");
+    EXPECT_THROW(store->addSource("new", "", -1, false, source), std::logic_error);
+    ASSERT_EQ(followed.subscriber->errors.size(), 1U);
+    EXPECT_EQ(testing::thrownText<std::logic_error>(
+                  [&] { std::rethrow_exception(followed.subscriber->errors[0]); }),
+              "get 1");
 }
 
 TEST_F(WatchChanges, StreamOpenedFromInsideASourceIsSafe) {

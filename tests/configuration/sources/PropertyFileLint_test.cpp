@@ -110,6 +110,15 @@ TEST(PropertyFileLint, SaysWhenTheEndOfATextIsLeftOut) {
     }
 }
 
+TEST(PropertyFileLint, SaysWhyTheEndOfATextIsLeftOut) {
+    for (const auto* const text : {"k", "key"}) {
+        EXPECT_EQ(flawsOf(text), std::set{PropertyFlaw::droppedLine}) << text;
+    }
+    for (const auto* const text : {"key\\", "k=a\\", "k=a\\\n"}) {
+        EXPECT_EQ(flawsOf(text), std::set{PropertyFlaw::backslashAtEnd}) << text;
+    }
+}
+
 ::testing::AssertionResult arePlacedIn(std::string_view text,
                                        const std::vector<PropertyRemark>& remarks) {
     std::size_t line = 1;
