@@ -92,7 +92,9 @@ Asked tryAsk(Trial& trial, const HttpScene& scene, Request sent, const std::stri
     const bool passed = trial.passes([&] { scene.ask(asked, std::move(sent)); });
     EXPECT_LE(asked.answers, 1);
     // A refusal takes memory as well.
-    if (!trial.isLasting() || !trial.isOfMemory()) EXPECT_EQ(asked.answers, 1);
+    if (!trial.isLasting() || !trial.isOfMemory()) {
+        EXPECT_EQ(asked.answers, 1);
+    }
     if (asked.answers == 0) return asked;
     EXPECT_TRUE(passed);
     if (asked.status() == 200) {
