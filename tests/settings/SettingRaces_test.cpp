@@ -9,7 +9,10 @@
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "settings/Bound.hpp"
+#include "settings/Describe.hpp"
+#include "settings/Secrets.hpp"
 #include "settings/Setting.hpp"
+#include "settings/testing/Override.hpp"
 #include "tests/stress/Race.hpp"
 
 namespace velkor::settings::testing {
@@ -141,6 +144,42 @@ TEST_F(SettingRaces, ASettingThatIsMadeBesideAChangeIsUpToDate) {
     int value = 0;
     race([&] { setting.reset(); }, [&] { setting.emplace(store, "key", 0); },
          [&] { store->set("key", ++value); }, [&] { ASSERT_EQ(*setting, value); });
+}
+
+TEST_F(SettingRaces, AReaderOfAnOverriddenSettingSeesOneOfItsValues) {
+    store->set("key", 1);
+    const Setting<int> setting(store, "key", 0);
+    const Setting<std::string> text(store, "key");
+    int seen = 0;
+    std::string read;
+    std::string source;
+    race([] {}, [&] { const Override overridden(store, "key", 2); },
+         [&] {
+             seen = setting;
+             read = text.get();
+             source = setting.status().source;
+         },
+         [&] {
+             ASSERT_TRUE(seen == 1 || seen == 2) << seen;
+             ASSERT_TRUE(read == "1" || read == "2") << read;
+             ASSERT_TRUE(source == "override" || source.rfind("test override ", 0) == 0) << source;
+             ASSERT_EQ(setting, 1);
+         });
+}
+
+TEST_F(SettingRaces, WhoListsSettingsSeesTheOnesThatStay) {
+    const Setting<int> stays(store, "key", 1, secret());
+    std::vector<Description> listed;
+    bool isHidden = false;
+    race([] {}, [&] { const Setting<int> comesAndGoes(store, "key", 2); },
+         [&] {
+             listed = describe(store, "key");
+             isHidden = isSecret(store, "key");
+         },
+         [&] {
+             ASSERT_TRUE(listed.size() == 1 || listed.size() == 2) << listed.size();
+             ASSERT_TRUE(isHidden);
+         });
 }
 
 TEST_F(SettingRaces, TwoThreadsMakeTheFirstSettings) {
