@@ -2,7 +2,9 @@
 // read again, in both forms, and nothing of it is lost. The form in state files is compared with
 // what is documented of it, since files are to be readable for good.
 
+#include <algorithm>
 #include <cmath>
+#include <cstddef>
 #include <cstdint>
 #include <cstdio>
 #include <cstdlib>
@@ -105,11 +107,19 @@ void checkForms(const ConfigurationValue& value) {
     expectThat(messages::parseJsonObject(text)->has("type"), "A value in etcd is JSON", text);
 }
 
+// Whether so many digits follow each other that they may be a number of more than 64 bits.
+bool hasLongNumber(std::string_view text) {
+    constexpr std::ptrdiff_t digits = 19;
+    const auto isDigit = [](char byte, char) { return byte >= '0' && byte <= '9'; };
+    return std::search_n(text.begin(), text.end(), digits, '0', isDigit) != text.end();
+}
+
 // What is one of our objects to the letter is one of the more lenient messages as well. Those read
-// a lone half of a surrogate pair, and the sign of a whole zero, in another way.
+// a lone half of a surrogate pair, and the sign of a whole zero, in another way, and may refuse long
+// numbers.
 void compareWithMessage(std::string_view input, const ConfigurationValue& value) {
     const bool isPlainText = exactly(value) == exactly(std::string(input));
-    if (isPlainText || input.find('\\') != std::string_view::npos) return;
+    if (isPlainText || input.find('\\') != std::string_view::npos || hasLongNumber(input)) return;
     const auto object = messages::parseJsonObject(std::string(input));
     if (object->has("exact")) return;
     ConfigurationValue lenient;
