@@ -115,8 +115,8 @@ bool hasLongNumber(std::string_view text) {
 }
 
 // What is one of our objects to the letter is one of the more lenient messages as well. Those read
-// a lone half of a surrogate pair, and the sign of a whole zero, in another way, and may refuse long
-// numbers.
+// a lone half of a surrogate pair, and the sign of a whole zero, in another way, and may refuse
+// long numbers.
 void compareWithMessage(std::string_view input, const ConfigurationValue& value) {
     const bool isPlainText = exactly(value) == exactly(std::string(input));
     if (isPlainText || input.find('\\') != std::string_view::npos || hasLongNumber(input)) return;
