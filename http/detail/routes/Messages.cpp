@@ -78,8 +78,8 @@ void answerSet(const Context& context, Call& call) {
     record.add(memberOf(context, call.request.body, "key"));
     Response response = dispatched<ConfigurationSet>(context, call.request.body);
     if (response.status != 200) return record.answer(call.answer, std::move(response));
-    answerOnceCommitted(durableSources(*context.store), std::move(record), std::move(call.answer),
-                        std::move(response));
+    const Sources sources = durableSources(*context.store);
+    answerOnceCommitted(sources, std::move(record), std::move(call.answer), std::move(response));
 }
 
 void answerAddFile(const Context& context, Call& call) {

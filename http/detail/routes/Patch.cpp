@@ -68,8 +68,9 @@ void write(const Context& context, Call& call, const std::vector<Change>& change
     } catch (...) {
         return record.answer(call.answer, problemResponse(std::current_exception()));
     }
-    answerOnceCommitted(durableSources(*context.store, sourcesOf(applied)), std::move(record),
-                        std::move(call.answer), changedResponse(context, applied, false));
+    const Sources sources = durableSources(*context.store, sourcesOf(applied));
+    Response response = changedResponse(context, applied, false);
+    answerOnceCommitted(sources, std::move(record), std::move(call.answer), std::move(response));
 }
 
 // Which a client that sends back what it was shown would write over the secret.
