@@ -4,6 +4,8 @@
 #include <chrono>
 #include <future>
 #include <memory>
+#include <string>
+#include <thread>
 
 #include <unistd.h>
 
@@ -15,8 +17,9 @@ int main(int, char** arguments) {
     auto source = velkor::layers::SqliteSource::open(arguments[1]);
     std::promise<void> begun;
     std::promise<void> written;
-    source->setChangeListener([&](const std::string& key) {
-        if (key != "tick" || source->has("tick")) return;
+    source->setChangeListener([&, main = std::this_thread::get_id()](const std::string& key) {
+        // That it is set is told here, even if its time is over by then.
+        if (key != "tick" || std::this_thread::get_id() == main) return;
         begun.get_future().wait();
         source->set("written", 1);
         source.reset();
