@@ -1,6 +1,5 @@
 #include "http/detail/transport/Acceptor.hpp"
 
-#include <boost/asio/post.hpp>
 #include <cerrno>
 #include <chrono>
 #include <exception>
@@ -34,27 +33,24 @@ Acceptor::~Acceptor() {
     if (readable.is_open()) readable.release();  // the socket closes it
 }
 
-void Acceptor::start() {
-    boost::asio::post(*home.context(), [self = shared_from_this()] { self->await(); });
-}
-
-void Acceptor::close() {
-    boost::asio::post(*home.context(), [self = shared_from_this()] {
-        if (!self->socket) return;
-        self->pauseTimer.cancel();
-        self->readable.release();
-        self->socket.reset();
-    });
-}
-
-void Acceptor::await() {
+void Acceptor::close() noexcept {
     if (!socket) return;
+    boost::system::error_code ignored;
+    pauseTimer.cancel(ignored);
+    readable.release();
+    socket.reset();
+}
+
+void Acceptor::resume() {
+    if (!socket || isAwaiting) return;
     readable.async_wait(
         boost::asio::posix::stream_descriptor::wait_read,
         [self = shared_from_this()](const boost::system::error_code&) { self->acceptAll(); });
+    isAwaiting = true;
 }
 
 void Acceptor::acceptAll() {
+    isAwaiting = false;
     if (!socket) return;
     for (int taken = 0; taken < mostAtOnce; ++taken) {
         Arrival arrival;
@@ -68,7 +64,7 @@ void Acceptor::acceptAll() {
         isPaused = false;
         admit(std::move(arrival));
     }
-    await();
+    resume();
 }
 
 void Acceptor::admit(Arrival&& arrival) noexcept {
@@ -88,6 +84,7 @@ void Acceptor::pause(int error) {
     pauseTimer.expires_after(pauseTime);
     pauseTimer.async_wait(
         [self = shared_from_this()](const boost::system::error_code&) { self->acceptAll(); });
+    isAwaiting = true;
     if (!std::exchange(isPaused, true)) {
         logger.write(common::warning,
                      "New connections have to wait: ", std::generic_category().message(error));

@@ -18,7 +18,7 @@ public:
     /// The loop that serves the next client.
     using Choice = std::function<Loop&()>;
 
-    /// `home` outlives the acceptor's work: it is closed before that stops.
+    /// For `home`, on whose thread the other members are called.
     Acceptor(Loop& home, std::unique_ptr<ListeningSocket> listening, bool secure,
              std::shared_ptr<Shared> sharedByAll, Choice choice);
 
@@ -27,14 +27,14 @@ public:
     Acceptor(const Acceptor&) = delete;
     Acceptor& operator=(const Acceptor&) = delete;
 
-    /// Begins. Thread-safe.
-    void start();
+    /// Waits for clients, unless it does so or has been closed. May throw `std::bad_alloc`, as what
+    /// it does when clients come: to be called again then.
+    void resume();
 
-    /// Takes no more clients and closes the socket. Thread-safe; doesn't wait.
-    void close();
+    /// Takes no more clients and closes the socket.
+    void close() noexcept;
 
 private:
-    void await();
     void acceptAll();
     void admit(Arrival&& arrival) noexcept;
     void pause(int error);
@@ -46,7 +46,8 @@ private:
     std::unique_ptr<ListeningSocket> socket;  // null: closed
     boost::asio::posix::stream_descriptor readable;
     boost::asio::steady_timer pauseTimer;
-    bool isPaused = false;  // since the last client
+    bool isAwaiting = false;  // clients, or the end of a pause
+    bool isPaused = false;    // since the last client
 };
 
 }  // namespace velkor::http::detail::transport

@@ -83,7 +83,7 @@ private:
     void greeted(const Error& error) {
         if (error) return this->end();
         if (!isWelcome) return refuse(503);
-        reading = std::make_unique<Reading>(options());
+        reading = std::make_shared<Reading>(options());
         awaitRequest();
     }
 
@@ -160,17 +160,24 @@ private:
         Request request = parser.take();
         request.client = client;
         phase = Phase::answering;
-        this->expireNever();
-        shared->handler->handle(
-            std::move(request),
-            [context = loop.context(), self = this->weak_from_this()](Answer&& answer) {
-                boost::asio::dispatch(*context, [self, answer = std::move(answer)]() mutable {
-                    // Only here, on its thread, may this be the last reference.
-                    const auto connection = self.lock();
-                    if (!connection) return;
-                    static_cast<Connection&>(*connection).onAnswer(std::move(answer));
-                });
+        this->expireAfter(options().commentInterval);
+        shared->handler->handle(std::move(request), [context = loop.context(),
+                                                     self = this->weak_from_this(),
+                                                     handling = reading](Answer&& answer) {
+            boost::asio::dispatch(*context, [self, handling, answer = std::move(answer)]() mutable {
+                handling.reset();
+                // Only here, on its thread, may this be the last reference.
+                const auto connection = self.lock();
+                if (!connection) return;
+                static_cast<Connection&>(*connection).onAnswer(std::move(answer));
             });
+        });
+    }
+
+    // An answer is lost when there is no memory to bring it here.
+    void lookForAnswer() {
+        if (reading.use_count() == 1) return refuse(503);
+        this->expireAfter(options().commentInterval);
     }
 
     void onAnswer(Answer&& answer) noexcept {
@@ -240,6 +247,8 @@ private:
                 ++counts().requestsTimedOut;
                 wire.cancel();
                 return refuse(408);
+            case Phase::answering:
+                return lookForAnswer();
             case Phase::streaming:
                 return this->onSilence();
             case Phase::sending:
@@ -256,7 +265,7 @@ private:
     bool staysOpen = false;
     bool isHead = false;  // of the present request
     bool isOld = false;
-    std::unique_ptr<Reading> reading;
+    std::shared_ptr<Reading> reading;  // shared with what is to answer, as long as that can
 };
 
 }  // namespace velkor::http::detail::transport

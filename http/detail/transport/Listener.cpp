@@ -22,13 +22,13 @@ Listener::Listener(const ServerOptions& options, std::shared_ptr<Handler> handle
     }
     for (unsigned count = 0; count < options.threads; ++count) loops.emplace_back(shared);
     turn = loops.begin();
+    Loop& home = loops.front();
     for (auto& socket : sockets) {
         const bool secure = shared->tls && !socket->endpoint().isUnix();
-        acceptors.push_back(std::make_shared<Acceptor>(loops.front(), std::move(socket), secure,
-                                                       shared,
-                                                       [this]() -> Loop& { return nextLoop(); }));
+        home.accept(std::make_shared<Acceptor>(home, std::move(socket), secure, shared,
+                                               [this]() -> Loop& { return nextLoop(); }));
     }
-    for (const auto& acceptor : acceptors) acceptor->start();
+    for (Loop& loop : loops) loop.start();
 }
 
 Listener::~Listener() {
@@ -42,10 +42,7 @@ Loop& Listener::nextLoop() noexcept {
 }
 
 bool Listener::stop() noexcept {
-    if (!isStopping.exchange(true)) {
-        for (const auto& acceptor : acceptors) acceptor->close();
-        for (Loop& loop : loops) loop.stop();
-    }
+    for (Loop& loop : loops) loop.stop();
     for (const Loop& loop : loops) {
         if (loop.runsHere()) return false;
     }

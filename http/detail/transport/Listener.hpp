@@ -1,6 +1,5 @@
 #pragma once
 
-#include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <list>
@@ -15,7 +14,6 @@
 
 namespace velkor::http::detail::transport {
 
-class Acceptor;
 class Loop;
 struct Shared;
 
@@ -47,9 +45,7 @@ private:
     std::vector<Endpoint> bound;
     std::list<Loop> loops;
     std::list<Loop>::iterator turn;  // used on the thread of the first loop
-    std::vector<std::shared_ptr<Acceptor>> acceptors;
-    std::atomic<bool> isStopping{false};
-    common::Mutex joining;  // held by who waits for the threads; none of them takes it
+    common::Mutex joining;           // held by who waits for the threads; none of them takes it
 };
 
 }  // namespace velkor::http::detail::transport

@@ -6,6 +6,7 @@
 #include <utility>
 
 #include "http/detail/Loggers.hpp"
+#include "http/detail/transport/Acceptor.hpp"
 #include "http/detail/transport/Connections.hpp"
 #include "http/detail/transport/ResponseText.hpp"
 
@@ -16,6 +17,9 @@ using std::chrono::milliseconds;
 
 // How long answers that are under way are waited for when the server stops.
 constexpr milliseconds stopGrace{500};
+
+// How long what had no memory waits before it is begun again.
+constexpr milliseconds shortagePause{10};
 
 // How often the times of the connections are looked at: a small part of the shortest of them.
 milliseconds tickInterval(const ServerOptions& options) {
@@ -40,25 +44,45 @@ Loop::Loop(std::shared_ptr<Shared> sharedByAll)
       interval(tickInterval(shared->options)),
       running(std::make_shared<Context>(1)),
       work(boost::asio::make_work_guard(*running)),
-      ticker(*running) {
-    thread.emplace([this] { run(); });
-}
+      ticker(*running) {}
 
 Loop::~Loop() {
     stop();
     join();
 }
 
+void Loop::start() {
+    thread.emplace([this] { run(); });
+}
+
+// The context is stopped twice: by `stop`, and when nothing is left to do.
 void Loop::run() noexcept {
     threadId = std::this_thread::get_id();
-    for (;;) {
+    runOn();
+    running->restart();
+    beginStop();
+    runOn();
+}
+
+// Runs until the context is stopped. Lack of memory ends what had none, and what this loop does
+// itself is begun again.
+void Loop::runOn() noexcept {
+    milliseconds pause{0};
+    while (!running->stopped()) {
         try {
+            running->run_for(pause);
+            resume();
             running->run();
-            return;
         } catch (const std::exception& error) {
+            pause = shortagePause;
             reportLost(error);
         }
     }
+}
+
+void Loop::resume() {
+    for (const auto& acceptor : acceptors) acceptor->resume();
+    if (!peers.empty()) armTicker();
 }
 
 void Loop::take(Arrival&& arrival, Limits::Place&& place) {
@@ -68,7 +92,7 @@ void Loop::take(Arrival&& arrival, Limits::Place&& place) {
                       });
 }
 
-void Loop::admit(Arrival&& arrival, Limits::Place&& place) noexcept {
+void Loop::admit(Arrival&& arrival, Limits::Place&& place) {
     if (isStopping()) return;
     try {
         const auto make = arrival.secure ? tlsConnection : plainConnection;
@@ -76,10 +100,10 @@ void Loop::admit(Arrival&& arrival, Limits::Place&& place) noexcept {
             make(*this, shared, std::move(arrival), std::move(place));
         peers.emplace(peer.get(), peer);
         peer->begin();
-        armTicker();
     } catch (const std::exception&) {
         ++shared->counts->connectionsRefused;
     }
+    if (!peers.empty()) armTicker();
 }
 
 void Loop::forget(const Peer& peer) noexcept {
@@ -96,19 +120,20 @@ const std::string& Loop::date() {
     return dateOfSecond;
 }
 
-void Loop::stop() {
-    boost::asio::post(*running, [this] { beginStop(); });
+void Loop::stop() noexcept {
+    if (!isAskedToStop.exchange(true)) running->stop();
 }
 
-void Loop::beginStop() {
-    if (isStopping()) return;
+void Loop::beginStop() noexcept {
     stopTime = Peer::Clock::now() + stopGrace;
+    for (const auto& acceptor : acceptors) acceptor->close();
     // A peer that ends leaves the others where they are, and goes itself.
     for (auto next = peers.begin(); next != peers.end();) {
         const std::shared_ptr<Peer> peer = (next++)->second;
         peer->stop();
     }
-    ticker.cancel();  // its next end is the new time
+    boost::system::error_code ignored;
+    ticker.cancel(ignored);  // its next end is the new time
     endIfDone();
 }
 

@@ -12,6 +12,8 @@
 #include <string>
 #include <thread>
 #include <unordered_map>
+#include <utility>
+#include <vector>
 
 #include "http/detail/transport/ListeningSocket.hpp"
 #include "http/detail/transport/Peer.hpp"
@@ -19,6 +21,8 @@
 #include "layers/OwnThread.hpp"
 
 namespace velkor::http::detail::transport {
+
+class Acceptor;
 
 /// A thread, and the connections that it serves: each is used on this thread only, so none needs a
 /// lock. One clock for all of them finds those whose time is up.
@@ -28,7 +32,6 @@ class Loop {
 public:
     using Context = boost::asio::io_context;
 
-    /// Starts the thread. Throws `std::system_error` when the system refuses.
     explicit Loop(std::shared_ptr<Shared> sharedByAll);
 
     /// Stops and waits, as `stop` and `join`.
@@ -39,6 +42,12 @@ public:
 
     /// What runs on the thread. It may outlive the loop: who has to post from elsewhere shares it.
     const std::shared_ptr<Context>& context() const noexcept { return running; }
+
+    /// Lets `acceptor` work here until the loop stops. Before `start`.
+    void accept(std::shared_ptr<Acceptor> acceptor) { acceptors.push_back(std::move(acceptor)); }
+
+    /// Starts the thread; called once. Throws `std::system_error` when the system refuses.
+    void start();
 
     /// Serves a client that has come: with `place`, or, without one, by telling that there are too
     /// many. Thread-safe. May throw `std::bad_alloc`: the client is lost then.
@@ -56,9 +65,9 @@ public:
     /// Where bytes go that nobody wants.
     std::array<char, 4096>& waste() noexcept { return wasted; }
 
-    /// Ends the streams and the idle connections, then, within half a second, those that are being
-    /// answered. Thread-safe; doesn't wait.
-    void stop();
+    /// Takes no more clients, ends the streams and the idle connections, then, within half a
+    /// second, those that are being answered. Thread-safe; needs no memory, and doesn't wait.
+    void stop() noexcept;
 
     /// Waits until all connections have ended, after `stop`. From one other thread at a time.
     void join() noexcept { thread.reset(); }
@@ -68,8 +77,10 @@ public:
 
 private:
     void run() noexcept;
-    void admit(Arrival&& arrival, Limits::Place&& place) noexcept;
-    void beginStop();
+    void runOn() noexcept;
+    void resume();
+    void admit(Arrival&& arrival, Limits::Place&& place);
+    void beginStop() noexcept;
     void armTicker();
     void tick();
     void endIfDone() noexcept;
@@ -78,6 +89,8 @@ private:
     const std::chrono::milliseconds interval;
     const std::shared_ptr<Context> running;
     std::optional<boost::asio::executor_work_guard<Context::executor_type>> work;
+    std::vector<std::shared_ptr<Acceptor>> acceptors;
+    std::atomic<bool> isAskedToStop{false};
     boost::asio::steady_timer ticker;
     bool ticking = false;
     std::unordered_map<const Peer*, std::shared_ptr<Peer>> peers;

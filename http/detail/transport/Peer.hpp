@@ -27,7 +27,6 @@ public:
 
 protected:
     void expireAfter(std::chrono::milliseconds time) noexcept { due = Clock::now() + time; }
-    void expireNever() noexcept { due = Clock::time_point::max(); }
 
 private:
     Clock::time_point due = Clock::time_point::max();

@@ -20,7 +20,12 @@ int Inotify::watch(const std::string& path, std::uint32_t mask) {
     if (instance < 0) return -errno;
     const int number = ::inotify_add_watch(instance, path.c_str(), mask | IN_MASK_ADD);
     if (number < 0) return -errno;
-    ++uses[number];
+    try {
+        ++uses[number];
+    } catch (...) {
+        ::inotify_rm_watch(instance, number);  // it is new: nobody else uses it
+        throw;
+    }
     return number;
 }
 

@@ -23,6 +23,8 @@ constexpr std::uint32_t lastFolderMask = folderMask | IN_CLOSE_WRITE;
 constexpr std::uint32_t fileMask = IN_CLOSE_WRITE | IN_MODIFY | IN_ATTRIB | IN_DONT_FOLLOW;
 constexpr std::uint32_t watchEnded = IN_IGNORED | IN_UNMOUNT;
 
+constexpr int noWatch = -1;
+
 bool isReadable(const std::filesystem::path& path) {
     return ::faccessat(AT_FDCWD, path.c_str(), R_OK, AT_EACCESS) == 0;
 }
@@ -58,8 +60,7 @@ void WatchedFile::start(Inotify& notifications, TimePoint now) {
 }
 
 void WatchedFile::stop(Inotify& notifications) noexcept {
-    for (const auto& each : armed) notifications.forget(each.watch);
-    armed.clear();
+    forgetAll(notifications, armed);
 }
 
 void WatchedFile::onEvent(Inotify& notifications, const Inotify::Event& event, TimePoint now) {
@@ -139,9 +140,15 @@ void WatchedFile::arm(Inotify& notifications) {
     for (int walks = 0; walks < mostWalks; ++walks) {
         chain = PathChain(place);
         std::vector<Armed> watches;
-        error = watchAll(notifications, watches);
+        try {
+            error = watchAll(notifications, watches);
+        } catch (...) {
+            forgetAll(notifications, watches);
+            chain = {};  // the next look begins anew
+            throw;
+        }
         armed.swap(watches);
-        for (const auto& former : watches) notifications.forget(former.watch);
+        forgetAll(notifications, watches);
         if (PathChain(place) == chain) break;
     }
     say(error);
@@ -151,12 +158,15 @@ void WatchedFile::arm(Inotify& notifications) {
 int WatchedFile::watchAll(Inotify& notifications, std::vector<Armed>& watches) const {
     int error = 0;
     const auto add = [&](const std::string& where, std::uint32_t mask, const std::string& name) {
+        // Its place is there before the watch is: what has no memory leaves none behind.
+        watches.push_back({noWatch, where, name});
         const int watch = notifications.watch(where, mask);
         if (watch >= 0) {
-            watches.push_back({watch, where, name});
-        } else if (error == 0 && !hasVanished(-watch)) {
-            error = -watch;
+            watches.back().watch = watch;
+            return;
         }
+        watches.pop_back();
+        if (error == 0 && !hasVanished(-watch)) error = -watch;
     };
     for (const auto& step : chain.steps()) {
         const bool isLast = &step == &chain.steps().back();
@@ -164,6 +174,11 @@ int WatchedFile::watchAll(Inotify& notifications, std::vector<Armed>& watches) c
     }
     if (!chain.file().empty()) add(chain.file(), fileMask, "");
     return error;
+}
+
+void WatchedFile::forgetAll(Inotify& notifications, std::vector<Armed>& watches) noexcept {
+    for (const auto& each : watches) notifications.forget(each.watch);
+    watches.clear();
 }
 
 void WatchedFile::say(int error) {

@@ -71,6 +71,7 @@ private:
 
     void arm(Inotify& notifications);
     int watchAll(Inotify& notifications, std::vector<Armed>& watches) const;
+    static void forgetAll(Inotify& notifications, std::vector<Armed>& watches) noexcept;
     void say(int error);
     const Armed* concerned(const Inotify::Event& event) const;
     void onFileEvent(std::uint32_t mask, TimePoint now);

@@ -1,9 +1,11 @@
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <string>
 #include <thread>
+#include <utility>
 #include <vector>
 
 #include "http/Refused.hpp"
@@ -205,6 +207,37 @@ TEST(Requests, WithoutMemoryForTheirAnswerEndTheirConnectionOnly) {
     HttpClient client(serving.port());
     EXPECT_EQ(client.ask("GET /scarce").status, 0);
     EXPECT_EQ(other.ask("GET /").status, 200);
+}
+
+TEST(Requests, WhoseAnswerIsLostAreRefused) {
+    ServerOptions options;
+    options.commentInterval = std::chrono::milliseconds(10);
+    const Serving serving(options, [](Request&&, const ScriptedHandler::Reply&) {});
+    HttpClient client(serving.port());
+    const HttpAnswer answer = client.ask("GET /");
+    EXPECT_EQ(answer.body, "refused with 503");
+    EXPECT_EQ(answer.header("Connection"), "close");
+}
+
+TEST(Requests, WaitForAnAnswerThatIsStillToCome) {
+    ServerOptions options;
+    options.commentInterval = std::chrono::milliseconds(10);
+    const auto control = std::make_shared<FeedControl>();
+    ScriptedHandler::Reply kept;
+    const Serving serving(options, [&](Request&& request, ScriptedHandler::Reply answer) {
+        if (request.target == "/stream") return answer(std::make_unique<ControlledFeed>(control));
+        kept = std::move(answer);
+        control->push("kept\n\n");
+    });
+    HttpClient clock(serving.port());
+    EXPECT_EQ(clock.ask("GET /stream").status, 200);
+    HttpClient client(serving.port());
+    client.send("GET /slow HTTP/1.1\r\n\r\n");
+    while (clock.readUntil("\n\n") != "kept\n\n") continue;
+    for (int comments = 0; comments < 3; ++comments) clock.readUntil("\n\n");
+    EXPECT_EQ(control->taken(), 1U);
+    std::exchange(kept, nullptr)(ScriptedHandler::text("late"));
+    EXPECT_EQ(client.answer().body, "late");
 }
 
 TEST(Requests, ThatAreObjectedToAreNotReadToTheirEnd) {

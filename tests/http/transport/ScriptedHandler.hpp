@@ -21,6 +21,12 @@ public:
         change([&] { events.push_back(std::move(event)); });
     }
 
+    /// Adds an event, and has no memory to say so.
+    void pushUntold(std::string event) {
+        const std::lock_guard<std::mutex> lock(mutex);
+        events.push_back(std::move(event));
+    }
+
     /// Ends the stream behind the events that there are.
     void finish() {
         change([&] { isOver = true; });

@@ -129,6 +129,17 @@ TEST_F(Streams, SayNowAndThenThatTheyLive) {
     EXPECT_EQ(client.readUntil("\n\n"), ": \n\n");
 }
 
+TEST_F(Streams, ShowAnEventThatTheyWereNotToldOf) {
+    ServerOptions options;
+    options.commentInterval = milliseconds(20);
+    const Serving serving(options, streaming(control));
+    HttpClient client = opened(serving);
+    EXPECT_EQ(client.readUntil("\n\n"), ": \n\n");
+    control->pushUntold("event\n\n");
+    while (client.readUntil("\n\n") != "event\n\n") continue;
+    EXPECT_EQ(control->taken(), 1U);
+}
+
 TEST_F(Streams, OfAClientThatReadsNothingTakeNoMoreThanTheyCanWrite) {
     ServerOptions options;
     options.writeTimeout = milliseconds(100);
