@@ -257,7 +257,11 @@ private:
         while (!text.empty()) {
             require(takeIf(text, ';'));
             takeToken(text);
-            if (!takeIf(text, '=')) continue;
+            const bool isLast = text.empty();
+            if (!takeIf(text, '=')) {
+                require(isLast || !text.empty());  // no blanks at the end
+                continue;
+            }
             skipBlanks(text);
             if (text.substr(0, 1) == "\"") {
                 takeQuoted(text);
