@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <optional>
+#include <sstream>
 #include <string>
 #include <utility>
 #include <vector>
@@ -89,15 +90,25 @@ bool isToken(const std::string& text) {
                                        "ABCDEFGHIJKLMNOPQRSTUVWXYZ");
 }
 
-bool isControl(char byte) {
-    const auto code = static_cast<unsigned char>(byte);
-    return (code < 0x20 && byte != '\t') || code == 0x7F;
-}
-
 std::string withoutBlanks(std::string text) {
     text.erase(0, text.find_first_not_of(" \t"));
     text.erase(text.find_last_not_of(" \t") + 1);
     return text;
+}
+
+// Names with commas between, some of them left out.
+bool isTokenList(const std::string& text) {
+    std::istringstream elements(text);
+    for (std::string element; std::getline(elements, element, ',');) {
+        element = withoutBlanks(element);
+        if (!element.empty() && !isToken(element)) return false;
+    }
+    return true;
+}
+
+bool isControl(char byte) {
+    const auto code = static_cast<unsigned char>(byte);
+    return (code < 0x20 && byte != '\t') || code == 0x7F;
 }
 
 /// Reads one request after the other, as RFC 9112 and the header of the parser say.
@@ -171,7 +182,15 @@ private:
         const std::string name = line.substr(0, colon);
         const std::string value = withoutBlanks(line.substr(colon + 1));
         require(isToken(name) && std::none_of(value.begin(), value.end(), isControl));
+        const bool isList = lowered(name) == "connection" || lowered(name) == "proxy-connection";
+        require(!isList || isTokenList(value));
         return {lowered(name), value};
+    }
+
+    // What the body is made of can't be said behind it.
+    static void readTrailer(const std::string& line) {
+        const std::string name = readField(line).first;
+        require(name != "transfer-encoding" && name != "content-length");
     }
 
     void readHeader(const std::string& line, Request& request) {
@@ -229,7 +248,7 @@ private:
             body += take(size);
             require(take(2) == lineEnd);
         }
-        for (std::string line = takeLine(); !line.empty(); line = takeLine()) readField(line);
+        for (std::string line = takeLine(); !line.empty(); line = takeLine()) readTrailer(line);
         return body;
     }
 
@@ -238,7 +257,11 @@ private:
         while (!text.empty()) {
             require(takeIf(text, ';'));
             takeToken(text);
-            if (!takeIf(text, '=')) continue;
+            const bool isLast = text.empty();
+            if (!takeIf(text, '=')) {
+                require(isLast || !text.empty());  // no blanks at the end
+                continue;
+            }
             skipBlanks(text);
             if (text.substr(0, 1) == "\"") {
                 takeQuoted(text);

@@ -25,7 +25,9 @@ struct ModelChange {
 class ModelListener {
 public:
     virtual ~ModelListener() = default;
-    void tell(ModelChange&& change);
+
+    /// Adds `changes` to those that wait, all of them before any is taken.
+    void tell(std::vector<ModelChange> changes);
 
 protected:
     virtual void take(const ModelChange& change) = 0;
@@ -33,6 +35,8 @@ protected:
     bool hasEnded = false;
 
 private:
+    void add(ModelChange&& change);
+
     std::list<ModelChange> waiting;
     bool isTaking = false;
 };
@@ -63,7 +67,7 @@ public:
 
 private:
     Table& called(const std::string& name);
-    void tell(const std::string& key);
+    void tell(const std::vector<std::string>& keys);
 
     Tables tables{{"override"}, {"default"}};
     std::uint64_t changes = 0;

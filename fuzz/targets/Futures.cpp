@@ -1,6 +1,7 @@
 // Operations on promises and futures, with continuations that throw, call back and give things up,
 // and on a model of them. Both have to leave the same trace.
 
+#include <algorithm>
 #include <deque>
 #include <exception>
 #include <memory>
@@ -78,9 +79,12 @@ class System : public Performer<Step> {
 public:
     using Value = std::string;
 
-    /// Gives everything up.
+    /// Gives everything up, also what continuations make then as long as they have steps left.
     void end() {
-        for (auto& promise : promises) const auto givenUp = std::move(promise);
+        const auto isThere = [](const auto& promise) { return promise != nullptr; };
+        while (std::any_of(promises.begin(), promises.end(), isThere)) {
+            for (auto& promise : promises) const auto givenUp = std::move(promise);
+        }
         for (auto& future : futures) future = AnyFuture<Value>();
     }
 
