@@ -67,7 +67,8 @@ struct ServerOptions {
     /// Between two requests of a connection, which is closed then.
     std::chrono::milliseconds idleTimeout{60'000};
 
-    /// The longest that an event stream is silent: a comment is sent then.
+    /// The longest that an event stream is silent: a comment is sent then. Also how often it is
+    /// looked whether an answer that is waited for has been lost.
     std::chrono::milliseconds commentInterval{15'000};
 
     /// Open connections in all, and from one address (an IPv6 network of 64 bits counts as one,

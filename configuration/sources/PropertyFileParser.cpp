@@ -53,8 +53,7 @@ std::uint32_t hexadecimalPrefix(std::string_view digits) {
     }
     std::uint32_t number = 0;
     std::from_chars(digits.data(), digits.data() + digits.size(), number, 16);
-    constexpr std::uint64_t numbers = std::uint64_t{1} << 32U;
-    return negative ? static_cast<std::uint32_t>(numbers - number) : number;
+    return negative ? 0U - number : number;
 }
 
 }  // namespace

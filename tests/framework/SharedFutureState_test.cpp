@@ -428,6 +428,44 @@ TEST(SharedFutureState, BornWithAValueRefusesAnother) {
         alreadyResolved);
 }
 
+// What a `get` throws that waits when `event` comes. Of two that ask one is refused as soon as the
+// other waits.
+template <class Event>
+std::string thrownBehind(Event event) {
+    struct Scene {
+        const std::shared_ptr<State> state = std::make_shared<State>();
+        Latch refused;
+        Latch answered;
+        std::string text;
+    };
+    const auto scene = std::make_shared<Scene>();
+    for (int number = 0; number < 2; ++number) {
+        std::thread([scene] {
+            const std::string text = thrownText<std::runtime_error>([&] { scene->state->get(); });
+            if (text == alreadyTaken) return scene->refused.countDown();
+            scene->text = text;
+            scene->answered.countDown();
+        }).detach();
+    }
+    EXPECT_TRUE(scene->refused.wait());
+    event(scene->state);
+    return scene->answered.wait() ? scene->text : "<waits on>";
+}
+
+TEST(SharedFutureState, WakesWhoWaits) {
+    using StatePtr = std::shared_ptr<State>;
+    EXPECT_EQ(thrownBehind(
+                  [](const StatePtr& state) { state->setValue(std::make_unique<int>(1), state); }),
+              nothingThrown);
+    EXPECT_EQ(thrownBehind([](const StatePtr& state) {
+                  state->setException(std::make_exception_ptr(std::runtime_error("reason")), state);
+              }),
+              "reason");
+    EXPECT_EQ(thrownBehind([](const StatePtr& state) { state->cancel(); }),
+              "Future has been cancelled.");
+    EXPECT_EQ(thrownBehind([](const StatePtr& state) { state->abandon(state); }), brokenPromise);
+}
+
 TEST(SharedFutureState, ManyThreadsSettleItOnce) {
     constexpr int producers = 4;
     for (int round = 0; round < raceRounds(); ++round) {

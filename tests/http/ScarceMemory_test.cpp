@@ -9,12 +9,12 @@
 #include <new>
 #include <string>
 #include <thread>
+#include <utility>
 
 #include "configuration/ConfigurationImpl.hpp"
 #include "http/Server.hpp"
-#include "tests/http/transport/HttpClient.hpp"
+#include "tests/http/transport/ListenerTesting.hpp"
 #include "tests/support/AllocationCounter.hpp"
-#include "tests/support/BoundedWait.hpp"
 
 namespace velkor::http {
 namespace {
@@ -124,21 +124,34 @@ TEST_P(ServersShortOfMemory, Stop) {
     }
 }
 
-// Neither who stops them nor their threads have any.
-TEST_P(ServersShortOfMemory, StopBesideThreadsThatAreToo) {
-    bool ranOut = true;
-    for (std::size_t successes = 0; ranOut; ++successes) {
-        SCOPED_TRACE(successes);
-        Server server(store, options);
-        HttpClient client(server.port());
-        EXPECT_EQ(client.ask("GET /changes").status, 200);
-        {
-            const AllocationFailureElsewhere failure(successes, GetParam());
-            server.stop();
-            ranOut = failure.hasHappened();
-        }
-        client.readToEnd();
+// An answer that is still to come, and a stream whose clients are told that it lives: neither who
+// stops the server nor its threads have any memory.
+TEST_P(ServersShortOfMemory, StopWhateverIsUnderWay) {
+    using detail::transport::ScriptedHandler;
+    const auto control = std::make_shared<detail::transport::FeedControl>();
+    ScriptedHandler::Reply kept;
+    const detail::transport::Serving serving(
+        options, [&](detail::Request&& request, ScriptedHandler::Reply answer) {
+            if (request.target == "/stream") {
+                return answer(std::make_unique<detail::transport::ControlledFeed>(control));
+            }
+            kept = std::move(answer);
+            control->push("kept\n\n");
+        });
+    HttpClient clock(serving.port());
+    EXPECT_EQ(clock.ask("GET /stream").status, 200);
+    HttpClient waiting(serving.port());
+    waiting.send("GET /slow HTTP/1.1\r\n\r\n");
+    while (clock.readUntil("\n\n") != "kept\n\n") continue;
+    EXPECT_EQ(control->taken(), 1U);
+    {
+        const AllocationFailureElsewhere failure(0, GetParam());
+        for (int comments = 0; comments < 3; ++comments) clock.readUntil("\n\n");
+        const AllocationFailure ownFailure(0, GetParam());
+        serving.listener->stop();
     }
+    EXPECT_EQ(waiting.readToEnd(), "");
+    kept = nullptr;
 }
 
 INSTANTIATE_TEST_SUITE_P(Shortages, ServersShortOfMemory,

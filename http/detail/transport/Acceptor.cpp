@@ -2,7 +2,6 @@
 
 #include <cerrno>
 #include <chrono>
-#include <exception>
 #include <system_error>
 #include <utility>
 
@@ -71,13 +70,15 @@ void Acceptor::admit(Arrival&& arrival) noexcept {
     arrival.secure = isSecure;
     TransportCounts& counts = *shared->counts;
     ++counts.connectionsAccepted;
+    bool isRefused = false;
     try {
         Limits::Place place = shared->limits->connection(arrival.from.origin());
-        if (!place) ++counts.connectionsRefused;
+        isRefused = !place;
         choose().take(std::move(arrival), std::move(place));
-    } catch (const std::exception&) {
-        ++counts.connectionsRefused;
+    } catch (...) {
+        isRefused = true;
     }
+    if (isRefused) ++counts.connectionsRefused;
 }
 
 void Acceptor::pause(int error) {

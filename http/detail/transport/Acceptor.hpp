@@ -27,8 +27,8 @@ public:
     Acceptor(const Acceptor&) = delete;
     Acceptor& operator=(const Acceptor&) = delete;
 
-    /// Waits for clients, unless it does so or has been closed. May throw `std::bad_alloc`, as what
-    /// it does when clients come: to be called again then.
+    /// Waits for clients, unless it does so or has been closed. May throw `std::bad_alloc`, as may
+    /// the handler of what it waits for: it is to be called again then.
     void resume();
 
     /// Takes no more clients and closes the socket.

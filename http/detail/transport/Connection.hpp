@@ -83,7 +83,7 @@ private:
     void greeted(const Error& error) {
         if (error) return this->end();
         if (!isWelcome) return refuse(503);
-        reading = std::make_shared<Reading>(options());
+        reading = std::make_unique<Reading>(options());
         awaitRequest();
     }
 
@@ -163,9 +163,8 @@ private:
         this->expireAfter(options().commentInterval);
         shared->handler->handle(std::move(request), [context = loop.context(),
                                                      self = this->weak_from_this(),
-                                                     handling = reading](Answer&& answer) {
-            boost::asio::dispatch(*context, [self, handling, answer = std::move(answer)]() mutable {
-                handling.reset();
+                                                     promise = newPromise()](Answer&& answer) {
+            boost::asio::dispatch(*context, [self, promise, answer = std::move(answer)]() mutable {
                 // Only here, on its thread, may this be the last reference.
                 const auto connection = self.lock();
                 if (!connection) return;
@@ -174,10 +173,17 @@ private:
         });
     }
 
+    // Whoever is to answer holds a copy of it. That of a request before may still be held.
+    const std::shared_ptr<const char>& newPromise() {
+        if (promised.use_count() != 1) promised = std::make_shared<const char>();
+        return promised;
+    }
+
     // An answer is lost when there is no memory to bring it here.
     void lookForAnswer() {
-        if (reading.use_count() == 1) return refuse(503);
-        this->expireAfter(options().commentInterval);
+        if (promised.use_count() > 1) return this->expireAfter(options().commentInterval);
+        ++counts().answersRefused;
+        refuse(503);
     }
 
     void onAnswer(Answer&& answer) noexcept {
@@ -265,7 +271,8 @@ private:
     bool staysOpen = false;
     bool isHead = false;  // of the present request
     bool isOld = false;
-    std::shared_ptr<Reading> reading;  // shared with what is to answer, as long as that can
+    std::unique_ptr<Reading> reading;
+    std::shared_ptr<const char> promised;  // an answer to the present request
 };
 
 }  // namespace velkor::http::detail::transport

@@ -1,5 +1,6 @@
 #include "http/detail/transport/Listener.hpp"
 
+#include <algorithm>
 #include <utility>
 
 #include "http/Refused.hpp"
@@ -28,7 +29,8 @@ Listener::Listener(const ServerOptions& options, std::shared_ptr<Handler> handle
         home.accept(std::make_shared<Acceptor>(home, std::move(socket), secure, shared,
                                                [this]() -> Loop& { return nextLoop(); }));
     }
-    for (Loop& loop : loops) loop.start();
+    // The first takes clients as soon as it runs, for all of them.
+    std::for_each(loops.rbegin(), loops.rend(), [](Loop& loop) { loop.start(); });
 }
 
 Listener::~Listener() {

@@ -29,10 +29,10 @@ milliseconds tickInterval(const ServerOptions& options) {
 }
 
 // What a sink throws doesn't end the thread either.
-void reportLost(const std::exception& error) noexcept {
+void reportShortage(const char* reason) noexcept {
     try {
-        logger.write(common::error, "A connection was lost: ", error.what());
-    } catch (const std::exception&) {
+        logger.write(common::error, "Connections may have been lost: ", reason);
+    } catch (...) {
         return;
     }
 }
@@ -64,25 +64,32 @@ void Loop::run() noexcept {
     runOn();
 }
 
-// Runs until the context is stopped. Lack of memory ends what had none, and what this loop does
-// itself is begun again.
+// Runs until the context is stopped. What a handler throws, for lack of memory, ends what it was
+// about. What the loop itself waits for is begun again, now and then until that succeeds; the
+// connections are served meanwhile.
 void Loop::runOn() noexcept {
-    milliseconds pause{0};
+    bool isShort = false;
+    const auto note = [&](const char* reason) {
+        if (!std::exchange(isShort, true)) reportShortage(reason);
+    };
     while (!running->stopped()) {
         try {
-            running->run_for(pause);
+            if (isShort) running->run_for(shortagePause);
             resume();
+            isShort = false;
             running->run();
         } catch (const std::exception& error) {
-            pause = shortagePause;
-            reportLost(error);
+            note(error.what());
+        } catch (...) {
+            note("unknown error");
         }
     }
 }
 
+// Those whose time is up end first: that takes no memory.
 void Loop::resume() {
+    if (!ticking) tick();
     for (const auto& acceptor : acceptors) acceptor->resume();
-    if (!peers.empty()) armTicker();
 }
 
 void Loop::take(Arrival&& arrival, Limits::Place&& place) {
@@ -100,7 +107,7 @@ void Loop::admit(Arrival&& arrival, Limits::Place&& place) {
             make(*this, shared, std::move(arrival), std::move(place));
         peers.emplace(peer.get(), peer);
         peer->begin();
-    } catch (const std::exception&) {
+    } catch (...) {
         ++shared->counts->connectionsRefused;
     }
     if (!peers.empty()) armTicker();
@@ -122,6 +129,18 @@ const std::string& Loop::date() {
 
 void Loop::stop() noexcept {
     if (!isAskedToStop.exchange(true)) running->stop();
+}
+
+void Loop::join() noexcept {
+    if (!thread) return;
+    thread.reset();
+    // Clients that were handed over at the very end are let go.
+    running->restart();
+    try {
+        running->poll();
+    } catch (...) {
+        return;  // they go with the context
+    }
 }
 
 void Loop::beginStop() noexcept {
@@ -167,7 +186,8 @@ void Loop::tick() {
 void Loop::endIfDone() noexcept {
     if (!isStopping() || !peers.empty()) return;
     work.reset();
-    ticker.cancel();
+    boost::system::error_code ignored;
+    ticker.cancel(ignored);
 }
 
 }  // namespace velkor::http::detail::transport

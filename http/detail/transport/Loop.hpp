@@ -69,8 +69,9 @@ public:
     /// second, those that are being answered. Thread-safe; needs no memory, and doesn't wait.
     void stop() noexcept;
 
-    /// Waits until all connections have ended, after `stop`. From one other thread at a time.
-    void join() noexcept { thread.reset(); }
+    /// Waits until all connections have ended, after `stop`. From one other thread at a time, and
+    /// after all loops that hand clients over to this one.
+    void join() noexcept;
 
     /// Whether this is the loop's thread. Thread-safe.
     bool runsHere() const noexcept { return std::this_thread::get_id() == threadId; }

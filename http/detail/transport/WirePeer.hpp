@@ -79,7 +79,7 @@ protected:
     void attempt(Action&& action) noexcept {
         try {
             action();
-        } catch (const std::exception&) {
+        } catch (...) {
             end();
         }
     }

@@ -70,9 +70,12 @@ void WatchedFile::onEvent(Inotify& notifications, const Inotify::Event& event, T
     }
     const Armed* const told = concerned(event);
     if (told == nullptr) return;
+    if ((event.mask & watchEnded) != 0) {
+        arm(notifications);
+        return quietTime.changed(now);
+    }
     const std::string name = told->folder + '/' + told->name;
-    if ((event.mask & (nameEvents | watchEnded)) != 0) arm(notifications);
-    if ((event.mask & watchEnded) != 0) return quietTime.changed(now);
+    if ((event.mask & nameEvents) != 0) arm(notifications);
     if (event.name.empty()) return onFileEvent(event.mask, now);
     onNameEvent(event.mask, name, now);
 }
@@ -137,25 +140,26 @@ WatchedFile::TimePoint WatchedFile::nextTime() const {
 void WatchedFile::arm(Inotify& notifications) {
     constexpr int mostWalks = 8;  // the next look goes on where somebody changes it all the time
     int error = 0;
-    for (int walks = 0; walks < mostWalks; ++walks) {
-        chain = PathChain(place);
+    chain = {};  // for the next look to begin anew, if there is no memory now
+    PathChain next(place);
+    for (int walks = 0; walks < mostWalks && next != chain; ++walks) {
         std::vector<Armed> watches;
         try {
-            error = watchAll(notifications, watches);
+            error = watchAll(notifications, next, watches);
         } catch (...) {
             forgetAll(notifications, watches);
-            chain = {};  // the next look begins anew
             throw;
         }
         armed.swap(watches);
         forgetAll(notifications, watches);
-        if (PathChain(place) == chain) break;
+        chain = std::exchange(next, PathChain(place));
     }
     say(error);
 }
 
 // Gives the first error that is not a sign of a change.
-int WatchedFile::watchAll(Inotify& notifications, std::vector<Armed>& watches) const {
+int WatchedFile::watchAll(Inotify& notifications, const PathChain& way,
+                          std::vector<Armed>& watches) {
     int error = 0;
     const auto add = [&](const std::string& where, std::uint32_t mask, const std::string& name) {
         // Its place is there before the watch is: what has no memory leaves none behind.
@@ -168,11 +172,11 @@ int WatchedFile::watchAll(Inotify& notifications, std::vector<Armed>& watches) c
         watches.pop_back();
         if (error == 0 && !hasVanished(-watch)) error = -watch;
     };
-    for (const auto& step : chain.steps()) {
-        const bool isLast = &step == &chain.steps().back();
+    for (const auto& step : way.steps()) {
+        const bool isLast = &step == &way.steps().back();
         add(step.folder, isLast ? lastFolderMask : folderMask, step.name);
     }
-    if (!chain.file().empty()) add(chain.file(), fileMask, "");
+    if (!way.file().empty()) add(way.file(), fileMask, "");
     return error;
 }
 

@@ -70,7 +70,7 @@ private:
     };
 
     void arm(Inotify& notifications);
-    int watchAll(Inotify& notifications, std::vector<Armed>& watches) const;
+    static int watchAll(Inotify& notifications, const PathChain& way, std::vector<Armed>& watches);
     static void forgetAll(Inotify& notifications, std::vector<Armed>& watches) noexcept;
     void say(int error);
     const Armed* concerned(const Inotify::Event& event) const;
