@@ -6,6 +6,7 @@
 #include <locale>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <stdexcept>
 #include <string>
 #include <thread>
@@ -97,6 +98,13 @@ TEST_F(StoreLog, RemovalLogsTheValueThatIsUncovered) {
     add("extra", "", 5, {{"a", 2}});
     EXPECT_THAT(messagesOf([&] { store->removeSource("extra"); }),
                 ElementsAre("removeSource: extra", "updatePublishers: a", "get: a from default"));
+}
+
+TEST_F(StoreLog, ApplyNamesEachKeyAndItsSource) {
+    store->set("b", 1);
+    const auto messages = messagesOf([&] { store->apply({{"a", 1}, {"b", std::nullopt}}).get(); });
+    EXPECT_THAT(messages, ::testing::Contains("set: a@override"));
+    EXPECT_THAT(messages, ::testing::Contains("unset: b@override"));
 }
 
 TEST_F(StoreLog, GetNamesTheSource) {

@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <random>
 #include <set>
 #include <sstream>
@@ -116,6 +117,39 @@ TEST(PropertyFileLint, SaysWhyTheEndOfATextIsLeftOut) {
     }
     for (const auto* const text : {"key\\", "k=a\\", "k=a\\\n"}) {
         EXPECT_EQ(flawsOf(text), std::set{PropertyFlaw::backslashAtEnd}) << text;
+    }
+}
+
+TEST(PropertyFileLint, SaysLineAndColumn) {
+    struct Row {
+        std::string_view text;
+        PropertyFlaw flaw;
+        std::size_t line;
+        std::size_t column;
+    };
+    const std::vector<Row> rows{
+        {"a=b\n\xFF=c\n", PropertyFlaw::notUtf8, 2, 1},
+        {"a=\xC3\xA9\xFF\n", PropertyFlaw::notUtf8, 1, 4},  // two bytes are one character
+        {"a=b\r\n[s]\r\n", PropertyFlaw::section, 2, 1},
+        {"a=b\n\rc=d \n", PropertyFlaw::trailingBlanks, 3, 4},
+        {"a=b\\ud83d\n", PropertyFlaw::surrogate, 1, 4},
+        {"a=b\\u12\n", PropertyFlaw::shortEscape, 1, 4},
+    };
+    for (const auto& row : rows) {
+        const auto remarks = remarksOn(row.text);
+        EXPECT_EQ(std::count_if(remarks.begin(), remarks.end(),
+                                [&](const PropertyRemark& remark) {
+                                    return remark.flaw == row.flaw && remark.line == row.line &&
+                                           remark.column == row.column;
+                                }),
+                  1)
+            << ::testing::PrintToString(row.text);
+    }
+}
+
+TEST(PropertyFileLint, HasNothingAgainstEscapes) {
+    for (const auto* const text : {"a=\\u00e9\n", "a=\\uFFFF\n", "a=\\ud7ff\n", "a=\\t\\\\\n"}) {
+        EXPECT_EQ(flawsOf(text), std::set<PropertyFlaw>()) << text;
     }
 }
 
