@@ -105,7 +105,7 @@ class Details {
         } catch (problem) {
             content = [element('p', { class: problem.status === 404 ? 'muted' : 'problem' }, problem.message)];
         }
-        if (this.#item === item) byId(id).replaceChildren(...content);
+        if (this.#item === item) replaceContent(byId(id), content, byId('details-title'));
     }
 
     #layers({ layers, constraint, description, secret }) {

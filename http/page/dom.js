@@ -12,6 +12,19 @@ function element(name, attributes = {}, ...children) {
     return made;
 }
 
+const spokenName = (control) => control.getAttribute('aria-label') ?? control.textContent;
+
+/// Replaces what is in `place`. A button that had the focus passes it on to the one that says the
+/// same there now, or to `otherwise`.
+function replaceContent(place, content, otherwise) {
+    const focused = place.contains(document.activeElement) && document.activeElement;
+    place.replaceChildren(...content);
+    if (!focused) return;
+    const same = [...place.querySelectorAll('button')]
+        .find((button) => spokenName(button) === spokenName(focused));
+    (same ?? otherwise).focus();
+}
+
 const countOf = (number, one, many = `${one}s`) =>
     `${number.toLocaleString('en')} ${number === 1 ? one : many}`;
 

@@ -336,6 +336,20 @@ test('the keyboard alone finds a key, sets it and unsets it', async (t) => {
     await focused('#filter');
 });
 
+test('a change by somebody else leaves the focus where it is, or behind what has gone', async (t) => {
+    const { server, tab } = await openWritable(new Bench(t));
+    await server.set('http.port', 'int', 1);
+    await openDetails(tab, 'http.port');
+    const unset = tab.getByRole('button', { name: 'Unset in state' });
+    await unset.focus();
+    await server.set('http.port', 'int', 2);
+    await showsText(tab, '#details-layers', '2');
+    assert.ok(await unset.evaluate((button) => button === document.activeElement));
+    await server.change({ key: 'http.port', unset: true, source: 'state' });
+    await unset.waitFor({ state: 'detached' });
+    await tab.waitForFunction(() => document.activeElement.id === 'details-title');
+});
+
 for (const colorScheme of ['light', 'dark']) {
     for (const [form, viewport] of [['wide', { width: 1200, height: 720 }], ['narrow', { width: 420, height: 760 }]]) {
         test(`axe finds nothing on a ${form} screen in the ${colorScheme}`, async (t) => {
