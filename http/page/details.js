@@ -32,14 +32,20 @@ class Details {
     /// Shows `item` and moves the focus there.
     open(item) {
         this.#item = item;
-        this.#form = undefined;
         this.#historyLimit = 20;
         this.#frame(item.key === '' ? '(empty key)' : item.key,
             element('p', { id: 'details-about', class: 'about' }),
             element('div', { id: 'details-setting' }),
             this.#section('Layers', 'details-layers'),
-            ...this.#formSection(item),
+            element('div', { id: 'details-form' }, ...this.#formSection(item)),
             this.#section('History', 'details-history'));
+        this.refresh();
+    }
+
+    /// Offers what the rights allow now.
+    renewRights() {
+        if (this.#item === undefined) return;
+        byId('details-form').replaceChildren(...this.#formSection(this.#item));
         this.refresh();
     }
 
@@ -90,6 +96,7 @@ class Details {
     }
 
     #formSection(item) {
+        this.#form = undefined;
         if (!this.#rights.mayWrite) return [];
         if (isInexact(item)) {
             return [element('p', { class: 'muted' }, 'This key holds bytes that are no UTF-8 and cannot be set here.')];

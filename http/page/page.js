@@ -53,7 +53,9 @@ function showSourcesToFilter() {
 
 async function readSources() {
     const { sources, mayWrite } = await api.json('/sources');
+    const couldWrite = rights.mayWrite;
     Object.assign(rights, { sources, mayWrite: mayWrite === true });
+    if (rights.mayWrite !== couldWrite) details.renewRights();
     byId('rights').textContent = rights.mayWrite ? '' : 'read only';
     byId('new-key').hidden = !rights.mayWrite;
     showLayers();

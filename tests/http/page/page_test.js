@@ -336,6 +336,19 @@ test('the keyboard alone finds a key, sets it and unsets it', async (t) => {
     await focused('#filter');
 });
 
+test('a key in the address is opened with all that may be done to it', async (t) => {
+    const bench = new Bench(t);
+    const server = await bench.serve(['--allow-writes', '--state', bench.path('state'),
+        bench.file('site.properties', someKeys)]);
+    await server.set('http.port', 'int', 1);
+    const tab = await bench.openTab();
+    await tab.goto(`${server.url}#http.port`);
+    await showsText(tab, '#details-title', 'http.port');
+    await tab.getByRole('button', { name: 'Unset in state' }).waitFor();
+    await setTo(tab, '2');
+    await showsValue(tab, 'http.port', '2');
+});
+
 test('a change by somebody else leaves the focus where it is, or behind what has gone', async (t) => {
     const { server, tab } = await openWritable(new Bench(t));
     await server.set('http.port', 'int', 1);
