@@ -1,12 +1,16 @@
 // Messages as text: whatever is short, a reply is whole or there is none.
 
+#include <memory>
 #include <string>
 
+#include "configuration/service/ConfigurationJsonSerialization.hpp"
+#include "configuration/service/ConfigurationMessages.hpp"
 #include "messages/JsonSerializerImpl.hpp"
 #include "messages/JsonText.hpp"
 #include "messages/MessageDispatcher.hpp"
 #include "messages/MessageService.hpp"
 #include "tests/failing/StoreScene.hpp"
+#include "tests/support/ValueText.hpp"
 
 namespace velkor::testing {
 namespace {
@@ -138,6 +142,23 @@ void decodeAMessage(Trial& trial) {
     }
 }
 
+// JSON in the place of a text is that text, written over several lines.
+void decodeANestedValue(Trial& trial) {
+    const auto serializer = std::make_shared<JsonSerializerImpl>();
+    const configuration::ConfigurationJsonSerialization entered(serializer);
+    const JsonMessage text{std::string(prefix) + "ConfigurationSet",
+                           R"({"value": {"type": "string", "value": [")" + longText("a") + "\"]}}"};
+    const auto decoded = [&] {
+        const auto message = serializer->decode(text);
+        return textOf(dynamic_cast<const configuration::ConfigurationSet&>(*message).value);
+    };
+    const std::string expected = decoded();
+    std::string read;
+    if (trial.passes([&] { read = decoded(); })) {
+        EXPECT_EQ(read, expected);
+    }
+}
+
 void renderAnObject(Trial& trial) {
     const std::string text =
         R"({"a":[1,2.5,"\u00e4)" + longText("") + R"("],"b":{"c":null,"d":true}})";
@@ -152,11 +173,17 @@ void renderAnObject(Trial& trial) {
 constexpr const char* poco = "Poco::SharedPtr loses its object without the memory for its count";
 
 constexpr Row messageRows[] = {
-    {"DispatchGet", dispatchGet, poco}, {"DispatchKeys", dispatchKeys, poco},
-    {"DispatchSet", dispatchSet, poco}, {"DispatchNonsense", dispatchNonsense, poco},
-    {"MakeAService", makeAService},     {"Register", registerAMessage},
-    {"Withdraw", withdrawAMessage},     {"Encode", encodeAMessage, poco},
-    {"Decode", decodeAMessage, poco},   {"Render", renderAnObject},
+    {"DispatchGet", dispatchGet, poco},
+    {"DispatchKeys", dispatchKeys, poco},
+    {"DispatchSet", dispatchSet, poco},
+    {"DispatchNonsense", dispatchNonsense, poco},
+    {"MakeAService", makeAService},
+    {"Register", registerAMessage},
+    {"Withdraw", withdrawAMessage},
+    {"Encode", encodeAMessage, poco},
+    {"Decode", decodeAMessage, poco},
+    {"Render", renderAnObject},
+    {"DecodeANestedValue", decodeANestedValue, poco},
 };
 VELKOR_FAILING_ROWS(FailingMessages, messageRows);
 
