@@ -74,9 +74,13 @@ public:
         do {
             cancelled = false;
             int length = 0;
+            // Those that end the program wait until the library is there to put the terminal right.
+            untilLibraryListens.emplace(
+                std::initializer_list<int>{SIGHUP, SIGQUIT, SIGTERM, SIGTSTP});
             // Before the prompt invites anybody to type: Ctrl-C would end the program otherwise.
             el_set(editor.get(), EL_PREP_TERM, 1);
             const char* text = el_gets(editor.get(), &length);
+            untilLibraryListens.reset();
             if (cancelled) {
                 std::fputs("^C\n", stdout);
             } else if (text == nullptr || length <= 0) {
@@ -138,6 +142,7 @@ private:
     // Reads one character, and shows what is announced before it comes.
     static int onCharacter(EditLine* editor, wchar_t* character) {
         Session& session = of(editor);
+        session.untilLibraryListens.reset();
         while (!session.keyIsNext()) session.showAnnouncements();
         // The library's own way to read knows its signals and all characters.
         el_wset(editor, EL_GETCFN, static_cast<el_rfunc_t>(EL_BUILTIN_GETCFN));
@@ -221,6 +226,7 @@ private:
     const std::unique_ptr<History, HistoryDeleter> lines;
     const std::unique_ptr<EditLine, EditLineDeleter> editor;
     bool cancelled = false;
+    std::optional<SignalPause> untilLibraryListens;
     const Interruption interruption;
 };
 

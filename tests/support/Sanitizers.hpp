@@ -16,4 +16,17 @@ constexpr bool isSanitized = false;
 constexpr bool isSanitized = false;
 #endif
 
+/// Whether the thread sanitizer is.
+#if defined(__SANITIZE_THREAD__)
+constexpr bool isThreadSanitized = true;
+#elif defined(__has_feature)
+#if __has_feature(thread_sanitizer)
+constexpr bool isThreadSanitized = true;
+#else
+constexpr bool isThreadSanitized = false;
+#endif
+#else
+constexpr bool isThreadSanitized = false;
+#endif
+
 }  // namespace velkor::testing

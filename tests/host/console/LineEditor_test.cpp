@@ -3,6 +3,7 @@
 #include <string>
 
 #include "tests/host/TerminalSession.hpp"
+#include "tests/support/Sanitizers.hpp"
 #include "tests/support/TemporaryFile.hpp"
 
 namespace velkor::host {
@@ -133,6 +134,9 @@ TEST_F(LineEditorTest, QuitEndsTheSession) {
 }
 
 TEST_F(LineEditorTest, ASignalThatEndsTheProgramLeavesAnOrdinaryTerminal) {
+    if (testing::isThreadSanitized) {
+        GTEST_SKIP() << "the thread sanitizer loses a signal that comes as a system call begins";
+    }
     EXPECT_FALSE(terminal.isOrdinary());
     terminal.signal(SIGTERM);
     EXPECT_EQ(terminal.exitCode(), -1);
