@@ -74,7 +74,8 @@ public:
         do {
             cancelled = false;
             int length = 0;
-            // Those that end the program wait until the library is there to put the terminal right.
+            // Those that end or stop the program wait until the library is there to put the
+            // terminal right.
             untilLibraryListens.emplace(
                 std::initializer_list<int>{SIGHUP, SIGQUIT, SIGTERM, SIGTSTP});
             // Before the prompt invites anybody to type: Ctrl-C would end the program otherwise.

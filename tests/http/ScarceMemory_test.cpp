@@ -14,7 +14,7 @@
 #include "configuration/ConfigurationImpl.hpp"
 #include "http/Server.hpp"
 #include "tests/http/transport/ListenerTesting.hpp"
-#include "tests/support/AllocationCounter.hpp"
+#include "tests/support/ScarceMemory.hpp"
 
 namespace velkor::http {
 namespace {
@@ -156,9 +156,7 @@ TEST_P(ServersShortOfMemory, StopWhateverIsUnderWay) {
 
 INSTANTIATE_TEST_SUITE_P(Shortages, ServersShortOfMemory,
                          ::testing::Values(Shortage::once, Shortage::lasting),
-                         [](const auto& info) {
-                             return info.param == Shortage::once ? "Once" : "FromThenOn";
-                         });
+                         velkor::testing::nameOfShortage);
 
 }  // namespace
 }  // namespace velkor::http

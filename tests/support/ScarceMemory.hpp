@@ -4,10 +4,16 @@
 
 #include <cstddef>
 #include <new>
+#include <string>
 
 #include "tests/support/AllocationCounter.hpp"
 
 namespace velkor::testing {
+
+/// The name of a case that is about a kind of shortage.
+inline std::string nameOfShortage(const ::testing::TestParamInfo<Shortage>& info) {
+    return info.param == Shortage::once ? "Once" : "FromThenOn";
+}
 
 /// Runs the operation of a scenario short of memory; see `failEachAllocation`.
 class ScarceMemory {

@@ -13,7 +13,7 @@
 
 #include "layers/files/ReloadingFileSource.hpp"
 #include "tests/layers/files/FollowingStore.hpp"
-#include "tests/support/AllocationCounter.hpp"
+#include "tests/support/ScarceMemory.hpp"
 
 namespace velkor::layers {
 namespace {
@@ -100,9 +100,7 @@ TEST_P(FilesShortOfMemory, LeaveNoWatchBehind) {
 
 INSTANTIATE_TEST_SUITE_P(Shortages, FilesShortOfMemory,
                          ::testing::Values(Shortage::once, Shortage::lasting),
-                         [](const auto& info) {
-                             return info.param == Shortage::once ? "Once" : "FromThenOn";
-                         });
+                         testing::nameOfShortage);
 
 }  // namespace
 }  // namespace velkor::layers

@@ -9,8 +9,8 @@
 
 #include "layers/etcd/EtcdSource.hpp"
 #include "tests/layers/etcd/server/EtcdMember.hpp"
-#include "tests/support/AllocationCounter.hpp"
 #include "tests/support/BoundedWait.hpp"
+#include "tests/support/ScarceMemory.hpp"
 #include "tests/support/ValueText.hpp"
 
 namespace velkor::testing {
@@ -78,9 +78,7 @@ TEST_P(EtcdScarceMemory, EndsNoThreadAndLosesNothing) {
 
 INSTANTIATE_TEST_SUITE_P(Shortages, EtcdScarceMemory,
                          ::testing::Values(Shortage::once, Shortage::lasting),
-                         [](const auto& info) {
-                             return info.param == Shortage::once ? "Once" : "FromThenOn";
-                         });
+                         testing::nameOfShortage);
 
 }  // namespace
 }  // namespace velkor::testing
